@@ -1,0 +1,71 @@
+#include "ConsoleHost.h"
+
+#include <istream>
+#include <ostream>
+#include <string>
+
+#include "instrument/QenGuiInst.h"
+#include "support/ConditionList.h"
+
+int ConsoleHost::Run() {
+  mOut << "Connected; application handle " << QenGuiInst::GetAppHandle() << ". Type help for help.\n";
+  std::string line;
+  while (mOut << "qen> " << std::flush, std::getline(mIn, line)) {
+    if (!HandleLine(Dstring(line).Trimmed())) break;
+  }
+  mOut << "\n";
+  return 0;
+}
+
+bool ConsoleHost::HandleLine(const Dstring& line) {
+  if (line.empty()) return true;
+  if (line == "quit" || line == "exit") return false;
+  if (line == "help") {
+    PrintHelp();
+    return true;
+  }
+  if (line == "handle") {
+    mOut << QenGuiInst::GetAppHandle() << "\n";
+    return true;
+  }
+  Dstring reply;
+  ConditionList list;
+  int status = QenGuiInst::Call(ExpandHandle(line, QenGuiInst::GetAppHandle()), reply, list);
+  if (!reply.empty()) mOut << reply << "\n";
+  if (status != 0) mOut << "status " << status << "\n";
+  for (const auto& c : list) mOut << "error " << c.GetCode() << ": " << c.GetMessage() << "\n";
+  return true;
+}
+
+Dstring ConsoleHost::ExpandHandle(const Dstring& line, const Dstring& handle) {
+  Dstring out;
+  bool commandStart = true;
+  bool quoted = false;
+  for (std::size_t i = 0; i < line.size(); ++i) {
+    char c = line[i];
+    if (commandStart && c == ':' && i + 1 < line.size() && line[i + 1] == ':') {
+      out += ":" + handle;
+      commandStart = false;
+      continue;
+    }
+    if (c == '"') quoted = !quoted;
+    commandStart = !quoted && c == ';';
+    out += c;
+  }
+  return out;
+}
+
+void ConsoleHost::PrintHelp() {
+  mOut << "Type a command of the instrument's language and press Enter; the reply and any errors\n"
+          "that the command queued are printed. Several commands may be joined with \";\".\n"
+          "  ::HEADER        the application handle is filled in: ::TRIG:MODE? sends :"
+       << QenGuiInst::GetAppHandle()
+       << ":TRIG:MODE?\n"
+          "  handle          print the application handle\n"
+          "  help            this text\n"
+          "  quit, exit      leave (end of input too)\n"
+          "Examples:\n"
+          "  ::TRIG:MODE?\n"
+          "  ::CGR1:PER 2.5E-9;::CGR1:FREQ?\n"
+          "  ::SYST:ERR?\n";
+}

@@ -1,0 +1,26 @@
+#pragma once
+
+#include <iosfwd>
+
+#include "support/Dstring.h"
+
+// The command console: reads command lines, sends each through the one call path and prints
+// the reply and the drained error queue.
+class ConsoleHost {
+ public:
+  ConsoleHost(std::istream& in, std::ostream& out) : mIn(in), mOut(out) {}
+
+  // Runs until end of input or "quit"; returns the process exit code.
+  int Run();
+  // Handles one line; false when the console should end.
+  bool HandleLine(const Dstring& line);
+
+  // "::TRIG:MODE?" stands for ":<handle>:TRIG:MODE?", the same after each ";".
+  static Dstring ExpandHandle(const Dstring& line, const Dstring& handle);
+
+ private:
+  void PrintHelp();
+
+  std::istream& mIn;
+  std::ostream& mOut;
+};

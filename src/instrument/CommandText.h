@@ -1,0 +1,16 @@
+#pragma once
+
+#include <string_view>
+
+#include "support/ConditionList.h"
+
+// Guards the command language against user text. User text is always an argument of a
+// format, never the format, and text that would end a quoted argument or start another
+// command is refused before anything is sent.
+class CommandText {
+ public:
+  // 0 when `text` may stand inside a quoted argument; otherwise QenStatus::kBadCommand and
+  // "GUI_COMMAND_BAD_TEXT" naming what was found (a double quote, ";", a line break, a
+  // control character).
+  static int CheckArgument(std::string_view text, ConditionList& list);
+};

@@ -1,0 +1,214 @@
+#include "instrument/QenGuiInst.h"
+
+#include <cctype>
+#include <cstdio>
+#include <cstdlib>
+#include <ctime>
+
+#include "instrument/QenStatus.h"
+#include "support/Condition.h"
+#include "support/LgsDebug.h"
+#include "support/QenEnvironment.h"
+
+std::unique_ptr<QenInstrument> QenGuiInst::mInstrument;
+Dstring QenGuiInst::mAppHandle;
+std::FILE* QenGuiInst::errorlog = nullptr;
+
+namespace {
+
+// A server that keeps answering with errors must not keep the caller here for ever.
+constexpr int kMaxErrorReads = 256;
+
+QenGuiInst::ServerDeathHandler& DeathHandler() {
+  static QenGuiInst::ServerDeathHandler handler = [](const Dstring& message) {
+    std::fprintf(stderr, "%s\n", message.c_str());
+    std::exit(0);
+  };
+  return handler;
+}
+
+// The leading signed decimal integer of an error-queue entry; false when there is none.
+bool LeadingCode(const Dstring& text, long& code) {
+  const char* begin = text.c_str();
+  char* end = nullptr;
+  code = std::strtol(begin, &end, 10);
+  return end != begin;
+}
+
+}  // namespace
+
+void QenGuiInst::Init() {
+  mInstrument.reset();
+  mAppHandle.clear();
+  Dstring path = QenEnvironment::GetLogDirectory() + "/qengui.log";
+  errorlog = std::fopen(path.c_str(), "w");
+  if (!errorlog) std::fprintf(stderr, "Unable to create logfile\n");
+}
+
+void QenGuiInst::End() {
+  if (errorlog) std::fclose(errorlog);
+  errorlog = nullptr;
+  mInstrument.reset();
+  mAppHandle.clear();
+}
+
+void QenGuiInst::SetInstrument(std::unique_ptr<QenInstrument> instrument) {
+  if (mInstrument) mInstrument->Disconnect();
+  mInstrument = std::move(instrument);
+}
+
+int QenGuiInst::IsConnectedToServer() { return mInstrument ? 1 : 0; }
+
+int QenGuiInst::DisconnectFromServer(ConditionList&) {
+  if (!mInstrument) return QenStatus::kOk;
+  int status = mInstrument->Disconnect();
+  mInstrument.reset();
+  return status;
+}
+
+Dstring QenGuiInst::GetHandleFromCommand(const Dstring& cmd) {
+  std::string_view rest(cmd);
+  if (rest.starts_with(':')) rest.remove_prefix(1);
+  auto colon = rest.find(':');
+  Dstring first = Dstring(rest.substr(0, colon)).ToUpper();
+  if (first != "L" && first != "VC" && first != "RC" && first != "SR") return first;
+  if (colon == std::string_view::npos) return {};
+  rest.remove_prefix(colon + 1);
+  return Dstring(rest.substr(0, rest.find(':')));
+}
+
+int QenGuiInst::Call(const Dstring& cmd, Dstring& reply, ConditionList& list) {
+  return Call(mInstrument.get(), cmd, reply, list);
+}
+
+int QenGuiInst::Call(QenInstrument* instrument, const Dstring& cmd, Dstring& reply, ConditionList& list) {
+  LgsDebug trace("QenGuiInst::Call ", "qenguiinst,traffic");
+  if (trace.IsOn()) {
+    std::time_t now = std::time(nullptr);
+    char stamp[32];
+    std::strftime(stamp, sizeof stamp, "%H:%M:%S", std::localtime(&now));
+    trace.Printf("%s\nCommand : %s\n", stamp, cmd.c_str());
+  }
+  int status = instrument ? instrument->Call(cmd, reply) : QenStatus::kNotConnected;
+  trace.Printf("Response: %s\n", reply.c_str());
+  trace.Printf("Error   : %i\n\n", status);
+  if (status == QenStatus::kServerTerminated) {
+    trace.Printf("Error   : Server has terminated. Shutdown.\n");
+    Log("Server has terminated. Shutdown.\n");
+    DeathHandler()(kServerDeathMessage);
+    return status;
+  }
+  if (status != QenStatus::kOk && status != QenStatus::kLocked) {
+    GetErrors(instrument, GetHandleFromCommand(cmd), status, list);
+  }
+  return status;
+}
+
+namespace {
+
+void AddEntry(const Dstring& text, ConditionList& list) {
+  Condition condition;
+  if (QenGuiInst::ParseErrorMsg(text, condition) == 0) {
+    list.Add(condition);
+  } else {
+    list.Add(0, text);
+    list.Add(0, "Unable to parse error message");
+  }
+}
+
+}  // namespace
+
+void QenGuiInst::GetErrors(QenInstrument* instrument, const Dstring& handle, int& status, ConditionList& list) {
+  LgsDebug trace("QenGuiInst::GetErrors ", "qenguiinst,traffic");
+  if (status < 0 || !instrument) {
+    Dstring message = QenInstrument::GetErrMessage(instrument ? status : QenStatus::kNotConnected);
+    trace.Printf("Error   : %s\n", message.c_str());
+    AddEntry(message, list);
+    return;
+  }
+  const Dstring query = Dstring::Format(":%s:SYST:ERR?", handle.c_str());
+  for (int reads = 0; reads < kMaxErrorReads; ++reads) {
+    Dstring reply;
+    int queryStatus = instrument->Call(query, reply);
+    if (queryStatus == QenStatus::kLocked) {
+      trace.Printf("Error   : Locked\n");
+      Log("Locked\n");
+      status = QenStatus::kLocked;
+      return;
+    }
+    if (queryStatus != QenStatus::kOk) {
+      AddEntry(QenInstrument::GetErrMessage(QenStatus::kCommError), list);
+      return;
+    }
+    long code = 0;
+    if (LeadingCode(reply, code) && code == 0) return;
+    trace.Printf("Error   : %s\n", reply.c_str());
+    Log(reply + "\n");
+    AddEntry(reply, list);
+  }
+}
+
+int QenGuiInst::ClearErrorQueue(QenInstrument* instrument, const Dstring& handle) {
+  if (!instrument) return QenStatus::kNotConnected;
+  const Dstring query = Dstring::Format(":%s:SYST:ERR?", handle.c_str());
+  int status = QenStatus::kOk;
+  for (int reads = 0; reads < kMaxErrorReads; ++reads) {
+    Dstring reply;
+    status = instrument->Call(query, reply);
+    long code = 0;
+    if (status != QenStatus::kOk || (LeadingCode(reply, code) && code == 0)) break;
+  }
+  return status;
+}
+
+int QenGuiInst::ParseErrorMsg(const Dstring& text, long& code, long& position, Dstring& message) {
+  std::size_t i = text.find_first_not_of(" \t");
+  if (i == Dstring::npos) return 1;
+  std::size_t digits = i + ((text[i] == '-' || text[i] == '+') ? 1 : 0);
+  std::size_t end = digits;
+  while (end < text.size() && std::isdigit(static_cast<unsigned char>(text[end]))) ++end;
+  if (end == digits || end - digits > 9) return 1;
+  std::size_t quote = text.find_first_not_of(" \t", end + 1);
+  if (end >= text.size() || text[end] != ',' || quote == Dstring::npos || text[quote] != '"') return 1;
+  Dstring body;
+  std::size_t k = quote + 1;
+  for (;; ++k) {
+    if (k >= text.size()) return 1;
+    if (text[k] != '"') {
+      body += text[k];
+    } else if (k + 1 < text.size() && text[k + 1] == '"') {
+      body += '"';
+      ++k;
+    } else {
+      break;
+    }
+  }
+  if (text.find_first_not_of(" \t\r\n", k + 1) != Dstring::npos) return 1;
+  code = std::strtol(text.c_str() + i, nullptr, 10);
+  position = static_cast<long>(quote + 1);
+  message = std::move(body);
+  return 0;
+}
+
+int QenGuiInst::ParseErrorMsg(const Dstring& text, Condition& condition) {
+  long code = 0;
+  long position = 0;
+  Dstring message;
+  if (ParseErrorMsg(text, code, position, message) != 0) return 1;
+  condition = Condition(code, message);
+  return 0;
+}
+
+void QenGuiInst::FormatErrorStr(Dstring& message, int code) {
+  message = message.Trimmed();
+  if (message.empty()) message = Dstring::Format("Error %d", code);
+  if (!message.EndsWith(".") && !message.EndsWith("!") && !message.EndsWith("?")) message += '.';
+}
+
+void QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) { DeathHandler() = std::move(handler); }
+
+void QenGuiInst::Log(const Dstring& text) {
+  if (!errorlog) return;
+  std::fputs(text.c_str(), errorlog);
+  std::fflush(errorlog);
+}

@@ -1,0 +1,56 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+
+#include "instrument/QenInstrument.h"
+#include "support/ConditionList.h"
+#include "support/DstringList.h"
+
+class Condition;
+
+// The one call path to the instrument server. Keeps the connection and the application
+// handle, sends every command, and on failure drains the handle's error queue into the
+// caller's ConditionList. Static: lives from Init to End.
+class QenGuiInst {
+ public:
+  static void Init();
+  static void End();
+
+  // Takes the connection; the previous one is disconnected and deleted.
+  static void SetInstrument(std::unique_ptr<QenInstrument> instrument);
+  static QenInstrument* GetInstrument() { return mInstrument.get(); }
+  static int IsConnectedToServer();
+  static int DisconnectFromServer(ConditionList& list);
+
+  static Dstring GetAppHandle() { return mAppHandle; }
+  static void SetAppHandle(const Dstring& handle) { mAppHandle = handle; }
+  static Dstring GetHandleFromCommand(const Dstring& cmd);
+
+  static int Call(const Dstring& cmd, Dstring& reply, ConditionList& list);
+  static int Call(QenInstrument* instrument, const Dstring& cmd, Dstring& reply, ConditionList& list);
+  static int ClearErrorQueue(QenInstrument* instrument, const Dstring& handle);
+  static void GetErrors(QenInstrument* instrument, const Dstring& handle, int& status, ConditionList& list);
+
+  // Reads an error-queue entry: a signed decimal code, a comma, then the message in double
+  // quotes. Returns 0 when it parsed.
+  static int ParseErrorMsg(const Dstring& text, long& code, long& position, Dstring& message);
+  static int ParseErrorMsg(const Dstring& text, Condition& condition);
+  // The user-facing form of a message: a status of the client gets its plain text.
+  static void FormatErrorStr(Dstring& message, int code);
+
+  // What happens when the server has died (-18): the message is shown and the process ends
+  // with exit code 0. The GUI installs its own alert; tests install one that records.
+  using ServerDeathHandler = std::function<void(const Dstring& message)>;
+  static void SetServerDeathHandler(ServerDeathHandler handler);
+
+  static constexpr const char* kServerDeathMessage =
+      "The user interface will be terminated\nbecause the firmware server has died.";
+
+ private:
+  static void Log(const Dstring& text);
+
+  static std::unique_ptr<QenInstrument> mInstrument;
+  static Dstring mAppHandle;
+  static std::FILE* errorlog;
+};

@@ -1,0 +1,45 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "instrument/Frame.h"
+#include "instrument/QenInstrument.h"
+
+// The instrument client over TCP (docs/protocol.md). Blocking calls, each bounded by a
+// time-out: a reply that does not arrive in time gives QenStatus::kTimeOut and the
+// connection stays up; the late reply is recognised by its id and dropped on the next call.
+class QenTcpInstrument : public QenInstrument {
+ public:
+  static constexpr unsigned short kDefaultPort = 7130;
+
+  QenTcpInstrument();
+  ~QenTcpInstrument() override;
+  QenTcpInstrument(const QenTcpInstrument&) = delete;
+  QenTcpInstrument& operator=(const QenTcpInstrument&) = delete;
+
+  int Connect(const Dstring& host, unsigned short port) override;
+  int Disconnect() override;
+  bool IsConnected() const override { return mFd >= 0; }
+  int Call(const Dstring& cmd, Dstring& reply) override;
+
+  void SetConnectTimeoutMs(int ms) { mConnectTimeoutMs = ms; }
+  void SetReplyTimeoutMs(int ms) { mReplyTimeoutMs = ms; }
+  int GetReplyTimeoutMs() const { return mReplyTimeoutMs; }
+
+ private:
+  int SendAll(const std::string& bytes, long long deadline);
+  int ReadReply(std::uint32_t id, Dstring& reply, long long deadline);
+  int WaitFor(short events, long long deadline);
+  int Drop(int status);
+
+  int mFd = -1;
+  // Set when the connection broke under us: every later call reports the server as gone.
+  bool mLost = false;
+  // Bytes received but not yet taken as a frame; a time-out in mid-frame keeps them, so the
+  // stream stays in step and the late reply is recognised and dropped on the next call.
+  FrameDecoder mReceived;
+  std::uint32_t mNextId = 1;
+  int mConnectTimeoutMs = 5000;
+  int mReplyTimeoutMs = 30000;
+};

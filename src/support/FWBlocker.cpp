@@ -1,0 +1,41 @@
+#include "support/FWBlocker.h"
+
+#include "support/ConditionListLoader.h"
+
+namespace {
+
+FWBlocker::LockProbe* gProbe = nullptr;
+const FWBlocker* gInnermost = nullptr;
+
+constexpr std::string_view kNestingByDesign[] = {"QenDs::Update", "Dte::Write"};
+
+bool NestsByDesign(std::string_view name) {
+  for (auto n : kNestingByDesign) {
+    if (n == name) return true;
+  }
+  return false;
+}
+
+}  // namespace
+
+FWBlocker::FWBlocker(std::string_view name, ConditionList& list) : mName(name), mList(list), mOuter(gInnermost) {
+  gInnermost = this;
+}
+
+FWBlocker::~FWBlocker() { gInnermost = mOuter; }
+
+int FWBlocker::Block() {
+  if (mAsked) return mResult;
+  mAsked = true;
+  if (gProbe && gProbe->IsInstrumentLocked()) return mResult = kLocked;
+  if (NestsByDesign(mName)) return mResult = 0;
+  for (const FWBlocker* outer = mOuter; outer; outer = outer->mOuter) {
+    if (outer->mName == mName) {
+      ConditionListLoader::ConditionToken(mList, "GUI_OPERATION_BUSY", {Dstring(mName)}, kBusy);
+      return mResult = kBusy;
+    }
+  }
+  return mResult = 0;
+}
+
+void FWBlocker::SetLockProbe(LockProbe* probe) { gProbe = probe; }
