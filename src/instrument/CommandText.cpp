@@ -13,15 +13,31 @@ const char* Offence(char c) {
   return nullptr;
 }
 
+int Refuse(std::string_view text, const char* offence, ConditionList& list) {
+  ConditionListLoader::ConditionToken(list, "GUI_COMMAND_BAD_TEXT", {Dstring(text), Dstring(offence)},
+                                      QenStatus::kBadCommand);
+  return QenStatus::kBadCommand;
+}
+
 }  // namespace
 
 int CommandText::CheckArgument(std::string_view text, ConditionList& list) {
   for (char c : text) {
-    if (const char* offence = Offence(c)) {
-      ConditionListLoader::ConditionToken(list, "GUI_COMMAND_BAD_TEXT", {Dstring(text), Dstring(offence)},
-                                          QenStatus::kBadCommand);
-      return QenStatus::kBadCommand;
-    }
+    if (const char* offence = Offence(c)) return Refuse(text, offence, list);
   }
   return QenStatus::kOk;
+}
+
+int CommandText::CheckValue(std::string_view text, ConditionList& list) {
+  char quote = 0;
+  for (char c : text) {
+    if (quote == 0 && (c == '"' || c == '\'')) {
+      quote = c;
+    } else if (c == quote) {
+      quote = 0;
+    } else if (const char* offence = Offence(c); offence && (c != ';' || quote == 0) && c != '"') {
+      return Refuse(text, offence, list);
+    }
+  }
+  return quote ? Refuse(text, "a quote that is never closed", list) : QenStatus::kOk;
 }

@@ -13,4 +13,7 @@ class CommandText {
   // "GUI_COMMAND_BAD_TEXT" naming what was found (a double quote, ";", a line break, a
   // control character).
   static int CheckArgument(std::string_view text, ConditionList& list);
+  // 0 when `text` may stand as a whole value after a header: quoted strings may hold ";",
+  // but no line break or control character anywhere, no ";" outside quotes and no open quote.
+  static int CheckValue(std::string_view text, ConditionList& list);
 };

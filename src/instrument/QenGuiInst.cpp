@@ -7,12 +7,15 @@
 
 #include "instrument/QenStatus.h"
 #include "support/Condition.h"
+#include "support/FWBlocker.h"
 #include "support/LgsDebug.h"
 #include "support/QenEnvironment.h"
+#include "toolkit/Toolkit.h"
 
 std::unique_ptr<QenInstrument> QenGuiInst::mInstrument;
 Dstring QenGuiInst::mAppHandle;
 std::FILE* QenGuiInst::errorlog = nullptr;
+bool QenGuiInst::mLocked = false;
 
 namespace {
 
@@ -21,11 +24,18 @@ constexpr int kMaxErrorReads = 256;
 
 QenGuiInst::ServerDeathHandler& DeathHandler() {
   static QenGuiInst::ServerDeathHandler handler = [](const Dstring& message) {
-    std::fprintf(stderr, "%s\n", message.c_str());
+    Toolkit::Get().Alert(message, ToolkitPort::Icon::Critical);
     std::exit(0);
   };
   return handler;
 }
+
+class GuiInstLockProbe : public FWBlocker::LockProbe {
+ public:
+  bool IsInstrumentLocked() override { return QenGuiInst::IsInstrumentLocked(); }
+};
+
+GuiInstLockProbe gLockProbe;
 
 // The leading signed decimal integer of an error-queue entry; false when there is none.
 bool LeadingCode(const Dstring& text, long& code) {
@@ -40,12 +50,15 @@ bool LeadingCode(const Dstring& text, long& code) {
 void QenGuiInst::Init() {
   mInstrument.reset();
   mAppHandle.clear();
+  mLocked = false;
+  FWBlocker::SetLockProbe(&gLockProbe);
   Dstring path = QenEnvironment::GetLogDirectory() + "/qengui.log";
   errorlog = std::fopen(path.c_str(), "w");
   if (!errorlog) std::fprintf(stderr, "Unable to create logfile\n");
 }
 
 void QenGuiInst::End() {
+  FWBlocker::SetLockProbe(nullptr);
   if (errorlog) std::fclose(errorlog);
   errorlog = nullptr;
   mInstrument.reset();
@@ -90,6 +103,9 @@ int QenGuiInst::Call(QenInstrument* instrument, const Dstring& cmd, Dstring& rep
     trace.Printf("%s\nCommand : %s\n", stamp, cmd.c_str());
   }
   int status = instrument ? instrument->Call(cmd, reply) : QenStatus::kNotConnected;
+  if (instrument == mInstrument.get() && (status == QenStatus::kLocked || status >= QenStatus::kOk)) {
+    mLocked = status == QenStatus::kLocked;
+  }
   trace.Printf("Response: %s\n", reply.c_str());
   trace.Printf("Error   : %i\n\n", status);
   if (status == QenStatus::kServerTerminated) {
@@ -203,6 +219,31 @@ void QenGuiInst::FormatErrorStr(Dstring& message, int code) {
   message = message.Trimmed();
   if (message.empty()) message = Dstring::Format("Error %d", code);
   if (!message.EndsWith(".") && !message.EndsWith("!") && !message.EndsWith("?")) message += '.';
+}
+
+bool QenGuiInst::IsInstrumentLocked() {
+  if (!mLocked || !mInstrument) return false;
+  Dstring reply;
+  int status = mInstrument->Call(Dstring::Format("%s:SGEN:GLOB:INIT:CONT?", mAppHandle.c_str()), reply);
+  if (status != QenStatus::kLocked) mLocked = false;
+  return mLocked;
+}
+
+Dstring QenGuiInst::ErrorDlgText(const ConditionList& list) {
+  Dstring text;
+  for (const auto& condition : list) {
+    Dstring message = condition.GetMessage();
+    FormatErrorStr(message, static_cast<int>(condition.GetCode()));
+    if (!text.empty()) text += "\n----------\n";
+    text.AppendPrintf("ERROR %li\n\n%s", condition.GetCode(), message.c_str());
+  }
+  return text;
+}
+
+int QenGuiInst::ShowErrorDlg(ConditionList& list, int) {
+  if (list.IsEmpty()) return 0;
+  Toolkit::Get().Alert(ErrorDlgText(list), ToolkitPort::Icon::Critical);
+  return 0;
 }
 
 void QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) { DeathHandler() = std::move(handler); }

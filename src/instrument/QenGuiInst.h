@@ -36,13 +36,21 @@ class QenGuiInst {
   // quotes. Returns 0 when it parsed.
   static int ParseErrorMsg(const Dstring& text, long& code, long& position, Dstring& message);
   static int ParseErrorMsg(const Dstring& text, Condition& condition);
-  // The user-facing form of a message: a status of the client gets its plain text.
+  // The user-facing form of a message: trimmed, never empty, ending in a full stop.
   static void FormatErrorStr(Dstring& message, int code);
+  // Shows the conditions in one critical alert: "ERROR <code>\n\n<message>" each, joined by a
+  // line of dashes. Nothing is shown for an empty list.
+  static int ShowErrorDlg(ConditionList& list, int);
+  static Dstring ErrorDlgText(const ConditionList& list);
 
   // What happens when the server has died (-18): the message is shown and the process ends
   // with exit code 0. The GUI installs its own alert; tests install one that records.
   using ServerDeathHandler = std::function<void(const Dstring& message)>;
   static void SetServerDeathHandler(ServerDeathHandler handler);
+
+  // Whether the last exchange found the instrument held by another client. While it is, the
+  // operation guards ask the server again (a harmless query) until the lock is gone.
+  static bool IsInstrumentLocked();
 
   static constexpr const char* kServerDeathMessage =
       "The user interface will be terminated\nbecause the firmware server has died.";
@@ -53,4 +61,5 @@ class QenGuiInst {
   static std::unique_ptr<QenInstrument> mInstrument;
   static Dstring mAppHandle;
   static std::FILE* errorlog;
+  static bool mLocked;
 };

@@ -1,0 +1,290 @@
+#include "core/uiapp.h"
+
+#include "data/BerSvr.h"
+#include "data/ConnectDs.h"
+#include "data/DataPortOneLockDs.h"
+#include "data/DirtyFlagDs.h"
+#include "data/Dte.h"
+#include "data/GuiLockDs.h"
+#include "data/PLLStateDs.h"
+#include "data/QenParamDs.h"
+#include "data/RunStopDs.h"
+#include "data/SystemStateDs.h"
+#include "instrument/AppHandle.h"
+#include "instrument/QenGuiInst.h"
+#include "instrument/QenStatus.h"
+#include "support/ErrorMgr.h"
+#include "support/FWBlocker.h"
+#include "support/MessageCatalogue.h"
+#include "support/QenEnvironment.h"
+#include "toolkit/Toolkit.h"
+
+RunStopDs* uiapp::mRunStopDs = nullptr;
+SystemStateDs* uiapp::mSystemStateDs = nullptr;
+PLLStateDs* uiapp::mPLLStateDs = nullptr;
+DataPortOneLockDs* uiapp::mDataPortOneLockDs = nullptr;
+ConnectDs* uiapp::mConnectDs = nullptr;
+DirtyFlagDs* uiapp::mDirtyFlagDs = nullptr;
+GuiLockDs* uiapp::mGuiLockDs = nullptr;
+BerSvr* uiapp::mBerSvr = nullptr;
+ErrorMgr* uiapp::mErrorMgr = nullptr;
+unsigned long uiapp::mConfigParamSet = 0;
+Dstring uiapp::mResource = "QEN1";
+MeasTimer uiapp::mTime;
+double uiapp::mTimeOfLastTimeOut = 0.0;
+double uiapp::mExpectedTimeOfNextTimeOut = 1.0;
+unsigned uiapp::inMainLoop = 0;
+unsigned uiapp::callSyncAlarmProc = 0;
+unsigned uiapp::isProcessingSyncAlarmProc = 0;
+
+// Script items handed to the toolkit: the state words a script may compare with, the events a
+// script may wait for, and the actions it may call.
+std::vector<Dstring> uiapp::mConstants = {"PROG", "RUNN", "HALT", "FIN", "SAB", "SYNC",
+                                          "LOCK", "UNKN", "UCDR", "UDAT", "FREE", "DMUX"};
+std::vector<Dstring> uiapp::mEvents = {"RunStopChanged", "SystemStateChanged", "PLLStateChanged",
+                                       "DataPortOneLockChanged", "ConnectChanged", "GuiLockChanged"};
+std::vector<Dstring> uiapp::mVerbs = {"uiapp.Run", "uiapp.Stop", "uiapp.SequenceForce", "uiapp.CheckTriggerMode",
+                                      "uiapp.Connect", "uiapp.Disconnect"};
+
+namespace {
+
+constexpr double kPollSeconds = 1.0;
+constexpr double kShortestPollSeconds = 0.5;
+
+// The five sources that re-read their values when the server reports changes, in the order
+// they are registered on the dirty-flag source.
+template <typename F>
+void ForEachStateView(F f, RunStopDs* r, SystemStateDs* s, PLLStateDs* p, DataPortOneLockDs* d, ConnectDs* c) {
+  f(static_cast<QenDsView*>(r));
+  f(static_cast<QenDsView*>(s));
+  f(static_cast<QenDsView*>(p));
+  f(static_cast<QenDsView*>(d));
+  f(static_cast<QenDsView*>(c));
+}
+
+}  // namespace
+
+const std::vector<Dstring>& uiapp::WindowResources() {
+  static const std::vector<Dstring> resources = {
+      "paramedit.ParamEd", "bconnect.ConnectWin", "dataedit.SegmentEditWin", "errstate.ErrStateWin",
+      "seqedit.SeqEdWin",  "deskew.DeskewWin",    "ber.BerWin",              "measconf.MeasMode",
+      "dtecmd.CmdWin",     "error.ErrorWin",      "wavewin.WaveWin",         "LoopGridEdit.Win",
+      "smseqedit.Win"};
+  return resources;
+}
+
+int uiapp::Init(ConditionList& list) {
+  mConfigParamSet = QenEnvironment::GetConfigParamSet();
+  mErrorMgr = new ErrorMgr;
+  mDirtyFlagDs = new DirtyFlagDs;
+  mRunStopDs = new RunStopDs;
+  mSystemStateDs = new SystemStateDs;
+  mPLLStateDs = new PLLStateDs;
+  mDataPortOneLockDs = new DataPortOneLockDs;
+  mConnectDs = new ConnectDs;
+  mGuiLockDs = new GuiLockDs;
+  mBerSvr = new BerSvr;
+  ForEachStateView([&](QenDsView* v) { mDirtyFlagDs->RegisterView(v, list); }, mRunStopDs, mSystemStateDs,
+                   mPLLStateDs, mDataPortOneLockDs, mConnectDs);
+  mSystemStateDs->RegisterProc(&uiapp::NfyViewDataUpdatedSysState, nullptr);
+  QenGuiInst::Init();
+  Dte::Init(mDirtyFlagDs, mErrorMgr);
+  return 0;
+}
+
+int uiapp::End(ConditionList& list) {
+  const Dstring handle = QenGuiInst::GetAppHandle();
+  if (!handle.empty()) {
+    Toolkit::Get().StopCBackAlarm();
+    callSyncAlarmProc = 0;
+    mBerSvr->End();
+    DestroyAppHandle(handle, list);
+  }
+  Dte::End();
+  if (QenGuiInst::IsConnectedToServer()) QenGuiInst::DisconnectFromServer(list);
+  QenGuiInst::End();
+  delete mErrorMgr;
+  mErrorMgr = nullptr;
+  mSystemStateDs->UnregisterProc(&uiapp::NfyViewDataUpdatedSysState, nullptr);
+  ForEachStateView([&](QenDsView* v) { mDirtyFlagDs->UnregisterView(v, list); }, mRunStopDs, mSystemStateDs,
+                   mPLLStateDs, mDataPortOneLockDs, mConnectDs);
+  for (QenDs* source : std::initializer_list<QenDs*>{mDirtyFlagDs, mRunStopDs, mSystemStateDs, mPLLStateDs,
+                                                     mDataPortOneLockDs, mConnectDs, mGuiLockDs, mBerSvr}) {
+    source->Release();
+  }
+  mDirtyFlagDs = nullptr;
+  mRunStopDs = nullptr;
+  mSystemStateDs = nullptr;
+  mPLLStateDs = nullptr;
+  mDataPortOneLockDs = nullptr;
+  mConnectDs = nullptr;
+  mGuiLockDs = nullptr;
+  mBerSvr = nullptr;
+  return 0;
+}
+
+void uiapp::RegisterConstants() { Toolkit::Get().RegisterScriptItems("constants", mConstants, 1); }
+void uiapp::RegisterEvents() { Toolkit::Get().RegisterScriptItems("events", mEvents, 1); }
+void uiapp::RegisterVerbs() { Toolkit::Get().RegisterScriptItems("verbs", mVerbs, 1); }
+
+void uiapp::RegisterWindows() {
+  for (const auto& resource : WindowResources()) Toolkit::Get().RegisterWindow(resource);
+}
+
+void uiapp::UnregisterWindows() {
+  for (const auto& resource : WindowResources()) Toolkit::Get().UnregisterWindow(resource);
+}
+
+void uiapp::RegistrationFinished() {
+  ConditionList list;
+  FWBlocker guard("uiapp::RegistrationFinished", list);
+  if (guard.Block()) return;
+  Dstring reply;
+  const Dstring cmd = Dstring::Format(":%s:MMEM:SETT:NEW", QenGuiInst::GetAppHandle().c_str());
+  if (QenGuiInst::Call(cmd, reply, list) != QenStatus::kOk) {
+    QenGuiInst::ShowErrorDlg(list, 1);
+    list.Clear();
+  }
+}
+
+int uiapp::CreateAppHandle(Dstring& handle, const Dstring& resource, ConditionList& list) {
+  return AppHandle::Create(QenGuiInst::GetInstrument(), handle, resource, list);
+}
+
+int uiapp::DestroyAppHandle(const Dstring& handle, ConditionList& list) {
+  return AppHandle::Destroy(QenGuiInst::GetInstrument(), handle, list);
+}
+
+void uiapp::MakeAppHandleFromResourceName(Dstring& handle, const Dstring& resource) {
+  handle = AppHandle::MakeFromResourceName(resource);
+}
+
+int uiapp::GetCurrentResource(Dstring& resource, ConditionList&) {
+  resource = mResource;
+  return 0;
+}
+
+int uiapp::Connect(ConditionList& list) { return mConnectDs->Connect(list); }
+int uiapp::Disconnect(ConditionList& list) { return mConnectDs->Disconnect(list); }
+
+int uiapp::Run(ConditionList& list) {
+  FWBlocker guard("uiapp::Run", list);
+  if (int status = guard.Block()) return status;
+  return mRunStopDs->Run(list);
+}
+
+int uiapp::Stop(ConditionList& list) { return mRunStopDs->Stop(list); }
+
+void uiapp::NfyDelayedStop(void*) {
+  ConditionList dropped;
+  Stop(dropped);
+}
+
+int uiapp::SequenceForce(ConditionList& list) {
+  FWBlocker guard("uiapp::SequenceForce", list);
+  if (int status = guard.Block()) return status;
+  Dstring reply;
+  return QenGuiInst::Call(Dstring::Format(":%s:SGEN:GLOB:SEQ:FORC", QenGuiInst::GetAppHandle().c_str()), reply, list);
+}
+
+int uiapp::CheckTriggerMode(ConditionList& list) {
+  FWBlocker guard("uiapp::CheckTriggerMode", list);
+  if (int status = guard.Block()) return status;
+  QenParamDs* mode = Dte::AllocDsByName(Dstring::Format(":%s:TRIG:MODE", QenGuiInst::GetAppHandle().c_str()), 0);
+  Dstring value;
+  int status = mode->QueryStrValue(value, list);
+  if (status == 0 && value != "SEQ") {
+    const Dstring* question = MessageCatalogue::Find("sequence.StrRTriggerModeSetToClock");
+    if (Toolkit::Get().AskYesNo(question ? *question : Dstring()) == ToolkitPort::kYes) {
+      status = mode->SetStrValue("SEQ", list);
+    }
+  }
+  Dte::FreeDs(mode);
+  return status;
+}
+
+void uiapp::StartPolling() {
+  callSyncAlarmProc = 0;
+  isProcessingSyncAlarmProc = 0;
+  mTime.Reset();
+  mTimeOfLastTimeOut = 0.0;
+  mExpectedTimeOfNextTimeOut = kPollSeconds;
+  Toolkit::Get().StartCBackAlarm(1000, &uiapp::AsyncAlarmProc, nullptr);
+}
+
+void uiapp::EndPolling() {
+  Toolkit::Get().StopCBackAlarm();
+  callSyncAlarmProc = 0;
+  isProcessingSyncAlarmProc = 0;
+}
+
+void uiapp::AsyncAlarmProc(void*) {
+  if (!isProcessingSyncAlarmProc) {
+    callSyncAlarmProc = 1;
+    AsyncTimeOut();
+  }
+  const double now = mTime.Get();
+  mTimeOfLastTimeOut = now;
+  // A late tick is made up by a shorter next interval, never shorter than half a second.
+  double delay = kPollSeconds - (now - mExpectedTimeOfNextTimeOut);
+  if (delay < kShortestPollSeconds) delay = kShortestPollSeconds;
+  mExpectedTimeOfNextTimeOut = now + delay;
+  Toolkit::Get().StartCBackAlarm(static_cast<unsigned>(delay * 1000.0), &uiapp::AsyncAlarmProc, nullptr);
+}
+
+int uiapp::AfterLockReleased(ConditionList& list) {
+  mDirtyFlagDs->ForceUpdate();
+  if (!mBerSvr->IsInitialized()) mBerSvr->Init(list);
+  return mGuiLockDs->UnLock(list);
+}
+
+void uiapp::AsyncTimeOut() {
+  ConditionList dropped;
+  FWBlocker guard("uiapp::AsyncTimeOut", dropped);
+  const int blocked = guard.Block();
+  if (blocked == QenStatus::kLocked) {
+    if (!mGuiLockDs->IsLocked()) {
+      mGuiLockDs->Lock(dropped);
+      // Whatever the other client did, the service is set up anew once the instrument is free.
+      mBerSvr->End();
+    }
+    return;
+  }
+  if (blocked) return;
+  if (mGuiLockDs->IsLocked() && AfterLockReleased(dropped) != 0) return;
+  if (!mDirtyFlagDs->IsDirty() && mDirtyFlagDs->UpdateFromFW(dropped) != 0) return;
+  const SysStateEnum state = mSystemStateDs->GetState();
+  if (state >= kSysRunning && state <= kSysSync) mBerSvr->UpdateFromFW(BerSvr::kReadResults, dropped);
+}
+
+void uiapp::SyncTimeOut() {
+  ConditionList dropped;
+  if (mDirtyFlagDs->IsDirty()) mDirtyFlagDs->Update(dropped);
+}
+
+void uiapp::MainLoop() {
+  ToolkitPort& toolkit = Toolkit::Get();
+  toolkit.Update();
+  inMainLoop = 1;
+  callSyncAlarmProc = 0;
+  isProcessingSyncAlarmProc = 0;
+  do {
+    toolkit.ProcessNext();
+    if (callSyncAlarmProc) {
+      isProcessingSyncAlarmProc = 1;
+      callSyncAlarmProc = 0;
+      SyncTimeOut();
+      isProcessingSyncAlarmProc = 0;
+    }
+  } while (inMainLoop);
+  toolkit.Update();
+}
+
+void uiapp::MainLoopExit() { inMainLoop = 0; }
+
+int uiapp::NfyViewDataUpdatedSysState(QenDs*, void*, ConditionList&) { return 0; }
+
+SysStateEnum uiapp::GetSystemState() { return mSystemStateDs->GetState(); }
+PLLStateEnum uiapp::GetPLLState() { return mPLLStateDs->GetState(); }
+DataPortOneLockEnum uiapp::GetDataPortOneLockState() { return mDataPortOneLockDs->GetState(); }
+unsigned uiapp::IsConnected() { return mConnectDs->IsConnected(); }

@@ -1,0 +1,83 @@
+#include "data/BerSvr.h"
+
+#include <string_view>
+
+#include "instrument/QenGuiInst.h"
+#include "support/ConditionListLoader.h"
+#include "support/DataParcel.h"
+#include "support/FWBlocker.h"
+#include "support/ParserExpression.h"
+
+namespace {
+
+constexpr std::string_view kBerSuffix = ":BER";
+
+// "compared,errors,ratio"
+bool ReadResult(std::string_view text, BerSvr::PortResult& result) {
+  DataParcel parcel;
+  ConditionList ignored;
+  if (ParserExpression::Parse(text, parcel, ignored) != 0 || parcel.size() != 3) return false;
+  unsigned long compared = 0;
+  unsigned long errors = 0;
+  double ratio = 0;
+  if (!parcel[0].GetULong(compared) || !parcel[1].GetULong(errors) || !parcel[2].GetDouble(ratio)) return false;
+  result.compared = compared;
+  result.errors = errors;
+  result.ratio = ratio;
+  return true;
+}
+
+}  // namespace
+
+int BerSvr::Init(ConditionList& list) {
+  FWBlocker guard("BerSvr::Init", list);
+  if (int status = guard.Block()) return status;
+  const Dstring handle = QenGuiInst::GetAppHandle();
+  Dstring reply;
+  if (int status = QenGuiInst::Call(Dstring::Format(":L:%s:CGR?", handle.c_str()), reply, list)) return status;
+  std::vector<PortResult> ports;
+  const Dstring prefix = ":" + handle.ToUpper();
+  std::size_t pos = 0;
+  while ((pos = reply.find('"', pos)) != Dstring::npos) {
+    std::size_t end = reply.find('"', pos + 1);
+    if (end == Dstring::npos) break;
+    Dstring header(reply.substr(pos + 1, end - pos - 1));
+    pos = end + 1;
+    if (!header.EndsWith(kBerSuffix) || !header.ToUpper().StartsWith(prefix)) continue;
+    ports.push_back({Dstring(header.substr(prefix.size()))});
+  }
+  mResults = std::move(ports);
+  mInitialized = true;
+  return Update(list, 0);
+}
+
+void BerSvr::End() {
+  mInitialized = false;
+  mResults.clear();
+}
+
+int BerSvr::UpdateFromFW(unsigned what, ConditionList& list) {
+  if (what != kReadResults || !mInitialized || mResults.empty()) return 0;
+  FWBlocker guard("BerSvr::UpdateFromFW", list);
+  if (int status = guard.Block()) return status;
+  const Dstring handle = QenGuiInst::GetAppHandle();
+  Dstring cmd;
+  for (const auto& r : mResults) cmd += (cmd.empty() ? ":" : ";:") + handle + r.port + "?";
+  Dstring reply;
+  if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  std::vector<std::string_view> parts;
+  if (ParserExpression::SplitJoined(reply, parts, list) != 0 || parts.size() != mResults.size()) {
+    ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {cmd, reply}, 1);
+    return 1;
+  }
+  std::vector<PortResult> next = mResults;
+  for (std::size_t i = 0; i < parts.size(); ++i) {
+    if (!ReadResult(parts[i], next[i])) {
+      ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {cmd, Dstring(parts[i])}, 1);
+      return 1;
+    }
+  }
+  if (next == mResults) return 0;
+  mResults = std::move(next);
+  return Update(list, 0);
+}

@@ -1,0 +1,35 @@
+#pragma once
+
+#include <vector>
+
+#include "data/QenDs.h"
+#include "support/Dstring.h"
+
+// The bit error rate service: the compared-bit count, error count and ratio of every analyser
+// port, read from the instrument while it runs and kept in this data source for the views.
+// Init finds the analyser ports (their ":BER" settings, listed with the "L" prefix);
+// UpdateFromFW(1, …) reads all of them in one joined query and tells the views when anything
+// changed. The initialised flag is what the poll tests before setting the service up again
+// after the instrument was held by another client.
+class BerSvr : public QenDs {
+ public:
+  struct PortResult {
+    Dstring port;  // the setting after the handle, as ":CGR1:MOD3:CONN1:BER"
+    unsigned long long compared = 0;
+    unsigned long long errors = 0;
+    double ratio = 0.0;
+    bool operator==(const PortResult&) const = default;
+  };
+
+  static constexpr unsigned kReadResults = 1;
+
+  int Init(ConditionList& list);
+  void End();
+  bool IsInitialized() const { return mInitialized; }
+  int UpdateFromFW(unsigned what, ConditionList& list);
+  const std::vector<PortResult>& GetResults() const { return mResults; }
+
+ private:
+  bool mInitialized = false;
+  std::vector<PortResult> mResults;
+};

@@ -1,0 +1,68 @@
+#pragma once
+
+#include <atomic>
+#include <deque>
+#include <functional>
+#include <set>
+
+#include "toolkit/ToolkitPort.h"
+
+// The toolkit without a display. Time comes from a clock that a test can replace: with a
+// manual clock, ProcessNext jumps straight to the alarm instead of sleeping. Alerts and
+// questions go to a sink and to scripted answers.
+class HeadlessToolkit : public ToolkitPort {
+ public:
+  using Clock = std::function<double()>;
+
+  HeadlessToolkit();
+
+  void StartCBackAlarm(unsigned ms, Proc proc, void* client) override;
+  void StopCBackAlarm() override;
+  void ProcessNext() override;
+  void Update() override;
+  void CallDeferred(Proc proc, void* client) override;
+  void Alert(const Dstring& text, Icon icon) override;
+  int AskYesNo(const Dstring& text) override;
+  void SetWaitCursor(bool on) override { mWaitCursor = on; }
+  bool IsShiftDown() override { return mShiftDown; }
+  void RegisterWindow(const Dstring& resource) override { mWindows.insert(resource); }
+  void UnregisterWindow(const Dstring& resource) override { mWindows.erase(resource); }
+  void RegisterScriptItems(const char* kind, const std::vector<Dstring>& names, unsigned flag) override;
+
+  // A manual clock in seconds: ProcessNext sets `now` to the alarm's time instead of sleeping.
+  void UseManualClock(double* now);
+  // Ends a ProcessNext that is waiting (from a signal handler too).
+  void Interrupt() { mInterrupted = true; }
+
+  void SetShiftDown(bool down) { mShiftDown = down; }
+  void QueueAnswer(int answer) { mAnswers.push_back(answer); }
+  void SetAlertSink(std::function<void(const Dstring&, Icon)> sink) { mAlertSink = std::move(sink); }
+
+  const std::deque<Dstring>& Alerts() const { return mAlerts; }
+  const std::deque<Dstring>& Questions() const { return mQuestions; }
+  const std::set<Dstring>& Windows() const { return mWindows; }
+  bool IsAlarmArmed() const { return mAlarmProc != nullptr; }
+  double AlarmDue() const { return mAlarmDue; }
+  bool IsWaitCursorOn() const { return mWaitCursor; }
+  unsigned ScriptItemCount() const { return mScriptItems; }
+
+ private:
+  double Now() const;
+  bool RunOneDeferred();
+  bool FireAlarmIfDue();
+
+  double* mManualNow = nullptr;
+  Proc mAlarmProc = nullptr;
+  void* mAlarmClient = nullptr;
+  double mAlarmDue = 0.0;
+  std::deque<std::pair<Proc, void*>> mDeferred;
+  std::deque<int> mAnswers;
+  std::deque<Dstring> mAlerts;
+  std::deque<Dstring> mQuestions;
+  std::set<Dstring> mWindows;
+  std::function<void(const Dstring&, Icon)> mAlertSink;
+  std::atomic<bool> mInterrupted{false};
+  bool mShiftDown = false;
+  bool mWaitCursor = false;
+  unsigned mScriptItems = 0;
+};
