@@ -1,5 +1,7 @@
 #include "HostOptions.h"
 
+#include <cctype>
+
 #include "support/ConditionListLoader.h"
 #include "support/Dstring.h"
 
@@ -16,6 +18,15 @@ int ParseAddress(const std::string& text, HostOptions& out, ConditionList& list)
   out.host = text.substr(0, colon);
   out.port = static_cast<unsigned short>(port);
   return 0;
+}
+
+// A parameter header after the handle, as ":TRIG:MODE": nothing that could end the command.
+bool IsHeader(const std::string& text) {
+  if (text.size() < 2 || text[0] != ':') return false;
+  for (char c : text) {
+    if (!std::isalnum(static_cast<unsigned char>(c)) && c != ':' && c != '_') return false;
+  }
+  return true;
 }
 
 int Bad(ConditionList& list, const std::string& what) {
@@ -37,6 +48,19 @@ int HostOptions::Parse(const std::vector<std::string>& args, HostOptions& out, C
     } else if (a == "--console" && hasValue) {
       if (ParseAddress(args[++i], out, list) != 0) return 1;
       haveServer = true;
+    } else if (a == "--headless") {
+      out.mode = Mode::Headless;
+      if (hasValue && !args[i + 1].starts_with("--")) {
+        if (ParseAddress(args[++i], out, list) != 0) return 1;
+        haveServer = true;
+      }
+    } else if (a == "--watch" && hasValue) {
+      if (!IsHeader(args[i + 1])) return Bad(list, a + " " + args[i + 1]);
+      out.watch.push_back(args[++i]);
+    } else if (a == "--seconds" && hasValue) {
+      double seconds = 0;
+      if (!Dstring(args[++i]).ToDouble(seconds) || seconds <= 0) return Bad(list, a + " " + args[i]);
+      out.seconds = seconds;
     } else if (a == "--resource" && hasValue) {
       out.resource = args[++i];
     } else if (a == "--log-dir" && hasValue) {
@@ -54,8 +78,13 @@ int HostOptions::Parse(const std::vector<std::string>& args, HostOptions& out, C
 }
 
 const char* HostOptions::Usage() {
-  return "usage: qengui [--console HOST:PORT | --simulate] [--resource NAME] [--log-dir DIR] [--param-set N]\n"
-         "  --console HOST:PORT  talk to the instrument server at HOST:PORT\n"
+  return "usage: qengui [--console HOST:PORT | --headless [HOST:PORT] | --simulate] [options]\n"
+         "  --console HOST:PORT  command console to the instrument server at HOST:PORT\n"
+         "  --headless [ADDR]    run the application without a display: poll the server and print\n"
+         "                       every change of its state and of the watched parameters\n"
+         "  --watch HEADER       with --headless: also print this parameter (header without the\n"
+         "                       handle, e.g. :TRIG:MODE); may be given several times\n"
+         "  --seconds N          with --headless: end after N seconds (else on SIGINT or SIGTERM)\n"
          "  --simulate           start a private qensim on a free loopback port (the default)\n"
          "  --resource NAME      instrument resource name the application handle is made from (QEN1)\n"
          "  --log-dir DIR        directory of qengui.log (else QEN_LOG_DIR)\n"

@@ -8,7 +8,7 @@
 
 // The command line of the qengui host.
 struct HostOptions {
-  enum class Mode { Console, Help };
+  enum class Mode { Console, Headless, Help };
 
   Mode mode = Mode::Console;
   bool simulate = false;
@@ -17,6 +17,8 @@ struct HostOptions {
   std::string resource = "QEN1";
   std::optional<std::string> logDir;
   std::optional<unsigned long> paramSet;
+  std::vector<std::string> watch;
+  double seconds = 0.0;
 
   // Returns 0, or 1 with a condition naming the bad argument.
   static int Parse(const std::vector<std::string>& args, HostOptions& out, ConditionList& list);

@@ -5,18 +5,90 @@
 #include <vector>
 
 #include "ConsoleHost.h"
+#include "HeadlessHost.h"
 #include "HostOptions.h"
+#include "core/uiapp.h"
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
 #include "instrument/QenStatus.h"
 #include "instrument/QenTcpInstrument.h"
 #include "support/QenEnvironment.h"
+#include "toolkit/HeadlessToolkit.h"
+#include "toolkit/Toolkit.h"
 
 namespace {
 
+HeadlessToolkit* gToolkit = nullptr;
+
 void PrintConditions(const ConditionList& list) {
   for (const auto& c : list) std::cerr << "qengui: " << c.GetCode() << ": " << c.GetMessage() << "\n";
+}
+
+void OnStopSignal(int) {
+  HeadlessHost::RequestStop();
+  if (gToolkit) gToolkit->Interrupt();
+}
+
+// Connects, hands the connection to QenGuiInst and creates the application handle.
+int ConnectAndCreateHandle(const HostOptions& options, ConditionList& list) {
+  auto instrument = std::make_unique<QenTcpInstrument>();
+  if (int status = instrument->Connect(Dstring(options.host), options.port); status != QenStatus::kOk) {
+    std::cerr << "qengui: cannot connect to " << options.host << ":" << options.port << ": "
+              << QenInstrument::GetErrMessage(status) << "\n";
+    return status;
+  }
+  QenGuiInst::SetInstrument(std::move(instrument));
+  const Dstring resource(options.resource);
+  Dstring handle = AppHandle::MakeFromResourceName(resource);
+  if (int status = AppHandle::Create(QenGuiInst::GetInstrument(), handle, resource, list); status != QenStatus::kOk) {
+    PrintConditions(list);
+    return status;
+  }
+  QenGuiInst::SetAppHandle(handle);
+  return QenStatus::kOk;
+}
+
+int RunConsole(const HostOptions& options) {
+  ConditionList list;
+  QenGuiInst::Init();
+  if (ConnectAndCreateHandle(options, list) != QenStatus::kOk) {
+    QenGuiInst::End();
+    return 1;
+  }
+  ConsoleHost console(std::cin, std::cout);
+  int code = console.Run();
+  AppHandle::Destroy(QenGuiInst::GetInstrument(), QenGuiInst::GetAppHandle(), list);
+  QenGuiInst::DisconnectFromServer(list);
+  QenGuiInst::End();
+  return code;
+}
+
+// The application's own start and end order, around the headless main loop.
+int RunHeadless(const HostOptions& options) {
+  HeadlessToolkit toolkit;
+  gToolkit = &toolkit;
+  Toolkit::Install(&toolkit);
+  std::signal(SIGINT, OnStopSignal);
+  std::signal(SIGTERM, OnStopSignal);
+  ConditionList list;
+  uiapp::RegisterConstants();
+  uiapp::RegisterEvents();
+  uiapp::RegisterVerbs();
+  uiapp::RegisterWindows();
+  uiapp::Init(list);
+  uiapp::SetCurrentResource(Dstring(options.resource));
+  int code = 1;
+  if (ConnectAndCreateHandle(options, list) == QenStatus::kOk) {
+    uiapp::RegistrationFinished();
+    HeadlessHost host(std::cout, toolkit, DstringList(options.watch.begin(), options.watch.end()), options.seconds);
+    code = host.Run();
+  }
+  uiapp::End(list);
+  uiapp::UnregisterWindows();
+  Toolkit::Install(nullptr);
+  gToolkit = nullptr;
+  return code;
 }
 
 }  // namespace
@@ -44,31 +116,7 @@ int main(int argc, char** argv) {
     }
     options.host = "127.0.0.1";
     options.port = sim.Port();
-    std::cout << "Started qensim on 127.0.0.1:" << options.port << "\n";
+    std::cout << "Started qensim on 127.0.0.1:" << options.port << std::endl;
   }
-
-  QenGuiInst::Init();
-  auto instrument = std::make_unique<QenTcpInstrument>();
-  if (int status = instrument->Connect(Dstring(options.host), options.port); status != QenStatus::kOk) {
-    std::cerr << "qengui: cannot connect to " << options.host << ":" << options.port << ": "
-              << QenInstrument::GetErrMessage(status) << "\n";
-    QenGuiInst::End();
-    return 1;
-  }
-  QenGuiInst::SetInstrument(std::move(instrument));
-  Dstring handle = AppHandle::MakeFromResourceName(Dstring(options.resource));
-  if (AppHandle::Create(QenGuiInst::GetInstrument(), handle, Dstring(options.resource), list) != QenStatus::kOk) {
-    PrintConditions(list);
-    QenGuiInst::End();
-    return 1;
-  }
-  QenGuiInst::SetAppHandle(handle);
-
-  ConsoleHost console(std::cin, std::cout);
-  int code = console.Run();
-
-  AppHandle::Destroy(QenGuiInst::GetInstrument(), handle, list);
-  QenGuiInst::DisconnectFromServer(list);
-  QenGuiInst::End();
-  return code;
+  return options.mode == HostOptions::Mode::Headless ? RunHeadless(options) : RunConsole(options);
 }

@@ -11,7 +11,7 @@ namespace {
 
 enum class Length { None, Char, Short, Long, LongLong, IntMax, Size, PtrDiff, LongDouble };
 
-struct Spec {
+struct Conversion {
   std::string flags;
   int width = -1;
   int precision = -1;
@@ -19,26 +19,26 @@ struct Spec {
   char conversion = 0;
 };
 
-// Reads one conversion specification after the '%'; returns the position after it.
-const char* ParseSpec(const char* p, Spec& spec, va_list& args) {
-  while (*p && std::strchr("-+ #0", *p)) spec.flags += *p++;
+// Reads one conversion after the '%'; returns the position after it.
+const char* ParseConversion(const char* p, Conversion& conv, va_list& args) {
+  while (*p && std::strchr("-+ #0", *p)) conv.flags += *p++;
   if (*p == '*') {
-    spec.width = va_arg(args, int);
-    if (spec.width < 0) {
-      spec.flags += '-';
-      spec.width = -spec.width;
+    conv.width = va_arg(args, int);
+    if (conv.width < 0) {
+      conv.flags += '-';
+      conv.width = -conv.width;
     }
     ++p;
   } else if (std::isdigit(static_cast<unsigned char>(*p))) {
-    spec.width = static_cast<int>(std::strtol(p, const_cast<char**>(&p), 10));
+    conv.width = static_cast<int>(std::strtol(p, const_cast<char**>(&p), 10));
   }
   if (*p == '.') {
     ++p;
     if (*p == '*') {
-      spec.precision = va_arg(args, int);
+      conv.precision = va_arg(args, int);
       ++p;
     } else {
-      spec.precision = static_cast<int>(std::strtol(p, const_cast<char**>(&p), 10));
+      conv.precision = static_cast<int>(std::strtol(p, const_cast<char**>(&p), 10));
     }
   }
   static const struct { const char* text; Length length; } kLengths[] = {
@@ -47,22 +47,22 @@ const char* ParseSpec(const char* p, Spec& spec, va_list& args) {
   for (const auto& l : kLengths) {
     std::size_t n = std::strlen(l.text);
     if (std::strncmp(p, l.text, n) == 0) {
-      spec.length = l.length;
+      conv.length = l.length;
       p += n;
       break;
     }
   }
-  spec.conversion = *p ? *p++ : 0;
+  conv.conversion = *p ? *p++ : 0;
   return p;
 }
 
-std::string SpecFormat(const Spec& spec, bool withWidth) {
-  std::string f = "%" + spec.flags;
-  if (withWidth && spec.width >= 0) f += std::to_string(spec.width);
-  if (spec.precision >= 0) f += "." + std::to_string(spec.precision);
+std::string ConversionFormat(const Conversion& conv, bool withWidth) {
+  std::string f = "%" + conv.flags;
+  if (withWidth && conv.width >= 0) f += std::to_string(conv.width);
+  if (conv.precision >= 0) f += "." + std::to_string(conv.precision);
   static const char* const kLengthText[] = {"", "hh", "h", "l", "ll", "j", "z", "t", "L"};
-  f += kLengthText[static_cast<int>(spec.length)];
-  f += spec.conversion;
+  f += kLengthText[static_cast<int>(conv.length)];
+  f += conv.conversion;
   return f;
 }
 
@@ -78,10 +78,10 @@ std::string Snprintf(const std::string& format, T value) {
   return big;
 }
 
-std::string FormatInteger(const Spec& spec, va_list& args) {
-  const std::string f = SpecFormat(spec, true);
-  const bool isSigned = spec.conversion == 'd' || spec.conversion == 'i';
-  switch (spec.length) {
+std::string FormatInteger(const Conversion& conv, va_list& args) {
+  const std::string f = ConversionFormat(conv, true);
+  const bool isSigned = conv.conversion == 'd' || conv.conversion == 'i';
+  switch (conv.length) {
     case Length::Long: return isSigned ? Snprintf(f, va_arg(args, long)) : Snprintf(f, va_arg(args, unsigned long));
     case Length::LongLong:
       return isSigned ? Snprintf(f, va_arg(args, long long)) : Snprintf(f, va_arg(args, unsigned long long));
@@ -95,21 +95,21 @@ std::string FormatInteger(const Spec& spec, va_list& args) {
 
 // The exponent of an %E conversion gets at least three digits; width is applied afterwards
 // so that the longer exponent does not break the requested field width.
-std::string FormatExponent(const Spec& spec, va_list& args) {
-  const std::string f = SpecFormat(spec, false);
-  std::string text = spec.length == Length::LongDouble ? Snprintf(f, va_arg(args, long double))
+std::string FormatExponent(const Conversion& conv, va_list& args) {
+  const std::string f = ConversionFormat(conv, false);
+  std::string text = conv.length == Length::LongDouble ? Snprintf(f, va_arg(args, long double))
                                                        : Snprintf(f, va_arg(args, double));
   auto e = text.find_first_of("eE");
   if (e != std::string::npos && e + 2 < text.size()) {
     std::size_t digits = text.size() - (e + 2);
     if (digits < 3) text.insert(e + 2, 3 - digits, '0');
   }
-  if (spec.width > 0 && text.size() < static_cast<std::size_t>(spec.width)) {
-    std::size_t pad = static_cast<std::size_t>(spec.width) - text.size();
+  if (conv.width > 0 && text.size() < static_cast<std::size_t>(conv.width)) {
+    std::size_t pad = static_cast<std::size_t>(conv.width) - text.size();
     const bool finite = e != std::string::npos;
-    if (spec.flags.find('-') != std::string::npos) {
+    if (conv.flags.find('-') != std::string::npos) {
       text.append(pad, ' ');
-    } else if (spec.flags.find('0') != std::string::npos && finite) {
+    } else if (conv.flags.find('0') != std::string::npos && finite) {
       std::size_t at = (text[0] == '-' || text[0] == '+' || text[0] == ' ') ? 1 : 0;
       text.insert(at, pad, '0');
     } else {
@@ -119,13 +119,13 @@ std::string FormatExponent(const Spec& spec, va_list& args) {
   return text;
 }
 
-std::string FormatOne(const Spec& spec, va_list& args) {
-  const std::string f = SpecFormat(spec, true);
-  switch (spec.conversion) {
-    case 'd': case 'i': case 'u': case 'o': case 'x': case 'X': return FormatInteger(spec, args);
-    case 'e': case 'E': return FormatExponent(spec, args);
+std::string FormatOne(const Conversion& conv, va_list& args) {
+  const std::string f = ConversionFormat(conv, true);
+  switch (conv.conversion) {
+    case 'd': case 'i': case 'u': case 'o': case 'x': case 'X': return FormatInteger(conv, args);
+    case 'e': case 'E': return FormatExponent(conv, args);
     case 'f': case 'F': case 'g': case 'G': case 'a': case 'A':
-      return spec.length == Length::LongDouble ? Snprintf(f, va_arg(args, long double))
+      return conv.length == Length::LongDouble ? Snprintf(f, va_arg(args, long double))
                                                : Snprintf(f, va_arg(args, double));
     case 'c': return Snprintf(f, va_arg(args, int));
     case 's': {
@@ -151,9 +151,9 @@ Dstring& Dstring::VPrintf(const char* format, va_list args) {
       break;
     }
     out.append(p, pct);
-    Spec spec;
-    p = ParseSpec(pct + 1, spec, ap);
-    out += FormatOne(spec, ap);
+    Conversion conv;
+    p = ParseConversion(pct + 1, conv, ap);
+    out += FormatOne(conv, ap);
   }
   va_end(ap);
   assign(std::move(out));

@@ -27,6 +27,7 @@ class LispList {
   void Insert(std::size_t at, LispList child);
   void Erase(std::size_t at);
   void Clear() { mChildren.clear(); }
+  void Reserve(std::size_t n) { mChildren.reserve(n); }
   auto begin() const { return mChildren.begin(); }
   auto end() const { return mChildren.end(); }
 

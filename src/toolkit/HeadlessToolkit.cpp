@@ -58,6 +58,11 @@ void HeadlessToolkit::Update() {
 }
 
 void HeadlessToolkit::ProcessNext() {
+  WaitAndHandleOne();
+  if (mAfterEvent) mAfterEvent();
+}
+
+void HeadlessToolkit::WaitAndHandleOne() {
   if (RunOneDeferred() || FireAlarmIfDue()) return;
   if (mManualNow) {
     if (mAlarmProc) {

@@ -33,6 +33,8 @@ class HeadlessToolkit : public ToolkitPort {
   void UseManualClock(double* now);
   // Ends a ProcessNext that is waiting (from a signal handler too).
   void Interrupt() { mInterrupted = true; }
+  // Runs after every ProcessNext: where a host looks at its own reasons to end the loop.
+  void SetAfterEvent(std::function<void()> check) { mAfterEvent = std::move(check); }
 
   void SetShiftDown(bool down) { mShiftDown = down; }
   void QueueAnswer(int answer) { mAnswers.push_back(answer); }
@@ -48,6 +50,7 @@ class HeadlessToolkit : public ToolkitPort {
 
  private:
   double Now() const;
+  void WaitAndHandleOne();
   bool RunOneDeferred();
   bool FireAlarmIfDue();
 
@@ -61,6 +64,7 @@ class HeadlessToolkit : public ToolkitPort {
   std::deque<Dstring> mQuestions;
   std::set<Dstring> mWindows;
   std::function<void(const Dstring&, Icon)> mAlertSink;
+  std::function<void()> mAfterEvent;
   std::atomic<bool> mInterrupted{false};
   bool mShiftDown = false;
   bool mWaitCursor = false;

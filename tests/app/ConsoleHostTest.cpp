@@ -66,7 +66,8 @@ namespace {
 
 // Runs the built qengui with the given stdin text and returns what it printed and its code.
 std::string RunHost(const std::string& args, const std::string& input, int& code) {
-  std::string inputFile = testing::TempDir() + "qengui-console-input.txt";
+  std::string inputFile = testing::TempDir() + "qengui-console-" + std::to_string(::getpid()) + "-" +
+                          testing::UnitTest::GetInstance()->current_test_info()->name() + ".txt";
   std::ofstream(inputFile) << input;
   std::string cmd = std::string(QENGUI_PATH) + " " + args + " < " + inputFile + " 2>&1";
   FILE* pipe = popen(cmd.c_str(), "r");

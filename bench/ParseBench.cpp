@@ -1,0 +1,83 @@
+// The expression parser against a plain byte scan of the same ~1 MB sequence expression.
+#include <benchmark/benchmark.h>
+
+#include <algorithm>
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+
+#include "support/ParserExpression.h"
+
+namespace {
+
+// A long sequence expression: nested loops of blocks with strings, numbers and words.
+std::string MakeSequence(std::size_t minimumSize) {
+  std::string text = "(3.0,\"start\",(SEQ";
+  for (int i = 0; text.size() < minimumSize; ++i) {
+    text += ",(BLOCK," + std::to_string(i % 7) + "," + std::to_string(1024 + 64 * (i % 50)) +
+            ",0,\"\",(),\"seg" + std::to_string(i) + "\",0,0),\"lbl" + std::to_string(i) + "\",(LOOP1,0," +
+            (i % 3 == 0 ? std::string("INF") : std::to_string(i % 1000)) + ",\"\",(BLOCK,0,64," +
+            std::to_string(i % 2) + ",\"\",SYNC,PAUSE0,1.500000f,-" + std::to_string(i) + "))";
+  }
+  return text + "))";
+}
+
+const std::string& Text() {
+  static const std::string text = MakeSequence(1 << 20);
+  return text;
+}
+
+std::size_t Scan(const std::string& text) {
+  std::size_t count = 0;
+  for (char c : text) count += (c == ',') + (c == '(') + (c == ')');
+  return count;
+}
+
+// The fastest of several scans, so the ratio is measured against the baseline of this run.
+double ScanSeconds(const std::string& text) {
+  double best = 1e9;
+  for (int i = 0; i < 20; ++i) {
+    auto start = std::chrono::steady_clock::now();
+    std::size_t count = Scan(text);
+    benchmark::DoNotOptimize(count);
+    best = std::min(best, std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count());
+  }
+  return best;
+}
+
+void BM_ScanBytes(benchmark::State& state) {
+  const std::string& text = Text();
+  for (auto _ : state) {
+    std::size_t count = Scan(text);
+    benchmark::DoNotOptimize(count);
+  }
+  state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * text.size()));
+}
+
+void BM_ParseExpression(benchmark::State& state) {
+  const std::string& text = Text();
+  double scan = ScanSeconds(text);
+  double parse = 0;
+  for (auto _ : state) {
+    auto start = std::chrono::steady_clock::now();
+    {
+      LispList tree;
+      ConditionList list;
+      int rc = ParserExpression::Parse(text, tree, list);
+      benchmark::DoNotOptimize(rc);
+      benchmark::DoNotOptimize(tree);
+      if (rc != 0) state.SkipWithError("the generated expression did not parse");
+    }
+    parse += std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+  }
+  state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * text.size()));
+  state.counters["parse_over_scan"] = parse / static_cast<double>(state.iterations()) / scan;
+}
+
+}  // namespace
+
+BENCHMARK(BM_ScanBytes)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_ParseExpression)->Unit(benchmark::kMillisecond);
+
+BENCHMARK_MAIN();

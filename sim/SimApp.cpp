@@ -1,0 +1,69 @@
+#include "SimApp.h"
+
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+#include "SimCommandProcessor.h"
+#include "SimConfigLoader.h"
+#include "SimServer.h"
+#include "SimSteadyClock.h"
+
+extern const char* const kSimDefaultConfigText;
+
+namespace {
+
+int Fail(const Dstring& message) {
+  std::fprintf(stderr, "qensim: %s\n", message.c_str());
+  return 1;
+}
+
+bool ReadFile(const Dstring& path, Dstring& text) {
+  std::ifstream in(path, std::ios::binary);
+  if (!in) return false;
+  std::ostringstream content;
+  content << in.rdbuf();
+  text = content.str();
+  return !in.bad();
+}
+
+// $XDG_DATA_HOME/qensim, else ~/.local/share/qensim.
+Dstring DefaultDataDir() {
+  const char* xdg = std::getenv("XDG_DATA_HOME");
+  if (xdg != nullptr && *xdg != '\0') return Dstring(xdg) + "/qensim";
+  const char* home = std::getenv("HOME");
+  return Dstring(home != nullptr ? home : ".") + "/.local/share/qensim";
+}
+
+}  // namespace
+
+int SimApp::Run(const SimOptions& options) {
+  Dstring config = kSimDefaultConfigText;
+  if (!options.mConfigPath.empty() && !ReadFile(options.mConfigPath, config)) {
+    return Fail("cannot read " + options.mConfigPath);
+  }
+  SimParamTable params;
+  ConditionList list;
+  if (SimConfigLoader::Load(config, params, list) != 0) return Fail(list.ToText());
+
+  Dstring dataDir = options.mDataDir.empty() ? DefaultDataDir() : options.mDataDir;
+  std::error_code error;
+  std::filesystem::create_directories(dataDir.c_str(), error);
+  if (error) {
+    // Nothing needs the data directory yet; only one asked for by name must exist.
+    if (!options.mDataDir.empty()) return Fail("cannot create " + dataDir + ": " + error.message());
+    if (!options.mQuiet)
+      std::fprintf(stderr, "qensim: cannot create %s: %s\n", dataDir.c_str(), error.message().c_str());
+  }
+
+  SimSteadyClock clock;
+  SimCommandProcessor processor(std::move(params), clock, options.mTestControl);
+  SimServer server(processor, clock, options.mQuiet);
+  if (server.Listen(options.mBind, options.mPort, list) != 0) return Fail(list.ToText());
+  SimServer::InstallSignalHandlers();
+  std::printf("qensim listening on %s\n", server.GetEndpoint().c_str());
+  std::fflush(stdout);
+  return server.Run();
+}

@@ -1,0 +1,67 @@
+#include "SimBerMeter.h"
+
+#include <cmath>
+#include <cstdlib>
+#include <cstring>
+
+namespace {
+
+constexpr std::string_view kSuffix = ":BER";
+
+// The number after `word` in the header (":CGR2:MOD3:CONN1:BER", "MOD" gives 3).
+long NumberAfter(const Dstring& header, const char* word) {
+  auto at = header.find(word);
+  return at == Dstring::npos ? 0 : std::strtol(header.c_str() + at + std::strlen(word), nullptr, 10);
+}
+
+}  // namespace
+
+double SimBerMeter::RatioOf(const Dstring& header) {
+  const long connector = NumberAfter(header, ":CONN");
+  const long module = NumberAfter(header, ":MOD");
+  return 1e-7 * std::pow(10.0, -(connector - 1)) * (1.0 + 0.25 * static_cast<double>(module % 4));
+}
+
+double SimBerMeter::ClockOf(const Dstring& header, SimContext& context) {
+  std::size_t index = 0;
+  const Dstring freq = Dstring::Format(":CGR%ld:FREQ", NumberAfter(header, ":CGR"));
+  return context.Params().Find(freq, index) ? context.Params().At(index).GetNumber() : 0.0;
+}
+
+void SimBerMeter::Advance(SimContext& context) {
+  const long long now = context.NowMs();
+  const bool running = context.Global().IsRunning();
+  if (mCounts.empty()) {
+    for (std::size_t i : context.Params().WithPrefix("")) {
+      if (context.Params().At(i).GetHeader().EndsWith(kSuffix)) mCounts[context.Params().At(i).GetHeader()];
+    }
+  }
+  if (running && !mWasRunning) {
+    for (auto& [header, count] : mCounts) count = Count{};
+  }
+  if (running && mWasRunning && mLastMs >= 0) {
+    const double seconds = static_cast<double>(now - mLastMs) / 1000.0;
+    for (auto& [header, count] : mCounts) {
+      const double bits = ClockOf(header, context) * seconds;
+      count.compared += bits;
+      count.errors += bits * RatioOf(header);
+    }
+  }
+  mWasRunning = running;
+  mLastMs = now;
+}
+
+bool SimBerMeter::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) {
+  if (!rest.EndsWith(kSuffix)) return false;
+  std::size_t index = 0;
+  if (!context.Params().Find(rest, index)) return false;
+  if (!cmd.IsQuery()) {
+    context.Error(-200);
+    return true;
+  }
+  const Count& count = mCounts[context.Params().At(index).GetHeader()];
+  const double compared = std::floor(count.compared);
+  const double errors = std::floor(count.errors);
+  context.Reply(Dstring::Format("%.0f,%.0f,%.12E", compared, errors, compared > 0 ? errors / compared : 0.0));
+  return true;
+}

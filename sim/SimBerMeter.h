@@ -1,0 +1,29 @@
+#pragma once
+
+#include <map>
+
+#include "SimCommandModule.h"
+
+// The bit error rate of every analyser data port (":CGR<n>:MOD<m>:CONN<k>:BER?", replied
+// as "compared,errors,ratio"). Counting starts afresh with every start of the instrument and
+// stops with it; each port compares one bit per clock of its group and sees errors at a ratio
+// of its own, so that the figures differ between ports and grow believably while it runs.
+class SimBerMeter : public SimCommandModule {
+ public:
+  bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
+  void Advance(SimContext& context) override;
+
+ private:
+  struct Count {
+    double compared = 0;
+    double errors = 0;
+  };
+  // The error ratio of a port: 1E-7 on connector 1, ten times lower on each further one, and
+  // a little different per module.
+  static double RatioOf(const Dstring& header);
+  static double ClockOf(const Dstring& header, SimContext& context);
+
+  std::map<Dstring, Count> mCounts;
+  long long mLastMs = -1;
+  bool mWasRunning = false;
+};

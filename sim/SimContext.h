@@ -1,0 +1,27 @@
+#pragma once
+
+#include "SimGlobalState.h"
+#include "SimParamTable.h"
+#include "support/Dstring.h"
+
+// What a command module may do within the frame being run.
+class SimContext {
+ public:
+  virtual ~SimContext() = default;
+
+  virtual void Reply(const Dstring& text) = 0;
+  // Queues the SCPI error on the queue the client reads for this command.
+  virtual void Error(int code) = 0;
+  // The handle of the command being run (upper case).
+  virtual const Dstring& GetHandle() const = 0;
+  virtual long long NowMs() const = 0;
+  virtual SimParamTable& Params() = 0;
+  virtual const SimGlobalState& Global() const = 0;
+  // Every handle but the one running the command hears that the setting changed.
+  virtual void MarkChanged(const Dstring& header) = 0;
+  // After parameters were written: their value and limit changes reach the other handles
+  // and the coupled queries.
+  virtual void NoteParamChanges() = 0;
+  // Every handle hears that everything changed.
+  virtual void MarkAllDirty() = 0;
+};

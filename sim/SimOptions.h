@@ -1,0 +1,16 @@
+#pragma once
+
+#include "support/Dstring.h"
+
+// The command line of qensim.
+class SimOptions {
+ public:
+  static constexpr unsigned short kDefaultPort = 7130;
+
+  unsigned short mPort = kDefaultPort;
+  Dstring mBind = "127.0.0.1";
+  Dstring mConfigPath;  // empty: the configuration built into the program
+  Dstring mDataDir;     // empty: the per-user default
+  bool mTestControl = false;
+  bool mQuiet = false;
+};

@@ -1,0 +1,230 @@
+#include "SimServer.h"
+
+#include <arpa/inet.h>
+#include <netdb.h>
+#include <netinet/in.h>
+#include <netinet/tcp.h>
+#include <poll.h>
+#include <sys/socket.h>
+#include <unistd.h>
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
+#include <cstdio>
+#include <cstring>
+
+namespace {
+
+constexpr std::size_t kMaxConnections = 256;
+// Stop reading from a client that does not read its replies.
+constexpr std::size_t kMaxPendingOut = 4 * 1024 * 1024;
+
+volatile std::sig_atomic_t gStop = 0;
+sigset_t gWaitMask;
+
+void OnStopSignal(int) {
+  gStop = 1;
+}
+
+void SetOption(int fd, int level, int name) {
+  int on = 1;
+  setsockopt(fd, level, name, &on, sizeof on);
+}
+
+Dstring EndpointOf(int fd) {
+  sockaddr_storage addr{};
+  socklen_t len = sizeof addr;
+  char host[INET6_ADDRSTRLEN] = "?";
+  unsigned short port = 0;
+  getsockname(fd, reinterpret_cast<sockaddr*>(&addr), &len);
+  if (addr.ss_family == AF_INET6) {
+    auto* a = reinterpret_cast<sockaddr_in6*>(&addr);
+    inet_ntop(AF_INET6, &a->sin6_addr, host, sizeof host);
+    port = ntohs(a->sin6_port);
+    return Dstring::Format("[%s]:%u", host, port);
+  }
+  auto* a = reinterpret_cast<sockaddr_in*>(&addr);
+  inet_ntop(AF_INET, &a->sin_addr, host, sizeof host);
+  port = ntohs(a->sin_port);
+  return Dstring::Format("%s:%u", host, port);
+}
+
+}  // namespace
+
+SimServer::SimServer(SimCommandProcessor& processor, const SimClock& clock, bool quiet)
+    : mProcessor(processor), mClock(clock), mQuiet(quiet) {}
+
+SimServer::~SimServer() {
+  if (mListenFd >= 0) close(mListenFd);
+}
+
+int SimServer::Listen(const Dstring& address, unsigned short port, ConditionList& list) {
+  addrinfo hints{};
+  hints.ai_family = AF_UNSPEC;
+  hints.ai_socktype = SOCK_STREAM;
+  hints.ai_flags = AI_PASSIVE | AI_NUMERICSERV;
+  addrinfo* found = nullptr;
+  if (int rc = getaddrinfo(address.c_str(), std::to_string(port).c_str(), &hints, &found); rc != 0) {
+    list.Add(1, Dstring::Format("cannot resolve %s: %s", address.c_str(), gai_strerror(rc)));
+    return 1;
+  }
+  int fd = socket(found->ai_family, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
+  if (fd >= 0) SetOption(fd, SOL_SOCKET, SO_REUSEADDR);
+  bool ok = fd >= 0 && bind(fd, found->ai_addr, found->ai_addrlen) == 0 && listen(fd, 64) == 0;
+  int err = errno;
+  freeaddrinfo(found);
+  if (!ok) {
+    if (fd >= 0) close(fd);
+    list.Add(1, Dstring::Format("cannot listen on %s:%u: %s", address.c_str(), port, std::strerror(err)));
+    return 1;
+  }
+  mListenFd = fd;
+  mEndpoint = EndpointOf(fd);
+  return 0;
+}
+
+void SimServer::InstallSignalHandlers() {
+  std::signal(SIGPIPE, SIG_IGN);
+  struct sigaction action {};
+  action.sa_handler = OnStopSignal;
+  sigemptyset(&action.sa_mask);
+  sigaction(SIGINT, &action, nullptr);
+  sigaction(SIGTERM, &action, nullptr);
+  // Held back while the loop works and let through only inside ppoll, so a stop request
+  // can never slip in between the check and the wait.
+  sigset_t stops;
+  sigemptyset(&stops);
+  sigaddset(&stops, SIGINT);
+  sigaddset(&stops, SIGTERM);
+  sigprocmask(SIG_BLOCK, &stops, &gWaitMask);
+  sigdelset(&gWaitMask, SIGINT);
+  sigdelset(&gWaitMask, SIGTERM);
+}
+
+int SimServer::Run() {
+  std::vector<pollfd> fds;
+  std::vector<SimConnection*> polled;
+  while (!gStop && !mDie) {
+    fds.assign(1, pollfd{mListenFd, POLLIN, 0});
+    polled.clear();
+    for (auto& [id, c] : mConnections) {
+      short events = c->Pending() < kMaxPendingOut ? POLLIN : 0;
+      if (c->Pending() > 0) events |= POLLOUT;
+      fds.push_back(pollfd{c->GetFd(), events, 0});
+      polled.push_back(c.get());
+    }
+    int timeoutMs = PollTimeoutMs();
+    timespec ts{timeoutMs / 1000, (timeoutMs % 1000) * 1000000L};
+    int n = ppoll(fds.data(), fds.size(), timeoutMs < 0 ? nullptr : &ts, &gWaitMask);
+    if (n < 0 && errno != EINTR) {
+      Log(std::strerror(errno), 0);
+      return 1;
+    }
+    for (std::size_t i = 0; n > 0 && i < polled.size() && !mDie; ++i) Serve(*polled[i], fds[i + 1].revents);
+    if (n > 0 && (fds[0].revents & POLLIN)) Accept();
+    FireTimers();
+    Reap();
+  }
+  return 0;
+}
+
+void SimServer::Accept() {
+  while (true) {
+    int fd = accept4(mListenFd, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
+    if (fd < 0) {
+      if (errno != EAGAIN && errno != EWOULDBLOCK && errno != EINTR) Log(std::strerror(errno), 0);
+      return;
+    }
+    if (mConnections.size() >= kMaxConnections) {
+      Log("too many clients, connection refused", 0);
+      close(fd);
+      continue;
+    }
+    SetOption(fd, IPPROTO_TCP, TCP_NODELAY);
+    SetOption(fd, SOL_SOCKET, SO_KEEPALIVE);
+    int id = mNextId++;
+    mConnections.emplace(id, std::make_unique<SimConnection>(fd, id));
+  }
+}
+
+void SimServer::Serve(SimConnection& connection, short events) {
+  if (events & (POLLIN | POLLHUP | POLLERR)) {
+    bool open = connection.Receive();
+    HandleFrames(connection);
+    if (!open) connection.Close();
+  }
+  if (!connection.IsClosed() && connection.Pending() > 0 && !connection.Flush()) connection.Close();
+}
+
+void SimServer::HandleFrames(SimConnection& connection) {
+  FrameHeader header;
+  std::string payload;
+  while (!connection.IsClosed() && !mDie && connection.Decoder().Next(header, payload)) {
+    if (header.type != FrameHeader::kRequest) {
+      Log("frame is not a request, connection closed", connection.GetId());
+      connection.Close();
+      return;
+    }
+    SimReply reply = mProcessor.Execute(connection.GetId(), payload);
+    if (reply.action == SimReplyAction::Die) mDie = true;
+    if (reply.action != SimReplyAction::Send) {
+      connection.Close();
+      return;
+    }
+    FrameHeader out{FrameHeader::kReply, 0, header.id, reply.status, 0};
+    std::string bytes = EncodeFrame(out, reply.text);
+    if (reply.delayMs > 0) {
+      mTimers.push_back(Timer{mClock.NowMs() + reply.delayMs, connection.GetId(), std::move(bytes)});
+    } else {
+      connection.Queue(bytes);
+    }
+  }
+  if (connection.Decoder().GetError() != FrameError::None) {
+    Log(FrameErrorText(connection.Decoder().GetError()), connection.GetId());
+    connection.Close();
+  }
+}
+
+void SimServer::FireTimers() {
+  long long now = mClock.NowMs();
+  for (auto it = mTimers.begin(); it != mTimers.end();) {
+    if (it->dueMs > now) {
+      ++it;
+      continue;
+    }
+    auto c = mConnections.find(it->connection);
+    if (c != mConnections.end() && !c->second->IsClosed()) {
+      c->second->Queue(it->bytes);
+      if (!c->second->Flush()) c->second->Close();
+    }
+    it = mTimers.erase(it);
+  }
+}
+
+void SimServer::Reap() {
+  for (auto it = mConnections.begin(); it != mConnections.end();) {
+    if (!it->second->IsClosed()) {
+      ++it;
+      continue;
+    }
+    mProcessor.Disconnect(it->first);
+    it = mConnections.erase(it);
+  }
+}
+
+int SimServer::PollTimeoutMs() const {
+  if (mTimers.empty()) return -1;
+  long long now = mClock.NowMs();
+  long long next = mTimers.front().dueMs;
+  for (const Timer& t : mTimers) next = std::min(next, t.dueMs);
+  return static_cast<int>(std::max(0LL, next - now));
+}
+
+void SimServer::Log(const char* what, int connection) const {
+  if (mQuiet) return;
+  if (connection > 0) {
+    std::fprintf(stderr, "qensim: client %d: %s\n", connection, what);
+  } else {
+    std::fprintf(stderr, "qensim: %s\n", what);
+  }
+}

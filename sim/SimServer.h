@@ -1,0 +1,56 @@
+#pragma once
+
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "SimClock.h"
+#include "SimCommandProcessor.h"
+#include "SimConnection.h"
+#include "support/ConditionList.h"
+
+// The TCP side of the simulator: one thread, one poll loop, non-blocking sockets. Frames go
+// to the command processor; replies go back in order of readiness, late ones by timer.
+class SimServer {
+ public:
+  SimServer(SimCommandProcessor& processor, const SimClock& clock, bool quiet);
+  ~SimServer();
+  SimServer(const SimServer&) = delete;
+  SimServer& operator=(const SimServer&) = delete;
+
+  // Opens the listening socket; port 0 picks a free one. 0, or 1 with a condition.
+  int Listen(const Dstring& address, unsigned short port, ConditionList& list);
+  // The address and port actually bound, as "ADDR:PORT".
+  const Dstring& GetEndpoint() const { return mEndpoint; }
+
+  // SIGINT and SIGTERM make Run return; SIGPIPE is ignored. Call once, before Run.
+  static void InstallSignalHandlers();
+  // Serves until a stop signal or a test-control "die". Returns the exit code.
+  int Run();
+
+ private:
+  struct Timer {
+    long long dueMs;
+    int connection;
+    std::string bytes;
+  };
+
+  void Accept();
+  void Serve(SimConnection& connection, short events);
+  void HandleFrames(SimConnection& connection);
+  void FireTimers();
+  void Reap();
+  int PollTimeoutMs() const;
+  void Log(const char* what, int connection) const;
+
+  SimCommandProcessor& mProcessor;
+  const SimClock& mClock;
+  bool mQuiet;
+  int mListenFd = -1;
+  Dstring mEndpoint;
+  int mNextId = 1;
+  bool mDie = false;
+  std::map<int, std::unique_ptr<SimConnection>> mConnections;
+  std::vector<Timer> mTimers;
+};

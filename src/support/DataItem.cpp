@@ -1,0 +1,329 @@
+#include "support/DataItem.h"
+
+#include <charconv>
+#include <cmath>
+#include <limits>
+#include <utility>
+
+namespace {
+
+bool IsDigit(char c) {
+  return c >= '0' && c <= '9';
+}
+
+std::size_t CountDigits(std::string_view t, std::size_t from) {
+  std::size_t i = from;
+  while (i < t.size() && IsDigit(t[i])) ++i;
+  return i - from;
+}
+
+// The number form: [+-] digits [. digits] [e [+-] digits] [i|u|f|d], with at least one
+// mantissa digit; i and u only on integers. On success `body` is the token without its suffix.
+bool ScanNumber(std::string_view token, std::string_view& body, char& suffix, bool& integral) {
+  suffix = 0;
+  if (!token.empty() && std::string_view("iufd").find(token.back()) != std::string_view::npos) {
+    suffix = token.back();
+    token.remove_suffix(1);
+  }
+  std::size_t i = (!token.empty() && (token[0] == '+' || token[0] == '-')) ? 1 : 0;
+  std::size_t mantissa = CountDigits(token, i);
+  i += mantissa;
+  integral = true;
+  if (i < token.size() && token[i] == '.') {
+    integral = false;
+    std::size_t fraction = CountDigits(token, ++i);
+    mantissa += fraction;
+    i += fraction;
+  }
+  if (mantissa == 0) return false;
+  if (i < token.size() && (token[i] == 'e' || token[i] == 'E')) {
+    integral = false;
+    if (++i < token.size() && (token[i] == '+' || token[i] == '-')) ++i;
+    std::size_t exponent = CountDigits(token, i);
+    if (exponent == 0) return false;
+    i += exponent;
+  }
+  body = token;
+  return i == token.size() && (integral || (suffix != 'i' && suffix != 'u'));
+}
+
+// from_chars takes no leading '+'.
+std::string_view WithoutPlus(std::string_view body) {
+  return body[0] == '+' ? body.substr(1) : body;
+}
+
+template <typename T>
+bool ReadValue(std::string_view body, T& value) {
+  body = WithoutPlus(body);
+  auto result = std::from_chars(body.data(), body.data() + body.size(), value);
+  return result.ec == std::errc() && result.ptr == body.data() + body.size();
+}
+
+bool ReadSigned(std::string_view body, DataItem& out) {
+  long long v = 0;
+  if (!ReadValue(body, v)) return false;
+  out = DataItem::MakeSigned(v);
+  return true;
+}
+
+bool ReadUnsigned(std::string_view body, DataItem& out) {
+  bool negative = body[0] == '-';
+  unsigned long long v = 0;
+  if (!ReadValue(negative ? body.substr(1) : body, v) || (negative && v != 0)) return false;
+  out = DataItem::MakeUnsigned(v);
+  return true;
+}
+
+// Overflow and underflow alike are refused: the value would not read back as written.
+bool ReadDouble(std::string_view body, DataItem& out) {
+  double v = 0;
+  if (!ReadValue(body, v)) return false;
+  out = DataItem::MakeDouble(v);
+  return true;
+}
+
+bool ReadFloat(std::string_view body, DataItem& out) {
+  float v = 0;
+  if (!ReadValue(body, v)) return false;
+  out = DataItem::MakeFloat(v);
+  return true;
+}
+
+// Without a suffix: Signed, else Unsigned, else (too large for both) Double.
+bool ReadInteger(std::string_view body, DataItem& out) {
+  return ReadSigned(body, out) || (body[0] != '-' && ReadUnsigned(body, out)) || ReadDouble(body, out);
+}
+
+// The shortest text that reads back to the same value, with the suffix naming its type.
+// Infinities and NaN have no number form; they are written as the instrument's words.
+template <typename T>
+std::string NumberText(T v, char suffix) {
+  if (std::isnan(v)) return "NAN";
+  if (std::isinf(v)) return v < 0 ? "-INF" : "INF";
+  char buffer[64];
+  auto result = std::to_chars(buffer, buffer + sizeof buffer, v);
+  std::string text(buffer, result.ptr);
+  text += suffix;
+  return text;
+}
+
+// True when v is integral and within [-2^bits, 2^bits) (or [0, 2^bits) when unsigned).
+template <typename T>
+bool FitsIntegral(double v) {
+  double limit = std::ldexp(1.0, std::numeric_limits<T>::digits);
+  double low = std::numeric_limits<T>::is_signed ? -limit : 0.0;
+  return v >= low && v < limit && std::trunc(v) == v;
+}
+
+std::string Quoted(std::string_view text, char quote) {
+  std::string out(1, quote);
+  for (char c : text) {
+    if (c == quote) out += quote;
+    out += c;
+  }
+  out += quote;
+  return out;
+}
+
+std::string BlockText(std::string_view bytes) {
+  std::string length = std::to_string(bytes.size());
+  std::string out(1, '#');
+  out += std::to_string(length.size());
+  out += length;
+  out += bytes;
+  return out;
+}
+
+}  // namespace
+
+DataItem DataItem::MakeSigned(long long v) {
+  DataItem item;
+  item.mType = DataItemType::Signed;
+  item.mSigned = v;
+  item.mText = std::to_string(v);
+  return item;
+}
+
+DataItem DataItem::MakeUnsigned(unsigned long long v) {
+  DataItem item;
+  item.mType = DataItemType::Unsigned;
+  item.mUnsigned = v;
+  item.mText = std::to_string(v) + "u";
+  return item;
+}
+
+DataItem DataItem::MakeFloat(float v) {
+  DataItem item;
+  item.mType = DataItemType::Float;
+  item.mDouble = v;
+  item.mText = NumberText(v, 'f');
+  return item;
+}
+
+DataItem DataItem::MakeDouble(double v) {
+  DataItem item;
+  item.mType = DataItemType::Double;
+  item.mDouble = v;
+  item.mText = NumberText(v, 'd');
+  return item;
+}
+
+DataItem DataItem::MakeString(std::string_view text, char quote) {
+  DataItem item;
+  item.mType = DataItemType::String;
+  item.mQuote = quote == '\'' ? '\'' : '"';
+  item.mText = text;
+  return item;
+}
+
+DataItem DataItem::MakeWord(std::string_view text) {
+  DataItem item;
+  item.mText = text;
+  return item;
+}
+
+DataItem DataItem::MakeBlock(std::string_view bytes, std::shared_ptr<const std::string> owner) {
+  DataItem item;
+  item.mType = DataItemType::Block;
+  item.mBlock = bytes;
+  item.mOwner = std::move(owner);
+  return item;
+}
+
+bool DataItem::FromToken(std::string_view token, DataItem& out) {
+  std::string_view body;
+  char suffix = 0;
+  bool integral = true;
+  if (!ScanNumber(token, body, suffix, integral)) {
+    out = MakeWord(token);
+    return true;
+  }
+  DataItem item;
+  bool ok = false;
+  switch (suffix) {
+    case 'i':
+      ok = ReadSigned(body, item);
+      break;
+    case 'u':
+      ok = ReadUnsigned(body, item);
+      break;
+    case 'f':
+      ok = ReadFloat(body, item);
+      break;
+    case 'd':
+      ok = ReadDouble(body, item);
+      break;
+    default:
+      ok = integral ? ReadInteger(body, item) : ReadDouble(body, item);
+      break;
+  }
+  if (!ok) return false;
+  item.mText = token;
+  out = std::move(item);
+  return true;
+}
+
+bool DataItem::IsNumber() const {
+  return IsInteger() || mType == DataItemType::Float || mType == DataItemType::Double;
+}
+
+bool DataItem::GetLong(long& out) const {
+  switch (mType) {
+    case DataItemType::Signed:
+      if (!std::in_range<long>(mSigned)) return false;
+      out = static_cast<long>(mSigned);
+      return true;
+    case DataItemType::Unsigned:
+      if (!std::in_range<long>(mUnsigned)) return false;
+      out = static_cast<long>(mUnsigned);
+      return true;
+    case DataItemType::Float:
+    case DataItemType::Double:
+      if (!FitsIntegral<long>(mDouble)) return false;
+      out = static_cast<long>(mDouble);
+      return true;
+    default:
+      return false;
+  }
+}
+
+bool DataItem::GetULong(unsigned long& out) const {
+  switch (mType) {
+    case DataItemType::Signed:
+      if (!std::in_range<unsigned long>(mSigned)) return false;
+      out = static_cast<unsigned long>(mSigned);
+      return true;
+    case DataItemType::Unsigned:
+      if (!std::in_range<unsigned long>(mUnsigned)) return false;
+      out = static_cast<unsigned long>(mUnsigned);
+      return true;
+    case DataItemType::Float:
+    case DataItemType::Double:
+      if (!FitsIntegral<unsigned long>(mDouble)) return false;
+      out = static_cast<unsigned long>(mDouble);
+      return true;
+    default:
+      return false;
+  }
+}
+
+bool DataItem::GetDouble(double& out) const {
+  switch (mType) {
+    case DataItemType::Signed:
+      out = static_cast<double>(mSigned);
+      return true;
+    case DataItemType::Unsigned:
+      out = static_cast<double>(mUnsigned);
+      return true;
+    case DataItemType::Float:
+    case DataItemType::Double:
+      out = mDouble;
+      return true;
+    default:
+      return false;
+  }
+}
+
+bool DataItem::GetFloat(float& out) const {
+  double v = 0;
+  if (!GetDouble(v)) return false;
+  // A finite double beyond the float range does not fit; precision may be lost.
+  if (std::isfinite(v) && std::fabs(v) > std::numeric_limits<float>::max()) return false;
+  out = static_cast<float>(v);
+  return true;
+}
+
+std::string_view DataItem::GetText() const {
+  return mType == DataItemType::Block ? mBlock : std::string_view(mText);
+}
+
+Dstring DataItem::AsExpression() const {
+  switch (mType) {
+    case DataItemType::String:
+      return Quoted(mText, mQuote);
+    case DataItemType::Block:
+      return BlockText(mBlock);
+    default:
+      return mText;
+  }
+}
+
+bool DataItem::operator==(const DataItem& other) const {
+  if (mType != other.mType) return false;
+  switch (mType) {
+    case DataItemType::Signed:
+      return mSigned == other.mSigned;
+    case DataItemType::Unsigned:
+      return mUnsigned == other.mUnsigned;
+    case DataItemType::Float:
+    case DataItemType::Double:
+      return mDouble == other.mDouble || (std::isnan(mDouble) && std::isnan(other.mDouble));
+    case DataItemType::String:
+      return mQuote == other.mQuote && mText == other.mText;
+    case DataItemType::Word:
+      return mText == other.mText;
+    case DataItemType::Block:
+      return mBlock == other.mBlock;
+  }
+  return false;
+}

@@ -1,0 +1,76 @@
+#include "common/HostProcess.h"
+
+#include <chrono>
+#include <csignal>
+#include <poll.h>
+#include <sys/wait.h>
+#include <thread>
+#include <unistd.h>
+
+HostProcess::HostProcess(const std::vector<std::string>& args) {
+  int out[2];
+  if (pipe(out) != 0) return;
+  std::vector<std::string> argv = {QENGUI_PATH};
+  argv.insert(argv.end(), args.begin(), args.end());
+  mPid = fork();
+  if (mPid == 0) {
+    dup2(out[1], STDOUT_FILENO);
+    dup2(out[1], STDERR_FILENO);
+    close(out[0]);
+    close(out[1]);
+    std::vector<char*> cargv;
+    for (auto& a : argv) cargv.push_back(a.data());
+    cargv.push_back(nullptr);
+    execv(cargv[0], cargv.data());
+    _exit(127);
+  }
+  close(out[1]);
+  mFd = out[0];
+}
+
+HostProcess::~HostProcess() {
+  if (mPid > 0) {
+    kill(mPid, SIGKILL);
+    waitpid(mPid, nullptr, 0);
+  }
+  if (mFd >= 0) close(mFd);
+}
+
+bool HostProcess::ReadSome(int timeoutMs) {
+  pollfd p{mFd, POLLIN, 0};
+  if (poll(&p, 1, timeoutMs) <= 0) return true;
+  char buf[4096];
+  ssize_t n = read(mFd, buf, sizeof buf);
+  if (n <= 0) return false;
+  mOutput.append(buf, static_cast<std::size_t>(n));
+  return true;
+}
+
+bool HostProcess::WaitForOutput(const std::string& text, int timeoutMs) {
+  const auto deadline = std::chrono::steady_clock::now() + std::chrono::milliseconds(timeoutMs);
+  while (mOutput.find(text) == std::string::npos) {
+    if (std::chrono::steady_clock::now() >= deadline || !ReadSome(50)) return mOutput.find(text) != std::string::npos;
+  }
+  return true;
+}
+
+int HostProcess::WaitForExit(int timeoutMs) {
+  for (int waited = 0; mPid > 0 && waited <= timeoutMs; waited += 20) {
+    ReadSome(0);
+    int status = 0;
+    if (waitpid(mPid, &status, WNOHANG) == mPid) {
+      mPid = -1;
+      while (ReadSome(0) && mFd >= 0) {
+        pollfd p{mFd, POLLIN, 0};
+        if (poll(&p, 1, 0) <= 0) break;
+      }
+      return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    }
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+  }
+  return -1;
+}
+
+void HostProcess::Signal(int signal) {
+  if (mPid > 0) kill(mPid, signal);
+}
