@@ -59,7 +59,7 @@ int SimApp::Run(const SimOptions& options) {
   }
 
   SimSteadyClock clock;
-  SimCommandProcessor processor(std::move(params), clock, options.mTestControl);
+  SimCommandProcessor processor(std::move(params), clock, options.mTestControl, dataDir);
   SimServer server(processor, clock, options.mQuiet);
   if (server.Listen(options.mBind, options.mPort, list) != 0) return Fail(list.ToText());
   SimServer::InstallSignalHandlers();

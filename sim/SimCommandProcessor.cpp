@@ -116,8 +116,11 @@ const SimCommandProcessor::Entry SimCommandProcessor::kGlobalCommands[] = {
     {":TEST:ECHO", nullptr, &SimCommandProcessor::TestEcho, true},
 };
 
-SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl)
+SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl,
+                                         Dstring dataDir)
     : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
+  // The modules, one line each; the data directory is theirs to keep files in.
+  (void)dataDir;
   mModules.push_back(std::make_shared<SimSettingStore>(mParams));
   mModules.push_back(std::make_shared<SimBerMeter>());
 }

@@ -24,7 +24,8 @@
 // by the caller. docs/simulator.md describes the command set.
 class SimCommandProcessor : public SimContext {
  public:
-  SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl);
+  // `dataDir` is where the modules keep their files (segments, settings); empty for none.
+  SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl, Dstring dataDir = {});
 
   SimReply Execute(int connection, std::string_view text);
   // The connection has gone: its handles die and its lock is released.

@@ -68,14 +68,17 @@ class DteRefresher {
       Dstring cmd;
       for (std::size_t i = start; i < end; ++i) {
         if (i > start) cmd += ';';
-        cmd += sources[i]->GetReadCmdStr();
+        cmd += sources[i]->GetReadWithClashCmdStr();
       }
       Dstring reply;
       ConditionList ignored;
       if (QenGuiInst::Call(cmd, reply, ignored) != QenStatus::kOk) continue;
       std::vector<std::string_view> parts;
-      if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != end - start) continue;
-      for (std::size_t i = start; i < end; ++i) sources[i]->TakeReadValue(Dstring(parts[i - start]));
+      if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != 2 * (end - start)) continue;
+      for (std::size_t i = start; i < end; ++i) {
+        const std::size_t at = 2 * (i - start);
+        sources[i]->TakeReadValue(Dstring(parts[at]), Dstring(parts[at + 1]).Trimmed() == "1");
+      }
     }
   }
 

@@ -26,22 +26,34 @@ QenParamDs::QenParamDs(const Dstring& header) : mProgramHeader(header) {}
 
 QenParamDs::~QenParamDs() { Dte::Forget(this); }
 
-void QenParamDs::TakeReadValue(const Dstring& value) {
+void QenParamDs::TakeReadValue(const Dstring& value, bool clashing) {
   mValue = value;
+  mClashing = clashing;
   mValid = true;
   mFailed = 0;
+}
+
+bool QenParamDs::TakeReadReply(const Dstring& reply) {
+  std::vector<std::string_view> parts;
+  ConditionList ignored;
+  if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != 2) return false;
+  TakeReadValue(Dstring(parts[0]), Dstring(parts[1]).Trimmed() == "1");
+  return true;
 }
 
 int QenParamDs::QueryStrValue(Dstring& out, ConditionList& list) {
   mUsed = 1;
   if (!mValid || mValue.empty()) {
     Dstring reply;
-    int status = QenGuiInst::Call(GetReadCmdStr(), reply, list);
+    int status = QenGuiInst::Call(GetReadWithClashCmdStr(), reply, list);
+    if (status == QenStatus::kOk && !TakeReadReply(reply)) {
+      ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {GetReadWithClashCmdStr(), reply}, 1);
+      status = 1;
+    }
     if (status != QenStatus::kOk) {
       if (status != QenStatus::kLocked) mFailed = 1;
       return status;
     }
-    TakeReadValue(reply);
   }
   Dstring text;
   if (mSubCmdEnabled && QuotedText(mValue, text)) {

@@ -12,13 +12,12 @@
 //   change, a dirty-flag report, Dte::Update, Dte::ResetEngine) and by a failed read or write.
 // - failed: set by a failed read or write of this source, cleared by a successful one. A lock
 //   (-19) is a state of the instrument, not a failure of the source.
+// - clashing: the parameter clashes with another setting ("<header>? CLAS" answers 1). Every
+//   read of the value asks it in the same round trip, so IsClashing asks nothing.
 // - in transaction: set by a write inside a transaction, cleared when the batch is sent.
 // - sub-command: the value is a quoted sub-command word and value, as in "\"PRBS 7\"".
 class QenParamDs : public QenDs, public QenDsView {
  public:
-  // A cached text equal to this means the parameter clashes with another setting.
-  static constexpr const char* kClash = "CLAS";
-
   int QueryStrValue(Dstring& out, ConditionList& list);
   int SetStrValue(const Dstring& value, ConditionList& list);
   int QuerySubCmd(Dstring& out, ConditionList& list);
@@ -29,8 +28,8 @@ class QenParamDs : public QenDs, public QenDsView {
   int QueryHMaxStrValue(Dstring& out, ConditionList& list);
   int QueryLMaxStrValue(Dstring& out, ConditionList& list);
 
-  // Whether the last value read is the clash mark; asks nothing.
-  unsigned IsClashing() const { return mValid && mValue == kClash; }
+  // Whether the parameter clashed when its value was last read; asks nothing.
+  unsigned IsClashing() const { return mValid && mClashing; }
   unsigned IsFailed() const { return mFailed; }
   unsigned IsUsed() const { return mUsed; }
   unsigned IsReadOnly() const { return mReadOnly; }
@@ -46,6 +45,8 @@ class QenParamDs : public QenDs, public QenDsView {
  protected:
   void SetProgramHeader(const Dstring& header) { mProgramHeader = header; }
   Dstring GetReadCmdStr() const { return mProgramHeader + "?"; }
+  // The value and the clash state in one joined query.
+  Dstring GetReadWithClashCmdStr() const { return GetReadCmdStr() + ";" + mProgramHeader + "? CLAS"; }
   Dstring GetWriteCmdStr() const { return mProgramHeader + " " + mValue; }
   unsigned GetFailed() const { return mFailed; }
   void SetFailed(unsigned failed) { mFailed = failed; }
@@ -66,12 +67,15 @@ class QenParamDs : public QenDs, public QenDsView {
   int QueryLimit(const char* which, Dstring& out, ConditionList& list);
   // The current sub-command word of the cached text, or empty.
   Dstring CurrentSubCmd() const;
-  void TakeReadValue(const Dstring& value);
+  void TakeReadValue(const Dstring& value, bool clashing);
+  // Takes the reply of GetReadWithClashCmdStr; false when it is not two parts.
+  bool TakeReadReply(const Dstring& reply);
   void Invalidate() { mValid = false; }
 
   Dstring mProgramHeader;
   Dstring mValue;
   bool mValid = false;
+  bool mClashing = false;
   unsigned mFailed = 0;
   unsigned mReleasePending = 0;
   unsigned mInTransaction = 0;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <ostream>
 #include <vector>
 
 #include "support/Dstring.h"
@@ -19,6 +20,10 @@ class Condition {
   const std::vector<Dstring>& GetArgs() const { return mArgs; }
 
   bool operator==(const Condition&) const = default;
+
+  friend std::ostream& operator<<(std::ostream& out, const Condition& c) {
+    return out << c.mCode << ",\"" << c.mMessage << "\"";
+  }
 
  private:
   long mCode = 0;

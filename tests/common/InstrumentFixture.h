@@ -13,6 +13,10 @@ class InstrumentFixture : public testing::Test {
   void TearDown() override;
 
   ScriptedInstrument& Inst() { return *mInst; }
+  // The read of a parameter source: its value and clash state in one joined query.
+  void ExpectRead(const Dstring& header, const Dstring& value, bool clashing = false) {
+    Inst().Expect(header + "?;" + header + "? CLAS", value + (clashing ? ";1" : ";0"));
+  }
   DstringList mDeaths;
   ConditionList mList;
 

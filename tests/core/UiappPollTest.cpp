@@ -131,20 +131,20 @@ TEST_F(UiappTest, TickDuringTheSynchronousPartNeitherSetsTheFlagNorPolls) {
 }
 
 TEST_F(UiappTest, TriggerModeOtherThanSequenceAsksOnce) {
-  Inst().Expect(":_H:TRIG:MODE?", "SEQ");
+  ExpectRead(":_H:TRIG:MODE", "SEQ");
   EXPECT_EQ(uiapp::CheckTriggerMode(mList), 0);
   EXPECT_TRUE(mToolkit.Questions().empty());
 
-  Inst().Expect(":_H:TRIG:MODE?", "CLOC");
+  ExpectRead(":_H:TRIG:MODE", "CLOC");
   mToolkit.QueueAnswer(ToolkitPort::kYes);
   Inst().Expect(":_H:TRIG:MODE SEQ", "");
   Inst().Expect(":VC:_H:TRIG:MODE SEQ", "\":_H:TRIG:MODE\"");
   Inst().Expect(":RC:_H:TRIG:MODE SEQ", "");
-  Inst().Expect(":_H:TRIG:MODE?", "SEQ");
+  ExpectRead(":_H:TRIG:MODE", "SEQ");
   EXPECT_EQ(uiapp::CheckTriggerMode(mList), 0);
   ASSERT_EQ(mToolkit.Questions().size(), 1u);
 
-  Inst().Expect(":_H:TRIG:MODE?", "CLOC");
+  ExpectRead(":_H:TRIG:MODE", "CLOC");
   mToolkit.QueueAnswer(ToolkitPort::kNo);
   EXPECT_EQ(uiapp::CheckTriggerMode(mList), 0);
   EXPECT_EQ(mToolkit.Questions().size(), 2u);

@@ -55,7 +55,7 @@ TEST_F(DteTest, SameNameSharesOneSourceUntilTheLastFree) {
 
 TEST_F(DteTest, QueryUsesTheCacheOnceValid) {
   QenParamDs* mode = Dte::AllocDsByName(":_H:TRIG:MODE", 0);
-  Inst().Expect(":_H:TRIG:MODE?", "SEQ");
+  ExpectRead(":_H:TRIG:MODE", "SEQ");
   Dstring value;
   EXPECT_EQ(mode->QueryStrValue(value, mList), 0);
   EXPECT_EQ(mode->QueryStrValue(value, mList), 0);
@@ -78,8 +78,9 @@ TEST_F(DteTest, WriteRefreshesEveryCoupledSourceInOneReadAndTellsTheirViews) {
   Inst().Expect(":_H:CGR1:PER 2E-9", "");
   ExpectCoupled(":_H:CGR1:PER 2E-9", "\":_H:CGR1:PER\",\":_H:CGR1:FREQ\",\":_H:OTHER\"",
                 "\":_H:CGR1:MOD1:CONN1:PULS:DEL\"");
-  Inst().Expect(":_H:CGR1:FREQ?;:_H:CGR1:PER?", "5.000000000000E+008;2.000000000000E-009");
-  Inst().Expect(":_H:CGR1:MOD1:CONN1:PULS:DEL?", "0.000000000000E+000");
+  Inst().Expect(":_H:CGR1:FREQ?;:_H:CGR1:FREQ? CLAS;:_H:CGR1:PER?;:_H:CGR1:PER? CLAS",
+                "5.000000000000E+008;0;2.000000000000E-009;0");
+  ExpectRead(":_H:CGR1:MOD1:CONN1:PULS:DEL", "0.000000000000E+000");
   EXPECT_EQ(period->SetStrValue("2E-9", mList), 0);
   EXPECT_TRUE(mErrors.list()->IsEmpty());
   EXPECT_EQ(periodView.mShown, "2.000000000000E-009");
@@ -146,24 +147,25 @@ TEST_F(DteTest, ValueThatWouldBreakTheBatchIsRefusedBeforeSending) {
 TEST_F(DteTest, ClashingSourcesAreWrittenWithTheInstrumentStopped) {
   QenParamDs* clashing = Dte::AllocDsByName(":_H:B", 0);
   QenParamDs* written = Dte::AllocDsByName(":_H:A", 0);
-  Inst().Expect(":_H:B?", "CLAS");
+  ExpectRead(":_H:B", "8E-10", true);
   Dstring value;
   clashing->QueryStrValue(value, mList);
   ASSERT_TRUE(clashing->IsClashing());
+  // The clashing value is sent again with the write, the instrument stopped meanwhile.
   Inst().Expect(":_H:SGEN:GLOB:INIT:CONT?", "ON");
-  const Dstring batch = ":_H:SGEN:GLOB:INIT:CONT OFF;:_H:A 1;:_H:B CLAS;:_H:SGEN:GLOB:INIT:CONT ON";
+  const Dstring batch = ":_H:SGEN:GLOB:INIT:CONT OFF;:_H:A 1;:_H:B 8E-10;:_H:SGEN:GLOB:INIT:CONT ON";
   Inst().Expect(batch, "");
   ExpectCoupled(batch, "");
-  Inst().Expect(":_H:B?", "4");
+  ExpectRead(":_H:B", "8E-10");
   EXPECT_EQ(written->SetStrValue("1", mList), 0);
   EXPECT_FALSE(clashing->IsClashing());
 
-  Inst().Expect(":_H:B?", "CLAS");
+  ExpectRead(":_H:B", "8E-10", true);
   Dte::UpdateDsByName(":_H:B", mList);
   Inst().Expect(":_H:SGEN:GLOB:INIT:CONT?", "OFF");
-  Inst().Expect(":_H:A 2;:_H:B CLAS", "");
-  ExpectCoupled(":_H:A 2;:_H:B CLAS", "");
-  Inst().Expect(":_H:B?", "CLAS");
+  Inst().Expect(":_H:A 2;:_H:B 8E-10", "");
+  ExpectCoupled(":_H:A 2;:_H:B 8E-10", "");
+  ExpectRead(":_H:B", "8E-10", true);
   EXPECT_EQ(written->SetStrValue("2", mList), 0);
   Dte::FreeDs(clashing);
   Dte::FreeDs(written);
@@ -175,9 +177,9 @@ TEST_F(DteTest, RefreshThatCannotBeReadJoinedLeavesEachViewToAskItself) {
   ValueView va, vb;
   Dte::RegisterView(a, &va, mList, 0);
   Dte::RegisterView(b, &vb, mList, 0);
-  Inst().Expect(":_H:A?;:_H:B?", "only-one-part");
-  Inst().Expect(":_H:A?", "1");
-  Inst().Expect(":_H:B?", "2");
+  Inst().Expect(":_H:A?;:_H:A? CLAS;:_H:B?;:_H:B? CLAS", "only;three;parts");
+  ExpectRead(":_H:A", "1");
+  ExpectRead(":_H:B", "2");
   EXPECT_EQ(Dte::Update(mList), 0);
   EXPECT_EQ(va.mShown, "1");
   EXPECT_EQ(vb.mShown, "2");
@@ -194,13 +196,13 @@ TEST_F(DteTest, DirtyFlagNamesRefreshOnlyTheirSources) {
   Dte::RegisterView(a, &va, mList, 0);
   Dte::RegisterView(b, &vb, mList, 0);
   Inst().Expect("_H:DFL?", "\":_H:B\",\":_H:UNKNOWN\",\":_H:B\"");
-  Inst().Expect(":_H:B?", "7");
+  ExpectRead(":_H:B", "7");
   EXPECT_EQ(mDirtyFlag.UpdateFromFW(mList), 0);
   EXPECT_EQ(va.mTold, 0);
   EXPECT_EQ(vb.mTold, 1);
   EXPECT_EQ(vb.mShown, "7");
   Inst().Expect("_H:DFL?", "\"ALL\"");
-  Inst().Expect(":_H:A?;:_H:B?", "9;8");
+  Inst().Expect(":_H:A?;:_H:A? CLAS;:_H:B?;:_H:B? CLAS", "9;0;8;0");
   EXPECT_EQ(mDirtyFlag.UpdateFromFW(mList), 0);
   EXPECT_EQ(va.mShown, "9");
   EXPECT_EQ(vb.mShown, "8");
@@ -212,7 +214,7 @@ TEST_F(DteTest, DirtyFlagNamesRefreshOnlyTheirSources) {
 
 TEST_F(DteTest, SubCommandValuesKeepTheirWord) {
   QenParamDs* kind = Dte::AllocDsByName(":_H:SEGM:TYPE", Dte::kSubCmd);
-  Inst().Expect(":_H:SEGM:TYPE?", "\"PRBS 7\"");
+  ExpectRead(":_H:SEGM:TYPE", "\"PRBS 7\"");
   Dstring value;
   EXPECT_EQ(kind->QueryStrValue(value, mList), 0);
   EXPECT_EQ(value, "7");
@@ -247,7 +249,7 @@ TEST_F(DteTest, LimitsAreAskedEachTime) {
 
 TEST_F(DteTest, NamedRegistrationHoldsAReference) {
   ValueView view;
-  Inst().Expect(":_H:TRIG:MODE?", "SEQ");
+  ExpectRead(":_H:TRIG:MODE", "SEQ");
   EXPECT_EQ(Dte::RegisterView(":_H:TRIG:MODE", &view, mList, 1), 0);
   EXPECT_EQ(view.mShown, "SEQ");
   EXPECT_EQ(Dte::GetDsByName(":_H:TRIG:MODE")->NumRefs(), 1u);
