@@ -1,0 +1,192 @@
+// The exchange engine and the poll against their baselines, measured in the same run:
+// a refresh of many sources against one query per source, an idle poll tick against one raw
+// call, the repository at 1,000 and 10,000 sources, and one notification pass over many views.
+#include <benchmark/benchmark.h>
+
+#include <chrono>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <vector>
+
+#include "core/uiapp.h"
+#include "data/Dte.h"
+#include "data/QenDs.h"
+#include "data/QenDsView.h"
+#include "data/QenParamDs.h"
+#include "instrument/AppHandle.h"
+#include "instrument/QenGuiInst.h"
+#include "instrument/QenSimProcess.h"
+#include "instrument/QenTcpInstrument.h"
+
+namespace {
+
+constexpr int kManyParams = 1000;
+
+// Counts the round trips that pass through it.
+class CountingInstrument : public QenInstrument {
+ public:
+  explicit CountingInstrument(std::unique_ptr<QenInstrument> inner) : mInner(std::move(inner)) {}
+  int Connect(const Dstring& host, unsigned short port) override { return mInner->Connect(host, port); }
+  int Disconnect() override { return mInner->Disconnect(); }
+  bool IsConnected() const override { return mInner->IsConnected(); }
+  int Call(const Dstring& cmd, Dstring& reply) override {
+    ++mCalls;
+    return mInner->Call(cmd, reply);
+  }
+  long mCalls = 0;
+
+ private:
+  std::unique_ptr<QenInstrument> mInner;
+};
+
+// qensim with a configuration of many parameters, and the application started against it.
+class Rig {
+ public:
+  Rig() {
+    const auto config = std::filesystem::temp_directory_path() / "qen-bench-many.qsc";
+    std::ofstream out(config);
+    for (int i = 0; i < kManyParams; ++i) out << "param :BENCH:P" << i << " double " << i << " min=-1E9 max=1E9\n";
+    out.close();
+    mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--config", config.string()});
+    ConditionList list;
+    uiapp::Init(list);
+    auto tcp = std::make_unique<QenTcpInstrument>();
+    tcp->Connect("127.0.0.1", mSim.Port());
+    auto counting = std::make_unique<CountingInstrument>(std::move(tcp));
+    mCounter = counting.get();
+    QenGuiInst::SetInstrument(std::move(counting));
+    Dstring handle = "_BENCH";
+    AppHandle::Create(QenGuiInst::GetInstrument(), handle, "BENCH", list);
+    QenGuiInst::SetAppHandle(handle);
+  }
+  bool Ok() const { return mSim.Port() != 0 && !QenGuiInst::GetAppHandle().empty(); }
+  long Calls() const { return mCounter->mCalls; }
+
+ private:
+  QenSimProcess mSim;
+  CountingInstrument* mCounter = nullptr;
+};
+
+Rig& TheRig() {
+  static Rig rig;
+  return rig;
+}
+
+double Seconds(std::chrono::steady_clock::time_point since) {
+  return std::chrono::duration<double>(std::chrono::steady_clock::now() - since).count();
+}
+
+Dstring Header(int i) { return Dstring::Format(":%s:BENCH:P%d", QenGuiInst::GetAppHandle().c_str(), i); }
+
+void BM_RefreshManySourcesVsOneQueryEach(benchmark::State& state) {
+  Rig& rig = TheRig();
+  if (!rig.Ok()) return state.SkipWithError("qensim did not start");
+  std::vector<QenParamDs*> sources;
+  for (int i = 0; i < kManyParams; ++i) sources.push_back(Dte::AllocDsByName(Header(i), 0));
+  double joined = 0, single = 0;
+  long joinedCalls = 0, singleCalls = 0;
+  for (auto _ : state) {
+    ConditionList list;
+    long before = rig.Calls();
+    auto t0 = std::chrono::steady_clock::now();
+    if (Dte::Update(list) != 0) return state.SkipWithError("refresh failed");
+    joined += Seconds(t0);
+    joinedCalls += rig.Calls() - before;
+    before = rig.Calls();
+    t0 = std::chrono::steady_clock::now();
+    for (auto* s : sources) {
+      Dstring reply;
+      if (QenGuiInst::Call(s->GetProgramHeader() + "?", reply, list) != 0) return state.SkipWithError("read failed");
+    }
+    single += Seconds(t0);
+    singleCalls += rig.Calls() - before;
+  }
+  for (auto* s : sources) Dte::FreeDs(s);
+  const double n = static_cast<double>(state.iterations());
+  state.counters["sources"] = kManyParams;
+  state.counters["joined_ms"] = 1e3 * joined / n;
+  state.counters["one_each_ms"] = 1e3 * single / n;
+  state.counters["joined_round_trips"] = static_cast<double>(joinedCalls) / n;
+  state.counters["one_each_round_trips"] = static_cast<double>(singleCalls) / n;
+  state.counters["ratio"] = joined / single;
+}
+
+void BM_IdlePollTickVsOneRawCall(benchmark::State& state) {
+  Rig& rig = TheRig();
+  if (!rig.Ok()) return state.SkipWithError("qensim did not start");
+  const Dstring dfl = QenGuiInst::GetAppHandle() + ":DFL?";
+  double tick = 0, raw = 0;
+  long calls = 0;
+  for (auto _ : state) {
+    long before = rig.Calls();
+    auto t0 = std::chrono::steady_clock::now();
+    uiapp::AsyncAlarmProc(nullptr);
+    tick += Seconds(t0);
+    calls += rig.Calls() - before;
+    Dstring reply;
+    t0 = std::chrono::steady_clock::now();
+    QenGuiInst::GetInstrument()->Call(dfl, reply);
+    raw += Seconds(t0);
+  }
+  uiapp::EndPolling();
+  const double n = static_cast<double>(state.iterations());
+  state.counters["round_trips_per_tick"] = static_cast<double>(calls) / n;
+  state.counters["tick_us"] = 1e6 * tick / n;
+  state.counters["raw_us"] = 1e6 * raw / n;
+  state.counters["ratio"] = tick / raw;
+}
+
+// Lookups by name among `state.range(0)` live sources; per-lookup time should not grow with it.
+void BM_RepositoryLookup(benchmark::State& state) {
+  const int count = static_cast<int>(state.range(0));
+  Dte::Init();
+  std::vector<QenParamDs*> sources;
+  for (int i = 0; i < count; ++i) sources.push_back(Dte::AllocDsByName(Dstring::Format(":_B:CGR1:P%d", i), 0));
+  int i = 0;
+  for (auto _ : state) {
+    const Dstring name = Dstring::Format(":_B:CGR1:P%d", (i++ * 7919) % count);
+    QenParamDs* found = Dte::GetDsByName(name);
+    QenParamDs* again = Dte::AllocDsByName(name, 0);
+    benchmark::DoNotOptimize(found);
+    Dte::FreeDs(again);
+  }
+  for (auto* s : sources) Dte::FreeDs(s);
+  Dte::End();
+}
+
+class NullView : public QenDsView {
+ public:
+  int NfyViewDataUpdated(QenDs*, ConditionList&) override { return ++mTold, 0; }
+  long mTold = 0;
+};
+
+// One pass over `state.range(0)` views against calling the same views in a plain loop.
+void BM_NotifyManyViews(benchmark::State& state) {
+  const auto count = static_cast<std::size_t>(state.range(0));
+  auto* source = new QenDs;
+  std::vector<NullView> views(count);
+  ConditionList list;
+  for (auto& v : views) source->RegisterView(&v, list);
+  double pass = 0, plain = 0;
+  for (auto _ : state) {
+    auto t0 = std::chrono::steady_clock::now();
+    source->Update(list, 0);
+    pass += Seconds(t0);
+    t0 = std::chrono::steady_clock::now();
+    for (auto& v : views) v.NfyViewDataUpdated(source, list);
+    plain += Seconds(t0);
+  }
+  for (auto& v : views) source->UnregisterView(&v, list);
+  source->Release();
+  state.counters["ns_per_view"] = 1e9 * pass / static_cast<double>(state.iterations() * count);
+  state.counters["ratio"] = pass / plain;
+}
+
+}  // namespace
+
+BENCHMARK(BM_RefreshManySourcesVsOneQueryEach)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(2.0);
+BENCHMARK(BM_IdlePollTickVsOneRawCall)->UseRealTime()->MinTime(1.0);
+BENCHMARK(BM_RepositoryLookup)->Arg(1000)->Arg(10000);
+BENCHMARK(BM_NotifyManyViews)->Arg(1000)->Arg(10000);
