@@ -120,8 +120,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
                                          Dstring dataDir)
     : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
-  (void)dataDir;
-  mModules.push_back(std::make_shared<SimSettingStore>(mParams));
+  mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir));
   mModules.push_back(std::make_shared<SimBerMeter>());
 }
 

@@ -1,16 +1,56 @@
 #pragma once
 
-#include "SimCommandModule.h"
+#include <utility>
+#include <vector>
 
-// The instrument's settings: ":MMEM:SETT:NEW" starts a new setting, every parameter back at
-// the value the configuration gives it, and every client hears that everything changed.
+#include "SimCommandModule.h"
+#include "SimSettingFile.h"
+#include "support/DataParcel.h"
+
+// The instrument's setting and its two profiles (docs/simulator.md, "Settings and profiles"):
+// - ":MMEM:SETT:NEW" starts a new setting: every parameter back at the value the configuration
+//   gives it and an empty setting profile; ":MMEM:SETT:LOAD" takes a setting file of the data
+//   directory, ":MMEM:SETT:SAVE" writes one. After a new or loaded setting every client hears
+//   that everything changed.
+// - ":CONF:CSET:PROF:EXPR" is the setting profile, one list expression kept with the setting.
+// - ":CONF:PROF" holds the system profile's values one by one; they belong to the instrument,
+//   not to a setting, and live as long as the server.
 class SimSettingStore : public SimCommandModule {
  public:
-  // `defaults` is the parameter table as configured, before any client wrote to it.
-  explicit SimSettingStore(SimParamTable defaults) : mDefaults(std::move(defaults)) {}
+  // `defaults` is the parameter table as configured, before any client wrote to it; setting
+  // files live below `dataDir` (none when it is empty).
+  SimSettingStore(SimParamTable defaults, Dstring dataDir)
+      : mDefaults(std::move(defaults)), mDataDir(std::move(dataDir)) {}
 
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
 
  private:
+  using Handler = void (SimSettingStore::*)(const SimCommand&, SimContext&);
+  struct Entry {
+    const char* path;
+    Handler query;
+    Handler write;
+  };
+  static const Entry kCommands[];
+
+  void NewSetting(const SimCommand& cmd, SimContext& context);
+  void LoadSetting(const SimCommand& cmd, SimContext& context);
+  void SaveSetting(const SimCommand& cmd, SimContext& context);
+  void QuerySettingProfile(const SimCommand& cmd, SimContext& context);
+  void WriteSettingProfile(const SimCommand& cmd, SimContext& context);
+  void QuerySystemValue(const SimCommand& cmd, SimContext& context);
+  void WriteSystemValue(const SimCommand& cmd, SimContext& context);
+  void ListSystemValues(const SimCommand& cmd, SimContext& context);
+
+  // The path of the setting file named by the first argument; 0, or the SCPI error.
+  int SettingPath(const DataParcel& items, Dstring& path) const;
+  // Makes the file the current setting: 0, or the SCPI error with nothing changed.
+  int Apply(const SimSettingFile& file, bool cableDelays, SimContext& context);
+  std::vector<std::pair<Dstring, Dstring>>::iterator FindSystemValue(const Dstring& name);
+
   SimParamTable mDefaults;
+  Dstring mDataDir;
+  Dstring mSettingProfile;
+  // Name and value text, in the order the names were first written.
+  std::vector<std::pair<Dstring, Dstring>> mSystemValues;
 };

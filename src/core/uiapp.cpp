@@ -13,6 +13,8 @@
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
+#include "settings/QENSettingProfile.h"
+#include "settings/SettingStartUp.h"
 #include "support/ErrorMgr.h"
 #include "support/FWBlocker.h"
 #include "support/MessageCatalogue.h"
@@ -28,6 +30,7 @@ DirtyFlagDs* uiapp::mDirtyFlagDs = nullptr;
 GuiLockDs* uiapp::mGuiLockDs = nullptr;
 BerSvr* uiapp::mBerSvr = nullptr;
 ErrorMgr* uiapp::mErrorMgr = nullptr;
+SettingMRU uiapp::mSettingMRU;
 unsigned long uiapp::mConfigParamSet = 0;
 Dstring uiapp::mResource = "QEN1";
 MeasTimer uiapp::mTime;
@@ -89,6 +92,7 @@ int uiapp::Init(ConditionList& list) {
   mSystemStateDs->RegisterProc(&uiapp::NfyViewDataUpdatedSysState, nullptr);
   QenGuiInst::Init();
   Dte::Init(mDirtyFlagDs, mErrorMgr);
+  QENSettingProfile::Init(mDirtyFlagDs);
   return 0;
 }
 
@@ -101,6 +105,7 @@ int uiapp::End(ConditionList& list) {
     DestroyAppHandle(handle, list);
   }
   Dte::End();
+  QENSettingProfile::End();
   if (QenGuiInst::IsConnectedToServer()) QenGuiInst::DisconnectFromServer(list);
   QenGuiInst::End();
   delete mErrorMgr;
@@ -139,9 +144,8 @@ void uiapp::RegistrationFinished() {
   ConditionList list;
   FWBlocker guard("uiapp::RegistrationFinished", list);
   if (guard.Block()) return;
-  Dstring reply;
-  const Dstring cmd = Dstring::Format(":%s:MMEM:SETT:NEW", QenGuiInst::GetAppHandle().c_str());
-  if (QenGuiInst::Call(cmd, reply, list) != QenStatus::kOk) {
+  SettingStartUp::Run(mConfigParamSet, Toolkit::Get(), mSettingMRU, list);
+  if (!list.IsEmpty()) {
     QenGuiInst::ShowErrorDlg(list, 1);
     list.Clear();
   }

@@ -4,6 +4,7 @@
 
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
+#include "settings/SettingMRU.h"
 #include "support/MeasTimer.h"
 
 class BerSvr;
@@ -71,6 +72,7 @@ class uiapp {
   static GuiLockDs* GetGuiLockDs() { return mGuiLockDs; }
   static BerSvr* GetBerSvr() { return mBerSvr; }
   static ErrorMgr* GetErrorMgr() { return mErrorMgr; }
+  static SettingMRU& GetSettingMRU() { return mSettingMRU; }
   static unsigned long GetConfigParamSet() { return mConfigParamSet; }
   static void SetConfigParamSet(unsigned long set) { mConfigParamSet = set; }
   static SysStateEnum GetSystemState();
@@ -102,6 +104,7 @@ class uiapp {
   static GuiLockDs* mGuiLockDs;
   static BerSvr* mBerSvr;
   static ErrorMgr* mErrorMgr;
+  static SettingMRU mSettingMRU;
   static unsigned long mConfigParamSet;
   static Dstring mResource;
   static std::vector<Dstring> mConstants;

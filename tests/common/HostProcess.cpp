@@ -1,6 +1,7 @@
 #include "common/HostProcess.h"
 
 #include <chrono>
+#include <cstdlib>
 #include <csignal>
 #include <poll.h>
 #include <sys/wait.h>
@@ -12,8 +13,11 @@ HostProcess::HostProcess(const std::vector<std::string>& args) {
   if (pipe(out) != 0) return;
   std::vector<std::string> argv = {QENGUI_PATH};
   argv.insert(argv.end(), args.begin(), args.end());
+  // The host keeps its registry under the configuration directory: never the user's own.
+  const std::string config = "/tmp/qengui-test-config-" + std::to_string(::getpid());
   mPid = fork();
   if (mPid == 0) {
+    setenv("XDG_CONFIG_HOME", config.c_str(), 1);
     dup2(out[1], STDOUT_FILENO);
     dup2(out[1], STDERR_FILENO);
     close(out[0]);

@@ -89,6 +89,7 @@ TEST_F(UiappTest, LockIsNoticedThenReleasedAndTheStateReadAnew) {
   Inst().Expect(":_H:CGR1:MOD1:TYPE?", "\"K2268A\"");
   Inst().Expect("_H:CGR1:MOD1:UCAS?", "FREE");
   Inst().Expect("_H:SGEN:GLOB:CONN?", "ON");
+  Inst().Expect("_H:CONF:CSET:PROF:EXPR?", "(2.0)");
   Tick();
   EXPECT_FALSE(uiapp::GetGuiLockDs()->IsLocked());
   EXPECT_TRUE(uiapp::GetRunStopDs()->IsRunning());

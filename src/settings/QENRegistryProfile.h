@@ -1,0 +1,52 @@
+#pragma once
+
+#include "support/ConditionList.h"
+#include "support/DataParcel.h"
+#include "support/Dstring.h"
+#include "support/LispList.h"
+
+class RegistryStore;
+
+// Named values in the registry, below a root key (RegistryStore::CurrentUser()) and a key
+// path that the caller names. Every value is kept as text in the forms of ProfileValue
+// without parentheses: "12i", "7u", "1.5f", "2.5e-09d", the text itself, or a list
+// expression "(1,2)".
+class QENRegistryProfile {
+ public:
+  // The interface's own key, and the key it had under the maker's former name.
+  static constexpr const char* kGuiKey = "SOFTWARE\\Corvane\\Corvane 71300\\Gui";
+  static constexpr const char* kFormerGuiKey = "SOFTWARE\\Tandry\\TM71300\\Gui";
+
+  // Not owned; null goes back to the store of this platform (FileRegistryStore at its
+  // default path, made on first use).
+  static void SetStore(RegistryStore* store);
+  static RegistryStore& GetStore();
+
+  static int Exists(void* root, const Dstring& key, const Dstring& name, int& exists, ConditionList& list);
+  static int KeyExists(void* root, const Dstring& key, int& exists, ConditionList& list);
+  static int DeleteKey(void* root, const Dstring& key, ConditionList& list);
+  static int DeleteValue(void* root, const Dstring& key, const Dstring& name, ConditionList& list);
+
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, long& value, ConditionList& list);
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, unsigned long& value, ConditionList& list);
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, float& value, ConditionList& list);
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, double& value, ConditionList& list);
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, Dstring& value, ConditionList& list);
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, DataParcel& value, ConditionList& list);
+  static int GetValue(void* root, const Dstring& key, const Dstring& name, LispList& value, ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, long value, ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, unsigned long value, ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, float value, ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, double value, ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, const Dstring& value, ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, const DataParcel& value,
+                      ConditionList& list);
+  static int SetValue(void* root, const Dstring& key, const Dstring& name, const LispList& value,
+                      ConditionList& list);
+
+ private:
+  template <typename T>
+  static int GetTyped(void* root, const Dstring& key, const Dstring& name, T& value, ConditionList& list);
+
+  static RegistryStore* mStore;
+};

@@ -1,0 +1,125 @@
+#include "settings/QENSystemProfile.h"
+
+#include "instrument/CommandText.h"
+#include "instrument/QenGuiInst.h"
+#include "instrument/QenStatus.h"
+#include "settings/ProfileValue.h"
+#include "settings/SettingsStatus.h"
+#include "support/ConditionListLoader.h"
+#include "support/ParserExpression.h"
+
+namespace {
+
+using Outcome = ProfileValue::Outcome;
+
+int Unexpected(const Dstring& name, const Dstring& reply, ConditionList& list) {
+  ConditionListLoader::ConditionToken(list, "GUI_SYSTEM_PROFILE_UNEXPEXPECTED_VALUE", {name, reply},
+                                      SettingsStatus::kUnexpectedValue);
+  return SettingsStatus::kUnexpectedValue;
+}
+
+Outcome ReadReply(const Dstring& reply, Dstring& value) { return ProfileValue::ReadText(reply, value); }
+
+template <typename T>
+Outcome ReadReply(const Dstring& reply, T& value) {
+  return ProfileValue::Read(reply, value);
+}
+
+}  // namespace
+
+int QENSystemProfile::Exists(const Dstring& name, int& exists, ConditionList& list) {
+  Dstring reply;
+  const Dstring cmd = Dstring::Format("%s:CONF:PROF:LIST?", QenGuiInst::GetAppHandle().c_str());
+  if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  DataParcel names;
+  ConditionList parser;
+  bool ok = ParserExpression::Parse(reply, names, parser) == 0;
+  for (const DataItem& item : names) ok = ok && item.GetType() == DataItemType::String;
+  if (!ok) {
+    ConditionListLoader::ConditionToken(list, "GUI_SYSTEM_PROFILE_BAD_LIST", {reply}, SettingsStatus::kBadReply);
+    return SettingsStatus::kBadReply;
+  }
+  exists = 0;
+  for (const DataItem& item : names) exists = exists || item.GetText() == name;
+  return QenStatus::kOk;
+}
+
+int QENSystemProfile::Query(const Dstring& name, Dstring& reply, ConditionList& list) {
+  if (int status = CommandText::CheckArgument(name, list)) return status;
+  const Dstring cmd = Dstring::Format("%s:CONF:PROF? \"%s\"", QenGuiInst::GetAppHandle().c_str(), name.c_str());
+  return QenGuiInst::Call(cmd, reply, list);
+}
+
+template <typename T>
+int QENSystemProfile::GetTyped(const Dstring& name, T& value, ConditionList& list) {
+  Dstring reply;
+  if (int status = Query(name, reply, list)) return status;
+  return ReadReply(reply, value) == Outcome::kRead ? QenStatus::kOk : Unexpected(name, reply, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, long& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, unsigned long& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, float& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, double& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, Dstring& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, DataParcel& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::GetValue(const Dstring& name, LispList& value, ConditionList& list) {
+  return GetTyped(name, value, list);
+}
+
+int QENSystemProfile::Put(const Dstring& name, const Dstring& valueText, ConditionList& list) {
+  if (int status = CommandText::CheckArgument(name, list)) return status;
+  if (int status = CommandText::CheckValue(valueText, list)) return status;
+  Dstring reply;
+  const Dstring cmd =
+      Dstring::Format("%s:CONF:PROF \"%s\",", QenGuiInst::GetAppHandle().c_str(), name.c_str()) + valueText;
+  return QenGuiInst::Call(cmd, reply, list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, long value, ConditionList& list) {
+  return Put(name, ProfileValue::Format(value, true), list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, unsigned long value, ConditionList& list) {
+  return Put(name, ProfileValue::Format(value, true), list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, float value, ConditionList& list) {
+  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
+  return Put(name, ProfileValue::Format(value, true), list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, double value, ConditionList& list) {
+  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
+  return Put(name, ProfileValue::Format(value, true), list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, const Dstring& value, ConditionList& list) {
+  return Put(name, DataItem::MakeString(value).AsExpression(), list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, const DataParcel& value, ConditionList& list) {
+  return Put(name, ProfileValue::Format(value), list);
+}
+
+int QENSystemProfile::SetValue(const Dstring& name, const LispList& value, ConditionList& list) {
+  return Put(name, ProfileValue::Format(value), list);
+}
