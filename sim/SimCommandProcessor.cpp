@@ -1,6 +1,7 @@
 #include "SimCommandProcessor.h"
 
 #include "SimBerMeter.h"
+#include "SimSequence.h"
 #include "SimSettingStore.h"
 
 #include <cctype>
@@ -122,6 +123,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
   // The modules, one line each; the data directory is theirs to keep files in.
   mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir));
   mModules.push_back(std::make_shared<SimBerMeter>());
+  mModules.push_back(std::make_shared<SimSequence>(mParams));
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {

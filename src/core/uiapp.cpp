@@ -13,6 +13,8 @@
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
+#include "sequences/CPortInfo.h"
+#include "sequences/CSequence.h"
 #include "settings/QENSettingProfile.h"
 #include "settings/SettingStartUp.h"
 #include "support/ErrorMgr.h"
@@ -91,6 +93,7 @@ int uiapp::Init(ConditionList& list) {
                    mPLLStateDs, mDataPortOneLockDs, mConnectDs);
   mSystemStateDs->RegisterProc(&uiapp::NfyViewDataUpdatedSysState, nullptr);
   QenGuiInst::Init();
+  CPortInfo::Init(mDirtyFlagDs);
   Dte::Init(mDirtyFlagDs, mErrorMgr);
   QENSettingProfile::Init(mDirtyFlagDs);
   return 0;
@@ -104,6 +107,7 @@ int uiapp::End(ConditionList& list) {
     mBerSvr->End();
     DestroyAppHandle(handle, list);
   }
+  CPortInfo::End();
   Dte::End();
   QENSettingProfile::End();
   if (QenGuiInst::IsConnectedToServer()) QenGuiInst::DisconnectFromServer(list);
@@ -149,6 +153,7 @@ void uiapp::RegistrationFinished() {
     QenGuiInst::ShowErrorDlg(list, 1);
     list.Clear();
   }
+  if (CSequence::InitNumLoopLevels(list) != QenStatus::kLocked && !list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
 }
 
 int uiapp::CreateAppHandle(Dstring& handle, const Dstring& resource, ConditionList& list) {
@@ -174,6 +179,7 @@ int uiapp::Disconnect(ConditionList& list) { return mConnectDs->Disconnect(list)
 int uiapp::Run(ConditionList& list) {
   FWBlocker guard("uiapp::Run", list);
   if (int status = guard.Block()) return status;
+  if (int status = CPortInfo::GetSequence()->SyncSegments(list)) return status;
   return mRunStopDs->Run(list);
 }
 
@@ -187,6 +193,7 @@ void uiapp::NfyDelayedStop(void*) {
 int uiapp::SequenceForce(ConditionList& list) {
   FWBlocker guard("uiapp::SequenceForce", list);
   if (int status = guard.Block()) return status;
+  if (int status = CPortInfo::GetSequence()->SyncSegments(list)) return status;
   Dstring reply;
   return QenGuiInst::Call(Dstring::Format(":%s:SGEN:GLOB:SEQ:FORC", QenGuiInst::GetAppHandle().c_str()), reply, list);
 }
@@ -237,8 +244,12 @@ void uiapp::AsyncAlarmProc(void*) {
 }
 
 int uiapp::AfterLockReleased(ConditionList& list) {
+  int levels = 0;
+  if (!CSequence::IsNumLoopLevelsInitialized()) levels = CSequence::InitNumLoopLevels(list);
+  // The other client may have changed the sequence: the next read must not take it as known.
+  CPortInfo::GetSequence()->ClearLastExpression();
   mDirtyFlagDs->ForceUpdate();
-  if (!mBerSvr->IsInitialized()) mBerSvr->Init(list);
+  if (levels == 0 && !mBerSvr->IsInitialized()) mBerSvr->Init(list);
   return mGuiLockDs->UnLock(list);
 }
 

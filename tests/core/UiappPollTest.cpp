@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <map>
 
 #include "common/InstrumentFixture.h"
 #include "core/uiapp.h"
@@ -49,6 +50,25 @@ class UiappTest : public InstrumentFixture {
   double mNow = 1000.0;
 };
 
+// What the built-in rack answers to the reads that follow a full refresh.
+bool AnswerAsServer(const Dstring& cmd, Dstring& reply) {
+  static const std::map<Dstring, Dstring> kReplies = {
+      {"_H:SGEN:GLOB:INIT:CONT?", "ON"},
+      {"_H:SGEN:GLOB:SYST:STAT?", "RUNN"},
+      {"_H:SGEN:GLOB:PLL:STAT?", "LOCK"},
+      {":SR:_H:CGR@:MOD1:CONN1:PULS:DEL", "1"},
+      {":SR:_H:CGR1:MOD@:CONN1:PULS:DEL", "1"},
+      {":_H:CGR1:MOD1:TYPE?", "\"K2268A\""},
+      {"_H:CGR1:MOD1:UCAS?", "FREE"},
+      {"_H:SGEN:GLOB:CONN?", "ON"},
+      {"_H:SGEN:GLOB:CONF?", "\"PATT\",\"\",(\":CGR1:MOD1:CONN1\",\"PDAT\",\"OUTPUT_PORT\",\"K2268A\")"},
+      {":_H:SGEN:GLOB:SEQ?", "(3.0,\"\",(BLOCK,0,512,0,\"\",(),PAUSE,0,0))"},
+      {"_H:CONF:CSET:PROF:EXPR?", "(2.0)"}};
+  auto it = kReplies.find(cmd);
+  reply = it == kReplies.end() ? Dstring() : it->second;
+  return it != kReplies.end();
+}
+
 }  // namespace
 
 TEST_F(UiappTest, LateTickIsMadeUpButNeverBelowHalfASecond) {
@@ -78,18 +98,15 @@ TEST_F(UiappTest, LockIsNoticedThenReleasedAndTheStateReadAnew) {
   Inst().Expect("_H:SGEN:GLOB:INIT:CONT?", "", QenStatus::kLocked);
   Tick();
   EXPECT_TRUE(uiapp::GetGuiLockDs()->IsLocked());
-  // Free again: the probe passes, the service is set up anew and every state source reads.
+  // Free again: the probe passes, the loop levels are read, the service is set up anew ...
   Inst().Expect("_H:SGEN:GLOB:INIT:CONT?", "OFF");
+  Inst().Expect(":_H:SGEN:GLOB:SEQ:LLEV?", "3");
   Inst().Expect(":L:_H:CGR?", "\":_H:CGR1:MOD3:CONN1:BER\",\":_H:CGR1:PER\"");
-  Inst().Expect("_H:SGEN:GLOB:INIT:CONT?", "ON");
-  Inst().Expect("_H:SGEN:GLOB:SYST:STAT?", "RUNN");
-  Inst().Expect("_H:SGEN:GLOB:PLL:STAT?", "LOCK");
-  Inst().Expect(":SR:_H:CGR@:MOD1:CONN1:PULS:DEL", "1");
-  Inst().Expect(":SR:_H:CGR1:MOD@:CONN1:PULS:DEL", "1");
-  Inst().Expect(":_H:CGR1:MOD1:TYPE?", "\"K2268A\"");
-  Inst().Expect("_H:CGR1:MOD1:UCAS?", "FREE");
-  Inst().Expect("_H:SGEN:GLOB:CONN?", "ON");
-  Inst().Expect("_H:CONF:CSET:PROF:EXPR?", "(2.0)");
+  // ... and everything that follows the dirty flag reads anew, answered as a server would.
+  Inst().SetHandler([](const Dstring& cmd, Dstring& reply) {
+    EXPECT_TRUE(AnswerAsServer(cmd, reply)) << "unexpected command: " << cmd;
+    return 0;
+  });
   Tick();
   EXPECT_FALSE(uiapp::GetGuiLockDs()->IsLocked());
   EXPECT_TRUE(uiapp::GetRunStopDs()->IsRunning());
@@ -119,7 +136,7 @@ TEST_F(UiappTest, TickDuringTheSynchronousPartNeitherSetsTheFlagNorPolls) {
   Inst().SetHandler([&calls](const Dstring& cmd, Dstring& reply) {
     // A loop that never ends would otherwise hang the test.
     if (++calls > 100) uiapp::MainLoopExit();
-    reply = cmd.StartsWith(":SR:") ? "1" : cmd.EndsWith(":TYPE?") ? "\"K2270A\"" : "OFF";
+    AnswerAsServer(cmd, reply);
     return 0;
   });
   uiapp::MainLoop();
