@@ -1,6 +1,7 @@
 #include "SimCommandProcessor.h"
 
 #include "SimBerMeter.h"
+#include "SimSegmentStore.h"
 #include "SimSequence.h"
 #include "SimSettingStore.h"
 
@@ -20,7 +21,8 @@ struct ErrorText {
 constexpr ErrorText kErrorTexts[] = {
     {-100, "Command error"},           {-104, "Data type error"}, {-109, "Missing parameter"},
     {-113, "Undefined header"},        {-200, "Execution error"}, {-222, "Data out of range"},
-    {-224, "Illegal parameter value"},
+    {-224, "Illegal parameter value"}, {-250, "Mass storage error"}, {-256, "File name not found"},
+    {-257, "File name error"},
 };
 
 struct SwitchWord {
@@ -124,6 +126,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
   mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir));
   mModules.push_back(std::make_shared<SimBerMeter>());
   mModules.push_back(std::make_shared<SimSequence>(mParams));
+  mModules.push_back(std::make_shared<SimSegmentStore>(dataDir));
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {

@@ -13,6 +13,7 @@
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
+#include "segments/QenSegmentPool.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "settings/QENSettingProfile.h"
@@ -95,6 +96,7 @@ int uiapp::Init(ConditionList& list) {
   QenGuiInst::Init();
   CPortInfo::Init(mDirtyFlagDs);
   Dte::Init(mDirtyFlagDs, mErrorMgr);
+  QenSegmentPool::Init(mDirtyFlagDs);
   QENSettingProfile::Init(mDirtyFlagDs);
   return 0;
 }
@@ -108,6 +110,7 @@ int uiapp::End(ConditionList& list) {
     DestroyAppHandle(handle, list);
   }
   CPortInfo::End();
+  QenSegmentPool::End();
   Dte::End();
   QENSettingProfile::End();
   if (QenGuiInst::IsConnectedToServer()) QenGuiInst::DisconnectFromServer(list);

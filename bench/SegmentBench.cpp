@@ -1,0 +1,216 @@
+// Segment buffers through qensim: moving a full buffer against a raw transfer of the same
+// bytes, state access against a plain byte loop over the same memory, and paging through a
+// 16M x 64 segment.
+#include <benchmark/benchmark.h>
+
+#include <unistd.h>
+
+#include <chrono>
+#include <filesystem>
+#include <memory>
+#include <string>
+
+#include "instrument/QenGuiInst.h"
+#include "instrument/QenSimProcess.h"
+#include "instrument/QenTcpInstrument.h"
+#include "segments/QenSegmentDs.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/SegmentBuffer.h"
+#include "support/QenEnvironment.h"
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+constexpr long kFullVectors = 799992;  // one trace of 99,999 bytes: the largest buffer
+constexpr long kBigLength = 16L << 20;
+constexpr long kBigWidth = 64;
+constexpr long kPageVectors = 12496;  // 1562 bytes a row, 99,968 bytes a page
+
+double Seconds(Clock::time_point from) {
+  return std::chrono::duration<double>(Clock::now() - from).count();
+}
+
+// One qensim with its own data directory, the call path connected to it, and a second plain
+// client for the raw baseline. Built on first use, shared by the benchmarks.
+class Server {
+ public:
+  static Server& Get() {
+    static Server server;
+    return server;
+  }
+
+  bool IsUp() const { return mUp; }
+  QenTcpInstrument& Raw() { return mRaw; }
+
+  // Makes a segment of memory data, saved, and closed again.
+  bool Make(const Dstring& name, long length, long width) {
+    SegmentProperties p;
+    p.name = name;
+    p.length = length;
+    p.width = width;
+    unsigned created = 0;
+    ConditionList list;
+    return QenSegmentPool::Create(p, created, list) == 0;
+  }
+
+  // The segment opened, with one buffer over `window` vectors from 0.
+  QenSegmentDs* Open(const Dstring& name, long window, SegmentBuffer*& buffer) {
+    ConditionList list;
+    QenSegmentDs* ds = QenSegmentPool::AllocDs(name);
+    if (ds->Open(list) != 0 || ds->CreateBuffer(buffer, list) != 0 || ds->Init(buffer, list) != 0 ||
+        ds->SetBufferLength(buffer, window, list) != 0) {
+      ds->Release();
+      return nullptr;
+    }
+    return ds;
+  }
+
+  QenSegmentDs* Segment(const Dstring& name, long length, long width, long window, SegmentBuffer*& buffer) {
+    return Make(name, length, width) ? Open(name, window, buffer) : nullptr;
+  }
+
+ private:
+  Server() {
+    const std::string dir =
+        std::filesystem::temp_directory_path() / ("qen-segment-bench-" + std::to_string(getpid()));
+    mDir = dir;
+    QenEnvironment::SetLogDirectory(Dstring(dir));
+    std::filesystem::create_directories(dir);
+    mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--test-control", "--data-dir", dir});
+    auto client = std::make_unique<QenTcpInstrument>();
+    Dstring handle;
+    mUp = mSim.Port() != 0 && client->Connect("127.0.0.1", mSim.Port()) == 0 &&
+          client->Call(":QEN:INST:HAND:CRE? _B,\"PSX\",\"BENCH\"", handle) == 0 &&
+          mRaw.Connect("127.0.0.1", mSim.Port()) == 0;
+    QenGuiInst::Init();
+    QenGuiInst::SetInstrument(std::move(client));
+    QenGuiInst::SetAppHandle(handle);
+    QenSegmentPool::Init();
+  }
+  ~Server() {
+    mSim.Stop();
+    std::error_code error;
+    std::filesystem::remove_all(mDir, error);
+  }
+
+  QenSimProcess mSim;
+  QenTcpInstrument mRaw;
+  std::filesystem::path mDir;
+  bool mUp = false;
+};
+
+// Each move writes the 99,999 edited bytes back and reads the next 99,999; the raw exchange
+// sends the same bytes up and gets them back.
+void BM_MoveFullBufferVsRaw(benchmark::State& state) {
+  Server& server = Server::Get();
+  SegmentBuffer* buffer = nullptr;
+  QenSegmentDs* ds =
+      server.IsUp() ? server.Segment("Bench/Move", 2 * kFullVectors, 1, kFullVectors, buffer) : nullptr;
+  if (ds == nullptr) return state.SkipWithError("qensim or the segment did not come up");
+  const Dstring echo = ":TEST:ECHO #599999" + std::string(99999, 'B');
+  ConditionList list;
+  Dstring reply;
+  double moveSeconds = 0, rawSeconds = 0;
+  long start = 0;
+  for (auto _ : state) {
+    ds->ToggleState(buffer, start, 0, list);
+    start = kFullVectors - start;
+    auto t0 = Clock::now();
+    if (ds->SetBufferStart(buffer, start, list) != 0) return state.SkipWithError(list.ToText().c_str());
+    moveSeconds += Seconds(t0);
+    auto t1 = Clock::now();
+    if (server.Raw().Call(echo, reply) != 0 || reply.size() != 100006)
+      return state.SkipWithError("raw echo failed");
+    rawSeconds += Seconds(t1);
+  }
+  const auto n = static_cast<double>(state.iterations());
+  state.counters["move_us"] = 1e6 * moveSeconds / n;
+  state.counters["raw_us"] = 1e6 * rawSeconds / n;
+  state.counters["ratio"] = moveSeconds / rawSeconds;
+  ds->Close(list);
+  ds->Release();
+}
+
+// Every state of a full buffer read (or set, or read as binary digits) through the data
+// source, against a loop that takes the same bits straight from the same bytes.
+void BM_StateAccessVsByteLoop(benchmark::State& state) {
+  Server& server = Server::Get();
+  SegmentBuffer* buffer = nullptr;
+  QenSegmentDs* ds =
+      server.IsUp() ? server.Segment("Bench/States", kFullVectors, 1, kFullVectors, buffer) : nullptr;
+  if (ds == nullptr) return state.SkipWithError("qensim or the segment did not come up");
+  const std::string bytes(99999, '\x5a');
+  ConditionList list;
+  double get = 0, set = 0, digit = 0, loop = 0;
+  long ones = 0;
+  for (auto _ : state) {
+    auto t0 = Clock::now();
+    for (long v = 0; v < kFullVectors; ++v) {
+      char s = 0;
+      ds->GetState(buffer, v, 0, s, list);
+      ones += s == '1';
+    }
+    get += Seconds(t0);
+    t0 = Clock::now();
+    for (long v = 0; v < kFullVectors; ++v) ds->SetState(buffer, v, 0, (v & 1) ? '1' : '0', list);
+    set += Seconds(t0);
+    t0 = Clock::now();
+    for (long v = 0; v < kFullVectors; ++v) {
+      char d = 0;
+      ds->GetDigit(buffer, v, 0, DataFormat::kBin, d, list);
+      ones += d == '1';
+    }
+    digit += Seconds(t0);
+    t0 = Clock::now();
+    for (long v = 0; v < kFullVectors; ++v) {
+      ones += (static_cast<unsigned char>(bytes[static_cast<std::size_t>(v >> 3)]) >> (7 - (v & 7))) & 1u;
+    }
+    benchmark::DoNotOptimize(ones);
+    loop += Seconds(t0);
+  }
+  state.counters["get_ratio"] = get / loop;
+  state.counters["set_ratio"] = set / loop;
+  state.counters["digit_ratio"] = digit / loop;
+  state.counters["loop_ns_per_state"] = 1e9 * loop / static_cast<double>(state.iterations()) / kFullVectors;
+  ds->Close(list);
+  ds->Release();
+}
+
+// A 16M x 64 two-state segment: the time to make it (the server writes its file), to open it
+// (the server reads the file) and per page of its first 100 windows.
+void BM_Page16Mx64(benchmark::State& state) {
+  Server& server = Server::Get();
+  if (!server.IsUp()) return state.SkipWithError("qensim did not come up");
+  SegmentBuffer* buffer = nullptr;
+  auto t0 = Clock::now();
+  const bool made = server.Make("Bench/Big", kBigLength, kBigWidth);
+  const double makeSeconds = Seconds(t0);
+  t0 = Clock::now();
+  QenSegmentDs* ds = made ? server.Open("Bench/Big", kPageVectors, buffer) : nullptr;
+  const double openSeconds = Seconds(t0);
+  if (ds == nullptr) return state.SkipWithError("the segment did not come up");
+  ConditionList list;
+  double pageSeconds = 0, pages = 0;
+  for (auto _ : state) {
+    t0 = Clock::now();
+    for (long page = 1; page <= 100; ++page) {
+      if (ds->SetBufferStart(buffer, (page % 100) * kPageVectors, list) != 0) {
+        return state.SkipWithError(list.ToText().c_str());
+      }
+    }
+    pageSeconds += Seconds(t0);
+    pages += 100;
+  }
+  state.counters["make_ms"] = 1e3 * makeSeconds;
+  state.counters["open_ms"] = 1e3 * openSeconds;
+  state.counters["page_us"] = 1e6 * pageSeconds / pages;
+  ds->Close(list);
+  ds->Release();
+}
+
+}  // namespace
+
+BENCHMARK(BM_MoveFullBufferVsRaw)->MinTime(2.0)->UseRealTime();
+BENCHMARK(BM_StateAccessVsByteLoop)->MinTime(1.0)->UseRealTime();
+BENCHMARK(BM_Page16Mx64)->Iterations(3)->UseRealTime();

@@ -1,0 +1,92 @@
+#include "SimSegmentSearch.h"
+
+#include <algorithm>
+#include <functional>
+#include <string_view>
+
+namespace {
+
+constexpr std::string_view kZeroStates = "0nNkKlL";
+constexpr std::string_view kOneStates = "1pPrRhH";
+constexpr std::string_view kDontCareStates = "xX";
+constexpr std::string_view kErroredStates = "kKrR";
+constexpr std::string_view kDigits = "0123456789abcdef";
+
+bool Matches(char state, char bit) {
+  if (bit == 'x' || kDontCareStates.find(state) != std::string_view::npos) return true;
+  const std::string_view& states = bit == '1' ? kOneStates : kZeroStates;
+  return states.find(state) != std::string_view::npos;
+}
+
+// Walks the positions 0 .. total-1 in the search order and gives the first that `hit` accepts.
+long Walk(long total, const Dstring& direction, long start, const std::function<bool(long)>& hit) {
+  if (total <= 0) return -1;
+  start = std::clamp(start, 0L, total - 1);
+  for (long step = 0; step < total; ++step) {
+    long at = step;
+    if (direction == "NEXT") at = (start + 1 + step) % total;
+    if (direction == "PREV") at = ((start - 1 - step) % total + total) % total;
+    if (hit(at)) return at;
+  }
+  return -1;
+}
+
+}  // namespace
+
+bool SimSegmentSearch::ParsePattern(const Dstring& text, Dstring& bits) {
+  Dstring digits = text.Trimmed();
+  int per = 1;
+  if (!digits.empty() && (digits.back() == 'H' || digits.back() == 'h')) per = 4;
+  if (!digits.empty() && (digits.back() == 'O' || digits.back() == 'o')) per = 3;
+  if (per > 1) digits.pop_back();
+  if (digits.empty()) return false;
+  bits.clear();
+  for (char c : digits) {
+    const char lower = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    const std::size_t value = kDigits.find(lower);
+    if (lower != 'x' && (value == std::string_view::npos || value >= (1u << per))) return false;
+    for (int b = per - 1; b >= 0; --b) bits += lower == 'x' ? 'x' : (((value >> b) & 1u) ? '1' : '0');
+  }
+  return true;
+}
+
+void SimSegmentSearch::Find(const SimSegment& segment, const Dstring& bits, bool alongTraces,
+                            const Dstring& direction, long trace, long vector, long& foundTrace,
+                            long& foundVector) {
+  const long width = segment.GetWidth(), length = segment.GetLength();
+  const long n = static_cast<long>(bits.size());
+  const long inner = alongTraces ? length : width;
+  auto position = [&](long at, long& t, long& v) {
+    t = alongTraces ? at / inner : at % inner;
+    v = alongTraces ? at % inner : at / inner;
+  };
+  auto hit = [&](long at) {
+    long t = 0, v = 0;
+    position(at, t, v);
+    if (alongTraces ? v + n > length : t + n > width) return false;
+    for (long i = 0; i < n; ++i) {
+      const char state = alongTraces ? segment.StateAt(t, v + i) : segment.StateAt(t + i, v);
+      if (!Matches(state, bits[static_cast<std::size_t>(alongTraces ? i : n - 1 - i)])) return false;
+    }
+    return true;
+  };
+  const long start = alongTraces ? trace * inner + vector : vector * inner + trace;
+  const long at = Walk(width * length, direction, start, hit);
+  foundTrace = foundVector = -1;
+  if (at >= 0) position(at, foundTrace, foundVector);
+}
+
+void SimSegmentSearch::FindError(const SimSegment& segment, const Dstring& direction, long trace, long vector,
+                                 long& foundTrace, long& foundVector) {
+  const long width = segment.GetWidth();
+  foundTrace = foundVector = -1;
+  if (segment.GetCoding().find_first_of(kErroredStates.data(), 0, kErroredStates.size()) == Dstring::npos)
+    return;
+  auto hit = [&](long at) {
+    return kErroredStates.find(segment.StateAt(at % width, at / width)) != std::string_view::npos;
+  };
+  const long at = Walk(width * segment.GetLength(), direction, vector * width + trace, hit);
+  if (at < 0) return;
+  foundTrace = at % width;
+  foundVector = at / width;
+}

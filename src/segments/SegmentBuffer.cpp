@@ -1,0 +1,276 @@
+#include "segments/SegmentBuffer.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "instrument/QenGuiInst.h"
+#include "segments/QenSegmentDs.h"
+#include "segments/SegmentReply.h"
+#include "segments/SegmentStatus.h"
+#include "support/DataParcel.h"
+#include "support/FWBlocker.h"
+#include "support/ParserExpression.h"
+
+namespace {
+
+struct TogglePair {
+  char a;
+  char b;
+};
+
+constexpr std::size_t kJoinedReadRoom = 128;
+
+constexpr TogglePair kTogglePairs[] = {{'0', '1'}, {'l', 'h'}, {'L', 'H'}};
+
+// The partner of a state under toggling; the state itself when it has none.
+char PartnerOf(char state) {
+  for (const TogglePair& p : kTogglePairs) {
+    if (state == p.a) return p.b;
+    if (state == p.b) return p.a;
+  }
+  return state;
+}
+
+Dstring Number(long n) {
+  return Dstring::Format("%ld", n);
+}
+
+}  // namespace
+
+long SegmentBuffer::StateWidthOf(const Dstring& alphabet) {
+  long bits = 0;
+  while ((1L << bits) < static_cast<long>(alphabet.size())) ++bits;
+  return bits;
+}
+
+int SegmentBuffer::Init(ConditionList& list) {
+  FWBlocker guard("SegmentBuffer::Init", list);
+  if (int status = guard.Block()) return status;
+  if (int status = ReadDimension(list)) return status;
+  return Read(list);
+}
+
+int SegmentBuffer::ReadDimension(ConditionList& list) {
+  FWBlocker guard("SegmentBuffer::ReadDimension", list);
+  if (int status = guard.Block()) return status;
+  Dstring coding;
+  long length = 0, width = 0;
+  if (int status = mSegment->GetCoding(coding, list, true)) return status;
+  if (int status = mSegment->GetLength(length, list, true)) return status;
+  if (int status = mSegment->GetWidth(width, list, true)) return status;
+  // An empty coding leaves the states as they were.
+  if (!coding.empty()) {
+    mAlphabet = coding;
+    mStateWidth = StateWidthOf(coding);
+  }
+  mSegmentLength = length;
+  mWidth = width;
+  // The window stays inside the segment and within one block, so that it can always be
+  // written back.
+  const long fitting =
+      mWidth > 0 && mStateWidth > 0 ? kMaxBlockBytes / mWidth * 8 / mStateWidth : mBufferLength;
+  mBufferLength = std::min({mBufferLength, length, fitting});
+  mBufferStart = std::clamp(mBufferStart, 0L, length - mBufferLength);
+  mRows.assign(static_cast<std::size_t>(BlockBytes()), 0);
+  mDirty = false;
+  mHasDimension = true;
+  return SegmentStatus::kOk;
+}
+
+Dstring SegmentBuffer::RangeArgs() const {
+  return Dstring::Format("%ld,%ld,%ld,%ld", 0L, mBufferStart, mWidth - 1, mBufferStart + mBufferLength - 1);
+}
+
+int SegmentBuffer::CheckOpen(ConditionList& list) const {
+  if (mSegment->GetNumber() != 0) return SegmentStatus::kOk;
+  return SegmentReply::Refuse(list, "GUI_SEGMENTDS_NOT_OPEN", {mSegment->GetName()}, SegmentStatus::kNotOpen);
+}
+
+Dstring SegmentBuffer::ReadCommand() const {
+  if (mBufferLength == 0 || mWidth == 0) return {};
+  return Dstring::Format("%s:EDIT:SEGM%u:PATT:DATA? %s,BIN", QenGuiInst::GetAppHandle().c_str(),
+                         mSegment->GetNumber(), RangeArgs().c_str());
+}
+
+int SegmentBuffer::WriteCommand(Dstring& cmd, ConditionList& list) const {
+  cmd.clear();
+  if (!mDirty || mBufferLength == 0 || mWidth == 0) return SegmentStatus::kOk;
+  const long bytes = BlockBytes();
+  if (bytes > kMaxBlockBytes) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_BLOCK_TOO_LARGE",
+                                {Number(mBufferLength), Number(mWidth), Number(bytes)},
+                                SegmentStatus::kBlockTooLarge);
+  }
+  cmd = Dstring::Format("%s:EDIT:SEGM%u:PATT:DATA %s,#5%05u", QenGuiInst::GetAppHandle().c_str(),
+                        mSegment->GetNumber(), RangeArgs().c_str(), static_cast<unsigned>(bytes));
+  // Room for the read that a move joins to it, so that the bytes are copied once.
+  cmd.reserve(cmd.size() + mRows.size() + kJoinedReadRoom);
+  cmd.append(mRows.begin(), mRows.end());
+  return SegmentStatus::kOk;
+}
+
+// The reply must be exactly one block of the window's size; otherwise nothing is taken.
+int SegmentBuffer::TakeBlock(const Dstring& reply, ConditionList& list) {
+  DataParcel items;
+  ConditionList ignored;
+  const bool isBlock = ParserExpression::Parse(reply, items, ignored) == 0 && items.size() == 1 &&
+                       items[0].GetType() == DataItemType::Block &&
+                       static_cast<long>(items[0].GetText().size()) == BlockBytes();
+  if (!isBlock) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_BAD_BLOCK",
+                                {SegmentReply::Shown(reply), Number(BlockBytes())}, SegmentStatus::kBadReply);
+  }
+  std::copy(items[0].GetText().begin(), items[0].GetText().end(), mRows.begin());
+  mDirty = false;
+  return SegmentStatus::kOk;
+}
+
+int SegmentBuffer::Read(ConditionList& list) {
+  const Dstring cmd = ReadCommand();
+  if (cmd.empty()) return SegmentStatus::kOk;
+  if (int status = CheckOpen(list)) return status;
+  Dstring reply;
+  if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  return TakeBlock(reply, list);
+}
+
+int SegmentBuffer::Write(ConditionList& list) {
+  Dstring cmd, reply;
+  if (int status = WriteCommand(cmd, list)) return status;
+  if (cmd.empty()) return SegmentStatus::kOk;
+  if (int status = CheckOpen(list)) return status;
+  if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  mDirty = false;
+  return SegmentStatus::kOk;
+}
+
+int SegmentBuffer::SetBufferLength(long length, ConditionList& list) {
+  FWBlocker guard("SegmentBuffer::SetBufferLength", list);
+  if (int status = guard.Block()) return status;
+  return Move(mBufferStart, length, list);
+}
+
+int SegmentBuffer::SetBufferStart(long start, ConditionList& list) {
+  FWBlocker guard("SegmentBuffer::SetBufferStart", list);
+  if (int status = guard.Block()) return status;
+  return Move(start, mBufferLength, list);
+}
+
+int SegmentBuffer::SetBufferStartAndLength(long start, long length, ConditionList& list) {
+  FWBlocker guard("SegmentBuffer::SetBufferStartAndLength", list);
+  if (int status = guard.Block()) return status;
+  return Move(start, length, list);
+}
+
+int SegmentBuffer::CheckWindow(long start, long length, ConditionList& list) const {
+  const bool outside = start < 0 || length < 0 || (mHasDimension && start + length > mSegmentLength);
+  if (outside) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_BAD_WINDOW",
+                                {Number(start), Number(length), Number(mSegmentLength)},
+                                SegmentStatus::kOutOfRange);
+  }
+  const long bytes = RowBytes(length, mStateWidth) * mWidth;
+  if (bytes > kMaxBlockBytes) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_BLOCK_TOO_LARGE",
+                                {Number(length), Number(mWidth), Number(bytes)},
+                                SegmentStatus::kBlockTooLarge);
+  }
+  return SegmentStatus::kOk;
+}
+
+// Unsaved edits are written back before the window moves, in the same frame as the read of
+// the new window, so that a move costs one round trip. If anything in it fails, the buffer
+// keeps its window, its states and its dirty flag: a write sent again sends the same bytes.
+int SegmentBuffer::Move(long start, long length, ConditionList& list) {
+  if (int status = CheckWindow(start, length, list)) return status;
+  if (mSegment->GetNumber() == 0) {
+    mBufferStart = start;
+    if (std::exchange(mBufferLength, length) != length)
+      mRows.assign(static_cast<std::size_t>(BlockBytes()), 0);
+    return SegmentStatus::kOk;
+  }
+  Dstring cmd, reply;
+  if (int status = WriteCommand(cmd, list)) return status;
+  const bool writeBack = !cmd.empty();
+  const long oldStart = std::exchange(mBufferStart, start);
+  const long oldLength = std::exchange(mBufferLength, length);
+  std::vector<std::uint8_t> oldRows;
+  if (length != oldLength) oldRows = std::exchange(mRows, std::vector<std::uint8_t>(BlockBytes(), 0));
+  const Dstring read = ReadCommand();
+  if (writeBack && !read.empty()) cmd += ";";
+  cmd += read;
+  int status = cmd.empty() ? SegmentStatus::kOk : QenGuiInst::Call(cmd, reply, list);
+  if (status == 0 && !read.empty()) status = TakeBlock(reply, list);
+  if (status != 0) {
+    mBufferStart = oldStart;
+    mBufferLength = oldLength;
+    if (length != oldLength) mRows = std::move(oldRows);
+    return status;
+  }
+  if (writeBack) mDirty = false;
+  return SegmentStatus::kOk;
+}
+
+int SegmentBuffer::CheckPosition(long vector, long trace, ConditionList& list) const {
+  if (vector < mBufferStart || vector >= mBufferStart + mBufferLength) {
+    return SegmentReply::Refuse(
+        list, "GUI_SEGMENTBUFFER_VECTOR_NOT_IN_BUFFER",
+        {Number(vector), Number(mBufferStart), Number(mBufferStart + mBufferLength - 1)},
+        SegmentStatus::kOutOfRange);
+  }
+  if (trace < 0 || trace >= mWidth) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_TRACE_NOT_IN_RANGE", {Number(trace), Number(mWidth)},
+                                SegmentStatus::kOutOfRange);
+  }
+  return SegmentStatus::kOk;
+}
+
+long SegmentBuffer::StateNumber(char state) const {
+  const std::size_t at = mAlphabet.find(state);
+  return at == Dstring::npos ? -1 : static_cast<long>(at);
+}
+
+unsigned SegmentBuffer::ReadBits(long vector, long trace) const {
+  const std::uint8_t* row = mRows.data() + trace * RowSize();
+  long bit = (vector - mBufferStart) * mStateWidth;
+  unsigned value = 0;
+  for (long i = 0; i < mStateWidth; ++i, ++bit)
+    value = (value << 1) | ((row[bit >> 3] >> (7 - (bit & 7))) & 1u);
+  return value;
+}
+
+void SegmentBuffer::WriteBits(long vector, long trace, unsigned value) {
+  std::uint8_t* row = mRows.data() + trace * RowSize();
+  long bit = (vector - mBufferStart) * mStateWidth;
+  for (long i = mStateWidth - 1; i >= 0; --i, ++bit) {
+    const auto mask = static_cast<std::uint8_t>(0x80u >> (bit & 7));
+    row[bit >> 3] = ((value >> i) & 1u) ? (row[bit >> 3] | mask) : (row[bit >> 3] & ~mask);
+  }
+}
+
+int SegmentBuffer::SetState(long vector, long trace, char state, ConditionList& list) {
+  if (int status = CheckPosition(vector, trace, list)) return status;
+  const long number = StateNumber(state);
+  if (number < 0) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_UNKNOWN_STATE_CODE", {Dstring(1, state), mAlphabet},
+                                SegmentStatus::kUnknownState);
+  }
+  WriteBits(vector, trace, static_cast<unsigned>(number));
+  mDirty = true;
+  return SegmentStatus::kOk;
+}
+
+// A state number outside the coding (a block the server should not have sent) reads as '?'.
+int SegmentBuffer::GetState(long vector, long trace, char& state, ConditionList& list) const {
+  if (int status = CheckPosition(vector, trace, list)) return status;
+  const unsigned number = ReadBits(vector, trace);
+  state = number < mAlphabet.size() ? mAlphabet[number] : '?';
+  return SegmentStatus::kOk;
+}
+
+int SegmentBuffer::ToggleState(long vector, long trace, ConditionList& list) {
+  char state = 0;
+  if (int status = GetState(vector, trace, state, list)) return status;
+  const char partner = PartnerOf(state);
+  return partner == state ? SegmentStatus::kOk : SetState(vector, trace, partner, list);
+}

@@ -1,0 +1,71 @@
+#pragma once
+
+#include <cstdint>
+#include <vector>
+
+#include "support/ConditionList.h"
+#include "support/Dstring.h"
+
+class QenSegmentDs;
+
+// A slice of a segment held on this side: `bufferLength` consecutive vectors from
+// `bufferStart`, over all traces, packed exactly as the server's data block carries them.
+// Each trace is a row of bufferLength states of stateWidth bits, most significant bit first
+// and without gaps, padded to whole bytes; the block is the rows of traces 0 .. width-1 in
+// that order. The rows lie back to back in one array, so a block read or write is one copy.
+//
+// Its only client is QenSegmentDs, which forwards each operation under the same name.
+class SegmentBuffer {
+ public:
+  // One data block carries at most this many bytes.
+  static constexpr long kMaxBlockBytes = 99999;
+
+  // Bits per state for an alphabet of n characters: the smallest count that holds n states.
+  static long StateWidthOf(const Dstring& alphabet);
+  // Bytes of one row of `length` states.
+  static long RowBytes(long length, long stateWidth) { return (length * stateWidth + 7) / 8; }
+
+ private:
+  friend class QenSegmentDs;
+
+  explicit SegmentBuffer(QenSegmentDs* segment) : mSegment(segment) {}
+
+  int Init(ConditionList& list);
+  int ReadDimension(ConditionList& list);
+  int Read(ConditionList& list);
+  int Write(ConditionList& list);
+  int SetBufferLength(long length, ConditionList& list);
+  int SetBufferStart(long start, ConditionList& list);
+  int SetBufferStartAndLength(long start, long length, ConditionList& list);
+  int SetState(long vector, long trace, char state, ConditionList& list);
+  int GetState(long vector, long trace, char& state, ConditionList& list) const;
+  int ToggleState(long vector, long trace, ConditionList& list);
+
+  long RowSize() const { return RowBytes(mBufferLength, mStateWidth); }
+  long BlockBytes() const { return RowSize() * mWidth; }
+  // The range checks of Set/GetState; a condition and nonzero when out of range.
+  int CheckPosition(long vector, long trace, ConditionList& list) const;
+  // The index of `state` in the alphabet, or -1.
+  long StateNumber(char state) const;
+  unsigned ReadBits(long vector, long trace) const;
+  void WriteBits(long vector, long trace, unsigned value);
+  int CheckOpen(ConditionList& list) const;
+  // The block commands of the window; empty when there is nothing to send.
+  Dstring ReadCommand() const;
+  int WriteCommand(Dstring& cmd, ConditionList& list) const;
+  int TakeBlock(const Dstring& reply, ConditionList& list);
+  int CheckWindow(long start, long length, ConditionList& list) const;
+  int Move(long start, long length, ConditionList& list);
+  Dstring RangeArgs() const;
+
+  long mBufferLength = 0;
+  long mBufferStart = 0;
+  std::vector<std::uint8_t> mRows;
+  QenSegmentDs* mSegment;
+  Dstring mAlphabet;
+  long mStateWidth = 0;
+  long mSegmentLength = 0;
+  long mWidth = 0;
+  bool mDirty = false;
+  bool mHasDimension = false;  // the segment's dimensions have been read
+};
