@@ -16,6 +16,7 @@
 #include "segments/QenSegmentPool.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
+#include "sequences/SegmentPoolSync.h"
 #include "settings/QENSettingProfile.h"
 #include "settings/SettingStartUp.h"
 #include "support/ErrorMgr.h"
@@ -53,6 +54,8 @@ std::vector<Dstring> uiapp::mVerbs = {"uiapp.Run", "uiapp.Stop", "uiapp.Sequence
                                       "uiapp.Connect", "uiapp.Disconnect"};
 
 namespace {
+
+SegmentPoolSync gSegmentPoolSync;
 
 constexpr double kPollSeconds = 1.0;
 constexpr double kShortestPollSeconds = 0.5;
@@ -97,6 +100,7 @@ int uiapp::Init(ConditionList& list) {
   CPortInfo::Init(mDirtyFlagDs);
   Dte::Init(mDirtyFlagDs, mErrorMgr);
   QenSegmentPool::Init(mDirtyFlagDs);
+  CPortInfo::GetSequence()->SetSegmentSync(&gSegmentPoolSync);
   QENSettingProfile::Init(mDirtyFlagDs);
   return 0;
 }

@@ -5,8 +5,8 @@
 
 // What CSequence::SyncSegments hands each named segment of the sequence to before the
 // instrument runs: the segment pool, which writes back what the editors changed so that the
-// server runs what the user sees. The pool (src/segments, issue 4) implements it through an
-// adapter installed with CSequence::SetSegmentSync; without one SyncSegments does nothing.
+// server runs what the user sees. SegmentPoolSync is that adapter, installed with
+// CSequence::SetSegmentSync; without one SyncSegments does nothing.
 class SequenceSegmentSync {
  public:
   virtual ~SequenceSegmentSync() = default;
