@@ -1,6 +1,8 @@
 // The expression parser against a plain byte scan of the same ~1 MB sequence expression.
 #include <benchmark/benchmark.h>
 
+#include "ScanBaseline.h"
+
 #include <algorithm>
 #include <chrono>
 #include <cstddef>
@@ -28,28 +30,10 @@ const std::string& Text() {
   return text;
 }
 
-std::size_t Scan(const std::string& text) {
-  std::size_t count = 0;
-  for (char c : text) count += (c == ',') + (c == '(') + (c == ')');
-  return count;
-}
-
-// The fastest of several scans, so the ratio is measured against the baseline of this run.
-double ScanSeconds(const std::string& text) {
-  double best = 1e9;
-  for (int i = 0; i < 20; ++i) {
-    auto start = std::chrono::steady_clock::now();
-    std::size_t count = Scan(text);
-    benchmark::DoNotOptimize(count);
-    best = std::min(best, std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count());
-  }
-  return best;
-}
-
 void BM_ScanBytes(benchmark::State& state) {
   const std::string& text = Text();
   for (auto _ : state) {
-    std::size_t count = Scan(text);
+    std::size_t count = ScanStructure(text);
     benchmark::DoNotOptimize(count);
   }
   state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * text.size()));

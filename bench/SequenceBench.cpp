@@ -3,6 +3,8 @@
 // read after one edit. Each prints its time over the scan's, measured in the same run.
 #include <benchmark/benchmark.h>
 
+#include "ScanBaseline.h"
+
 #include <algorithm>
 #include <chrono>
 #include <cstddef>
@@ -22,48 +24,43 @@ std::string Block(int i) {
          ports + ")";
 }
 
-// A long sequence of the second generation: runs of blocks, one-block loops and two-block loops
-// inside endless top-level loops, with labels. Item `skip` (a plain block) is left out.
+// Item `i` of a long sequence of the second generation: runs of blocks, one-block loops and
+// two-block loops inside endless top-level loops, with labels. `blocks` counts what it adds.
+std::string Item(int i, int& blocks) {
+  std::string item = i == 0 ? "," : ",\"l" + std::to_string(i) + "\",";
+  if (i % 5 == 0) {
+    blocks += 3;
+    return item + "(LOOP3,0,INF,\"\",(SEQ," + Block(i) + ",\"\",(LOOP1,1,4,\"\",(SEQ," + Block(i + 1) +
+           ",\"\"," + Block(i + 2) + "))))";
+  }
+  blocks += 1;
+  return item + (i % 5 == 1 ? "(LOOP2,0," + std::to_string(i % 100 + 1) + ",\"\"," + Block(i) + ")" : Block(i));
+}
+
+// A sequence of at least `minimumSize` bytes; item `skip` is left out.
 std::string MakeSequence(std::size_t minimumSize, int skip = -1) {
   std::string text = "(3.0,\"start\",(SEQ";
   std::size_t size = text.size();
+  int blocks = 0;
   for (int i = 0; size < minimumSize; ++i) {
-    std::string item = i == 0 ? "," : ",\"l" + std::to_string(i) + "\",";
-    if (i % 5 == 0) {
-      item += "(LOOP3,0,INF,\"\",(SEQ," + Block(i) + ",\"\",(LOOP1,1,4,\"\",(SEQ," + Block(i + 1) + ",\"\"," +
-              Block(i + 2) + "))))";
-    } else if (i % 5 == 1) {
-      item += "(LOOP2,0," + std::to_string(i % 100 + 1) + ",\"\"," + Block(i) + ")";
-    } else {
-      item += Block(i);
-    }
+    std::string item = Item(i, blocks);
     size += item.size();
     if (i != skip) text += item;
   }
   return text + "))";
 }
 
+// A sequence of at least `minimumBlocks` blocks.
+std::string MakeBlocks(int minimumBlocks) {
+  std::string text = "(3.0,\"start\",(SEQ";
+  int blocks = 0;
+  for (int i = 0; blocks < minimumBlocks; ++i) text += Item(i, blocks);
+  return text + "))";
+}
+
 const std::string& Text() {
   static const std::string text = MakeSequence(1 << 20);
   return text;
-}
-
-std::size_t Scan(const std::string& text) {
-  std::size_t count = 0;
-  for (char c : text) count += (c == ',') + (c == '(') + (c == ')');
-  return count;
-}
-
-// The fastest of several scans, so the ratio is measured against the baseline of this run.
-double ScanSeconds(const std::string& text) {
-  double best = 1e9;
-  for (int i = 0; i < 20; ++i) {
-    auto start = std::chrono::steady_clock::now();
-    std::size_t count = Scan(text);
-    benchmark::DoNotOptimize(count);
-    best = std::min(best, std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count());
-  }
-  return best;
 }
 
 template <typename Run>
@@ -83,7 +80,7 @@ void Measure(benchmark::State& state, const char* counter, Run run) {
 void BM_ScanSequence(benchmark::State& state) {
   const std::string& text = Text();
   for (auto _ : state) {
-    std::size_t count = Scan(text);
+    std::size_t count = ScanStructure(text);
     benchmark::DoNotOptimize(count);
   }
   state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * text.size()));
@@ -124,8 +121,56 @@ void BM_AnalyzeOneEdit(benchmark::State& state) {
   Measure(state, "analyze_over_scan", [&] { return now.AnalyzeChanges(old.GetContent(), list) == 0; });
 }
 
+// One edit's round trip: write the model, read it back into a second model and analyse the
+// difference. Measured at 10,000 and 20,000 blocks with three loop levels in the same run;
+// the ratio of the two times shows whether the cost is linear (2.0). Each phase is timed.
+struct Cycle {
+  double write = 0;
+  double read = 0;
+  double analyze = 0;
+  double Total() const { return write + read + analyze; }
+};
+
+bool RunCycle(const std::string& text, Cycle& cycle) {
+  CSequence model;
+  CSequence back;
+  ConditionList list;
+  if (model.fromExpression(text, list) != 0) return false;
+  auto t0 = std::chrono::steady_clock::now();
+  Dstring out;
+  if (model.asExpression(out, list) != 0) return false;
+  auto t1 = std::chrono::steady_clock::now();
+  if (back.fromExpression(out, list) != 0) return false;
+  auto t2 = std::chrono::steady_clock::now();
+  if (back.AnalyzeChanges(model.GetContent(), list) != 0) return false;
+  auto t3 = std::chrono::steady_clock::now();
+  cycle.write += std::chrono::duration<double>(t1 - t0).count();
+  cycle.read += std::chrono::duration<double>(t2 - t1).count();
+  cycle.analyze += std::chrono::duration<double>(t3 - t2).count();
+  return true;
+}
+
+void BM_SequenceCycle10kVs20k(benchmark::State& state) {
+  CSequence::SetNumLoopLevels(3);
+  static const std::string small = MakeBlocks(10000);
+  static const std::string large = MakeBlocks(20000);
+  Cycle s;
+  Cycle l;
+  for (auto _ : state) {
+    if (!RunCycle(small, s) || !RunCycle(large, l)) return state.SkipWithError("the sequence was not handled");
+  }
+  const double n = static_cast<double>(state.iterations());
+  state.counters["ms_10k"] = 1e3 * s.Total() / n;
+  state.counters["ms_20k"] = 1e3 * l.Total() / n;
+  state.counters["write_ratio"] = l.write / s.write;
+  state.counters["read_ratio"] = l.read / s.read;
+  state.counters["analyze_ratio"] = l.analyze / s.analyze;
+  state.counters["ratio"] = l.Total() / s.Total();
+}
+
 }  // namespace
 
+BENCHMARK(BM_SequenceCycle10kVs20k)->Unit(benchmark::kMillisecond)->MinTime(2.0);
 BENCHMARK(BM_ScanSequence)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_ReadSequenceExpression)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_WriteSequenceExpression)->Unit(benchmark::kMillisecond);
