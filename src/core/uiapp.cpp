@@ -139,6 +139,22 @@ int uiapp::End(ConditionList& list) {
   return 0;
 }
 
+int uiapp::LoadDatLib(ConditionList& list) { return Toolkit::Get().LoadResourceLibrary("uiapp", list); }
+
+const std::vector<Dstring>& uiapp::ClassNames() {
+  static const std::vector<Dstring> kClasses = {"UnitEd",   "LbUnitEd",   "QenDsCBut", "QenDsRBut", "QenDsCBox",
+                                                "QenDsSlidr", "QenDsSTEd", "QenParEd",  "QenParLb"};
+  return kClasses;
+}
+
+int uiapp::RegisterClasses(ConditionList& list) {
+  int status = 0;
+  for (const auto& name : ClassNames()) {
+    if (int rc = Toolkit::Get().RegisterClass(name, list); rc != 0 && status == 0) status = rc;
+  }
+  return status;
+}
+
 void uiapp::RegisterConstants() { Toolkit::Get().RegisterScriptItems("constants", mConstants, 1); }
 void uiapp::RegisterEvents() { Toolkit::Get().RegisterScriptItems("events", mEvents, 1); }
 void uiapp::RegisterVerbs() { Toolkit::Get().RegisterScriptItems("verbs", mVerbs, 1); }

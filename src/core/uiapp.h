@@ -25,7 +25,7 @@ enum SysStateEnum : int;
 // error manager, registers windows and script items with the toolkit, runs the main loop and
 // the one-second poll, and offers the instrument-wide actions. All static.
 //
-// Order of calls over the life of the application: RegisterConstants/RegisterEvents/
+// Order of calls over the life of the application: LoadDatLib, RegisterClasses, RegisterConstants/RegisterEvents/
 // RegisterVerbs, RegisterWindows, Init, connection and
 // CreateAppHandle, RegistrationFinished, StartPolling, MainLoop, EndPolling, End,
 // UnregisterWindows.
@@ -34,6 +34,11 @@ class uiapp {
   static int Init(ConditionList& list);
   static int End(ConditionList& list);
 
+  // Opens the resource library "uiapp" through the toolkit.
+  static int LoadDatLib(ConditionList& list);
+  // Makes every widget class of the library known to the toolkit's resource loader.
+  static int RegisterClasses(ConditionList& list);
+  static const std::vector<Dstring>& ClassNames();
   static void RegisterConstants();
   static void RegisterEvents();
   static void RegisterVerbs();

@@ -25,6 +25,15 @@ class HeadlessToolkit : public ToolkitPort {
   int AskYesNo(const Dstring& text) override;
   void SetWaitCursor(bool on) override { mWaitCursor = on; }
   bool IsShiftDown() override { return mShiftDown; }
+  // Without a display there are no resources to read: the names are only recorded.
+  int LoadResourceLibrary(const Dstring& name, ConditionList&) override {
+    mLibraries.insert(name);
+    return 0;
+  }
+  int RegisterClass(const Dstring& className, ConditionList&) override {
+    mClasses.insert(className);
+    return 0;
+  }
   void RegisterWindow(const Dstring& resource) override { mWindows.insert(resource); }
   void UnregisterWindow(const Dstring& resource) override { mWindows.erase(resource); }
   void RegisterScriptItems(const char* kind, const std::vector<Dstring>& names, unsigned flag) override;
@@ -43,6 +52,8 @@ class HeadlessToolkit : public ToolkitPort {
   const std::deque<Dstring>& Alerts() const { return mAlerts; }
   const std::deque<Dstring>& Questions() const { return mQuestions; }
   const std::set<Dstring>& Windows() const { return mWindows; }
+  const std::set<Dstring>& Classes() const { return mClasses; }
+  const std::set<Dstring>& Libraries() const { return mLibraries; }
   bool IsAlarmArmed() const { return mAlarmProc != nullptr; }
   double AlarmDue() const { return mAlarmDue; }
   bool IsWaitCursorOn() const { return mWaitCursor; }
@@ -63,6 +74,8 @@ class HeadlessToolkit : public ToolkitPort {
   std::deque<Dstring> mAlerts;
   std::deque<Dstring> mQuestions;
   std::set<Dstring> mWindows;
+  std::set<Dstring> mClasses;
+  std::set<Dstring> mLibraries;
   std::function<void(const Dstring&, Icon)> mAlertSink;
   std::function<void()> mAfterEvent;
   std::atomic<bool> mInterrupted{false};

@@ -2,6 +2,7 @@
 
 #include <vector>
 
+#include "support/ConditionList.h"
 #include "support/Dstring.h"
 
 // Everything the core asks of a GUI toolkit. The Qt adapter serves the GUI; the headless
@@ -32,6 +33,11 @@ class ToolkitPort {
   virtual void SetWaitCursor(bool on) = 0;
   virtual bool IsShiftDown() = 0;
 
+  // Opens the resource library `name` (windows and dialogs) and checks that every resource
+  // in it can be read; a missing or broken one is a condition naming it.
+  virtual int LoadResourceLibrary(const Dstring& name, ConditionList& list) = 0;
+  // Makes a class of the library known to the resource loader by its class name ("UnitEd").
+  virtual int RegisterClass(const Dstring& className, ConditionList& list) = 0;
   // Binds a window resource ("paramedit.ParamEd") to its window class, and the reverse.
   virtual void RegisterWindow(const Dstring& resource) = 0;
   virtual void UnregisterWindow(const Dstring& resource) = 0;

@@ -1,0 +1,78 @@
+#include "params/ParFieldState.h"
+
+#include <cmath>
+
+#include "data/QenParamDs.h"
+#include "params/DsBinding.h"
+#include "params/ValueText.h"
+#include "support/ConditionListLoader.h"
+
+namespace {
+
+// The server's text holds twelve decimals: a value it echoes is equal within that.
+bool SameValue(double a, double b) { return std::fabs(a - b) <= 1e-11 * std::max(std::fabs(a), std::fabs(b)); }
+
+}  // namespace
+
+int ParFieldState::ReadValue(DsBinding& binding, ConditionList& list) {
+  Dstring reply;
+  if (int status = binding.Query(false, reply, list)) return status;
+  if (binding.GetDs() == nullptr) return 0;
+  if (ValueText::IsNoValue(reply)) {
+    mNoValue = true;
+    mAskPending = false;
+    return 0;
+  }
+  const double value = ValueText::ReadReplyNumber(reply);
+  if (std::isnan(value)) {
+    ConditionListLoader::ConditionToken(list, "GUI_PARED_BAD_VALUE", {binding.GetDsName(), reply}, 1);
+    return 1;
+  }
+  mValue = value;
+  mNoValue = false;
+  mLastSent = ValueText::FormatSent(value);
+  if (mAskPending) {
+    mAskPending = false;
+    mAdjusted = !SameValue(mAsked, value);
+  }
+  return 0;
+}
+
+int ParFieldState::ReadUnits(DsBinding& binding, ConditionList& list) {
+  if (binding.GetAttrDs() == nullptr) return 0;
+  Dstring reply;
+  if (int status = binding.GetAttrDs()->QueryStrValue(reply, list)) return status;
+  UnitsRecord read = mUnits;
+  if (int status = read.Parse(reply, list)) return status;
+  mUnits = read;
+  return 0;
+}
+
+Dstring ParFieldState::DisplayText() const {
+  return mNoValue ? Dstring() : ValueText::FormatDisplay(mValue, DisplayExp());
+}
+
+int ParFieldState::AdjustAndSend(const Dstring& text, int steps, DsBinding& binding, ConditionList& list) {
+  if (text.Trimmed().empty()) return 0;
+  const double scale = std::pow(10.0, DisplayExp());
+  const double typed = ValueText::ReadLeadingNumber(text);
+  const double value = typed * scale + steps * scale * mUnits.step;
+  if (!std::isfinite(value)) {
+    ConditionListLoader::ConditionToken(list, "GUI_PARED_BAD_NUMBER", {text}, 1);
+    return 1;
+  }
+  const Dstring sent = ValueText::FormatSent(value);
+  if (DsBinding::IsDesignMode() || sent == mLastSent || binding.GetDs() == nullptr) return 0;
+  mLastSent = sent;
+  mAsked = value;
+  mAskPending = true;
+  return binding.Write(false, sent, list);
+}
+
+bool ParFieldState::TakeAdjusted(double& asked, double& held) {
+  if (!mAdjusted) return false;
+  mAdjusted = false;
+  asked = mAsked;
+  held = mValue;
+  return true;
+}

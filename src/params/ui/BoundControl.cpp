@@ -1,0 +1,135 @@
+#include "params/ui/BoundControl.h"
+
+#include <QPainter>
+#include <QTimer>
+#include <QWidget>
+
+#include "core/uiapp.h"
+#include "instrument/QenGuiInst.h"
+#include "support/ErrorMgr.h"
+#include "toolkit/Toolkit.h"
+
+namespace {
+
+constexpr int kMarkMs = 2500;
+
+ConditionList& PendingReport() {
+  static ConditionList pending;
+  return pending;
+}
+
+void ShowPendingReport(void*) {
+  ConditionList list = PendingReport();
+  PendingReport().Clear();
+  if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
+}
+
+// A frame drawn over a control that lets the mouse through.
+class AdjustedMark : public QWidget {
+ public:
+  explicit AdjustedMark(QWidget* parent) : QWidget(parent) {
+    setAttribute(Qt::WA_TransparentForMouseEvents);
+    setObjectName(QStringLiteral("AdjustedMark"));
+  }
+
+ protected:
+  void paintEvent(QPaintEvent*) override {
+    QPainter painter(this);
+    painter.setPen(QPen(QColor(0xe0, 0x80, 0x00), 2));
+    painter.drawRect(rect().adjusted(1, 1, -1, -1));
+  }
+};
+
+}  // namespace
+
+BoundControl::BoundControl(QWidget* widget, std::string_view className, bool withAttrView)
+    : mWidget(widget), mColourTarget(widget), mBinding(*this, className, withAttrView) {}
+
+BoundControl::~BoundControl() { NfyEnd(); }
+
+void BoundControl::NfyInit() {
+  if (mBinding.IsInitialised()) return;
+  mNormal = mColourTarget->palette();
+  mBinding.NfyInit();
+  ShowSourceState();
+}
+
+void BoundControl::NfyEnd() { mBinding.NfyEnd(); }
+
+void BoundControl::SetDsBaseNameProperty(const QString& text) {
+  ConditionList list;
+  mBinding.SetDsBaseName(text.toStdString(), list);
+  Report(list);
+}
+
+void BoundControl::SetDsCmdNameProperty(const QString& text) {
+  ConditionList list;
+  mBinding.SetDsCmdName(text.toStdString(), list);
+  Report(list);
+}
+
+void BoundControl::SwapColours(bool failed) {
+  if (failed == mShowsFailed) return;
+  mShowsFailed = failed;
+  QPalette palette = mNormal;
+  if (failed) {
+    for (auto role : {QPalette::Base, QPalette::Window, QPalette::Button}) {
+      if (mBgColorFailed.isValid()) palette.setColor(role, mBgColorFailed);
+    }
+    for (auto role : {QPalette::Text, QPalette::WindowText, QPalette::ButtonText}) {
+      if (mFgColorFailed.isValid()) palette.setColor(role, mFgColorFailed);
+    }
+  }
+  mColourTarget->setAutoFillBackground(failed && mBgColorFailed.isValid());
+  mColourTarget->setPalette(palette);
+}
+
+void BoundControl::ShowSourceState() {
+  SwapColours(mBinding.IsFailed());
+  mWidget->setToolTip(mMark ? mMarkTip : QString::fromStdString(mBinding.ToolTip()));
+}
+
+void BoundControl::MarkAdjusted(const QString& held, const QString& asked) {
+  ClearMark();
+  auto* mark = new AdjustedMark(mWidget);
+  mark->setGeometry(mWidget->rect());
+  mark->show();
+  mark->raise();
+  mMark = mark;
+  mMarkTip = QStringLiteral("set to %1 (asked %2)").arg(held, asked);
+  mWidget->setToolTip(mMarkTip);
+  QTimer::singleShot(kMarkMs, mark, [this] { ClearMark(); });
+}
+
+bool BoundControl::IsMarkedAdjusted() const { return !mMark.isNull(); }
+
+void BoundControl::ClearMark() {
+  if (mMark) mMark->deleteLater();
+  mMark.clear();
+  mWidget->setToolTip(QString::fromStdString(mBinding.ToolTip()));
+}
+
+void BoundControl::Report(const ConditionList& list) {
+  if (list.IsEmpty()) return;
+  if (ErrorMgr* errors = uiapp::GetErrorMgr()) errors->add(list);
+  const bool first = PendingReport().IsEmpty();
+  PendingReport().Append(list);
+  if (first) Toolkit::Get().CallDeferred(ShowPendingReport, nullptr);
+}
+
+QList<BoundControl*> BoundControl::FindAll(QWidget* root) {
+  QList<BoundControl*> found;
+  if (auto* self = dynamic_cast<BoundControl*>(root)) found.append(self);
+  for (QWidget* child : root->findChildren<QWidget*>()) {
+    if (auto* control = dynamic_cast<BoundControl*>(child)) found.append(control);
+  }
+  return found;
+}
+
+int BoundControl::SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list) {
+  int status = 0;
+  for (BoundControl* control : FindAll(root)) {
+    if (int rc = control->SetDsBaseName(base, list); rc != 0 && status == 0) status = rc;
+  }
+  return status;
+}

@@ -1,0 +1,74 @@
+#pragma once
+
+#include <QColor>
+#include <QList>
+#include <QPalette>
+#include <QPointer>
+#include <string_view>
+
+#include "params/DsBinding.h"
+#include "toolkit/qt/ResourceWidget.h"
+
+class QWidget;
+
+// The Qt side of the binding that every data-bound control holds: the control's widget, its
+// failed colours swapped in and out against the normal ones saved at init, its tooltip, the
+// short-lived mark of a value the instrument took differently, and the reporting of errors
+// from the user's own actions.
+class BoundControl : public DsBinding::Client, public ResourceWidget {
+ public:
+  BoundControl(QWidget* widget, std::string_view className, bool withAttrView = false);
+  ~BoundControl() override;
+  BoundControl(const BoundControl&) = delete;
+  BoundControl& operator=(const BoundControl&) = delete;
+
+  DsBinding& Binding() { return mBinding; }
+  const DsBinding& Binding() const { return mBinding; }
+  // Saves the normal colours and registers; later calls do nothing.
+  void NfyInit() override;
+  void NfyEnd();
+  bool IsInitialised() const { return mBinding.IsInitialised(); }
+
+  // The attributes as properties: a change from a form or a script moves the registration,
+  // and what goes wrong is reported like a user's action.
+  QString DsBaseNameProperty() const { return QString::fromStdString(mBinding.GetDsBaseName()); }
+  QString DsCmdNameProperty() const { return QString::fromStdString(mBinding.GetDsCmdName()); }
+  void SetDsBaseNameProperty(const QString& text);
+  void SetDsCmdNameProperty(const QString& text);
+  int SetDsBaseName(const Dstring& text, ConditionList& list) { return mBinding.SetDsBaseName(text, list); }
+  int SetDsCmdName(const Dstring& text, ConditionList& list) { return mBinding.SetDsCmdName(text, list); }
+  Dstring GetDsName() const { return mBinding.GetDsName(); }
+
+  QColor mBgColorFailed;
+  QColor mFgColorFailed;
+
+  // Failed colours while the source is failed, and the tooltip.
+  void ShowSourceState();
+  // Marks the control for a moment: the instrument holds `held`, the user asked for `asked`.
+  void MarkAdjusted(const QString& held, const QString& asked);
+  bool IsMarkedAdjusted() const;
+
+  // Conditions of a user's action: kept in the error manager and shown after the event.
+  static void Report(const ConditionList& list);
+  // Every bound control in `root` (and root itself).
+  static QList<BoundControl*> FindAll(QWidget* root);
+  // Moves every bound control in `root` to the base name `base`.
+  static int SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list);
+
+ protected:
+  // The widget whose palette shows the failed colours (the inner editor of a compound).
+  void SetColourTarget(QWidget* target) { mColourTarget = target; }
+  QWidget* Widget() const { return mWidget; }
+
+ private:
+  void SwapColours(bool failed);
+  void ClearMark();
+
+  QWidget* mWidget;
+  QWidget* mColourTarget;
+  DsBinding mBinding;
+  QPalette mNormal;
+  bool mShowsFailed = false;
+  QPointer<QWidget> mMark;
+  QString mMarkTip;
+};

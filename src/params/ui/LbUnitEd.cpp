@@ -1,0 +1,3 @@
+#include "params/ui/LbUnitEd.h"
+
+LbUnitEd::LbUnitEd(QWidget* parent) : UnitLabel("lbundlg") { setParent(parent); }

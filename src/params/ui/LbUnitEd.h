@@ -1,0 +1,11 @@
+#pragma once
+
+#include "params/ui/UnitLabel.h"
+
+// The unit label of QenParLb; its units dialog is "lbundlg.UnitsDialog".
+class LbUnitEd : public UnitLabel {
+  Q_OBJECT
+
+ public:
+  explicit LbUnitEd(QWidget* parent = nullptr);
+};

@@ -1,0 +1,70 @@
+#include "params/ui/ParSpinBox.h"
+
+#include <QKeyEvent>
+#include <QLineEdit>
+
+#include "params/ui/QenParField.h"
+
+ParSpinBox::ParSpinBox(QenParField& field) : QAbstractSpinBox(&field), mField(field) {
+  setFocusPolicy(Qt::StrongFocus);
+  setKeyboardTracking(false);
+  setButtonSymbols(QAbstractSpinBox::UpDownArrows);
+}
+
+void ParSpinBox::ShowText(const QString& text) {
+  mUpdating = true;
+  const bool editing = hasFocus() && lineEdit()->isModified();
+  if (!editing) lineEdit()->setText(text);
+  lineEdit()->setModified(false);
+  mUpdating = false;
+}
+
+QString ParSpinBox::Text() const { return lineEdit()->text(); }
+
+void ParSpinBox::stepBy(int steps) { mField.Step(steps); }
+
+QAbstractSpinBox::StepEnabled ParSpinBox::stepEnabled() const {
+  if (!mField.CanStep()) return StepNone;
+  return StepUpEnabled | StepDownEnabled;
+}
+
+// Tab moves the focus before a key handler sees it: the guard goes on here, and the focus
+// loss that follows commits and clears it.
+bool ParSpinBox::event(QEvent* event) {
+  if (event->type() == QEvent::KeyPress) {
+    const int key = static_cast<QKeyEvent*>(event)->key();
+    if (key == Qt::Key_Tab || key == Qt::Key_Backtab) mField.GuardUntilFocusLoss();
+  }
+  return QAbstractSpinBox::event(event);
+}
+
+void ParSpinBox::keyPressEvent(QKeyEvent* event) {
+  switch (event->key()) {
+    case Qt::Key_Return:
+    case Qt::Key_Enter:
+      lineEdit()->setModified(false);
+      mField.CommitOnKey();
+      lineEdit()->selectAll();
+      return;
+    case Qt::Key_PageUp:
+    case Qt::Key_PageDown:
+      return;
+    case Qt::Key_Escape:
+      lineEdit()->setModified(false);
+      ShowText(QString::fromStdString(mField.State().DisplayText()));
+      return;
+    default:
+      QAbstractSpinBox::keyPressEvent(event);
+  }
+}
+
+void ParSpinBox::focusOutEvent(QFocusEvent* event) {
+  lineEdit()->setModified(false);
+  mField.CommitOnFocusLoss();
+  QAbstractSpinBox::focusOutEvent(event);
+}
+
+void ParSpinBox::wheelEvent(QWheelEvent* event) {
+  if (hasFocus()) return QAbstractSpinBox::wheelEvent(event);
+  event->ignore();
+}

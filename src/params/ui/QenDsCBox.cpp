@@ -1,0 +1,66 @@
+#include "params/ui/QenDsCBox.h"
+
+#include <QWheelEvent>
+
+#include "params/ValueText.h"
+
+QenDsCBox::QenDsCBox(QWidget* parent) : QComboBox(parent), BoundControl(this, "QenDsCBox") {
+  setFocusPolicy(Qt::StrongFocus);
+  setPlaceholderText(QString::fromLatin1(kNoValueText));
+  connect(this, &QComboBox::activated, this, &QenDsCBox::HitItem);
+}
+
+void QenDsCBox::NfyInit() {
+  if (!IsInitialised()) ReInitList();
+  BoundControl::NfyInit();
+}
+
+void QenDsCBox::ReInitList() {
+  mItems.clear();
+  for (int i = 0; i < count(); ++i) {
+    mItems.push_back(CBoxItem::FromLabel(itemText(i).toStdString()));
+    setItemText(i, QString::fromStdString(mItems.back().shown));
+  }
+}
+
+void QenDsCBox::SetIsDisabled(bool disabled) {
+  mDisabled = disabled;
+  setDisabled(disabled);
+}
+
+void QenDsCBox::SetIsSetupConfigFunction(bool on) {
+  mSetupFunction = on;
+  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
+}
+
+void QenDsCBox::SetIsSetupConfigParameter(bool on) {
+  mSetupParameter = on;
+  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
+}
+
+int QenDsCBox::Refresh(ConditionList& list) {
+  Dstring reply;
+  const int status = Binding().Query(mSetupFunction, reply, list);
+  if (status == 0 && Binding().GetDs() != nullptr) {
+    if (ValueText::IsNoValue(reply)) {
+      setCurrentIndex(-1);
+    } else {
+      setCurrentIndex(-1);
+      setCurrentIndex(CBoxItem::Choose(mItems, reply));
+    }
+  }
+  ShowSourceState();
+  return status;
+}
+
+void QenDsCBox::HitItem(int index) {
+  if (index < 0 || static_cast<std::size_t>(index) >= mItems.size()) return;
+  ConditionList list;
+  if (Binding().Write(mSetupFunction, mItems[static_cast<std::size_t>(index)].ValueText(), list) != 0) Refresh(list);
+  Report(list);
+}
+
+void QenDsCBox::wheelEvent(QWheelEvent* event) {
+  if (hasFocus()) return QComboBox::wheelEvent(event);
+  event->ignore();
+}

@@ -1,0 +1,49 @@
+#pragma once
+
+#include <QComboBox>
+#include <vector>
+
+#include "params/CBoxItem.h"
+#include "params/ui/BoundControl.h"
+
+// A combo box bound to a parameter. Its items are value-coded in the resource ("#1e-9=1 ns",
+// "$SEQ=Sequence"); the item that the instrument's value selects is shown, and a choice
+// writes its value. The wheel changes it only while it has the focus.
+class QenDsCBox : public QComboBox, public BoundControl {
+  Q_OBJECT
+  Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)
+  Q_PROPERTY(QString DsCmdName READ DsCmdNameProperty WRITE SetDsCmdNameProperty)
+  Q_PROPERTY(QColor BgColorFailed MEMBER mBgColorFailed)
+  Q_PROPERTY(QColor FgColorFailed MEMBER mFgColorFailed)
+  Q_PROPERTY(bool IsDisabled READ IsDisabled WRITE SetIsDisabled)
+  Q_PROPERTY(bool IsSetupConfigFunction READ IsSetupConfigFunction WRITE SetIsSetupConfigFunction)
+  Q_PROPERTY(bool IsSetupConfigParameter READ IsSetupConfigParameter WRITE SetIsSetupConfigParameter)
+
+ public:
+  static constexpr const char* kNoValueText = "<No Value>";
+
+  explicit QenDsCBox(QWidget* parent = nullptr);
+
+  void NfyInit() override;
+  // Reads the item records from the labels again (after items were added or changed).
+  void ReInitList();
+  int Refresh(ConditionList& list) override;
+  const CBoxItem& ItemRecord(int index) const { return mItems[static_cast<std::size_t>(index)]; }
+  bool IsDisabled() const { return mDisabled; }
+  void SetIsDisabled(bool disabled);
+  bool IsSetupConfigFunction() const { return mSetupFunction; }
+  bool IsSetupConfigParameter() const { return mSetupParameter; }
+  void SetIsSetupConfigFunction(bool on);
+  void SetIsSetupConfigParameter(bool on);
+
+ protected:
+  void wheelEvent(QWheelEvent* event) override;
+
+ private:
+  void HitItem(int index);
+
+  std::vector<CBoxItem> mItems;
+  bool mDisabled = false;
+  bool mSetupFunction = false;
+  bool mSetupParameter = false;
+};

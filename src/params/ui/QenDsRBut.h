@@ -1,0 +1,40 @@
+#pragma once
+
+#include <QRadioButton>
+
+#include "params/ui/BoundControl.h"
+
+// A radio button bound to a parameter: selected while the instrument holds its OnValue; a
+// click that selects it writes that value.
+class QenDsRBut : public QRadioButton, public BoundControl {
+  Q_OBJECT
+  Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)
+  Q_PROPERTY(QString DsCmdName READ DsCmdNameProperty WRITE SetDsCmdNameProperty)
+  Q_PROPERTY(QString OnValue MEMBER mOnValue)
+  Q_PROPERTY(QColor BgColorFailed MEMBER mBgColorFailed)
+  Q_PROPERTY(QColor FgColorFailed MEMBER mFgColorFailed)
+  Q_PROPERTY(bool IsDisabled READ IsDisabled WRITE SetIsDisabled)
+  Q_PROPERTY(bool IsSetupConfigFunction READ IsSetupConfigFunction WRITE SetIsSetupConfigFunction)
+  Q_PROPERTY(bool IsSetupConfigParameter READ IsSetupConfigParameter WRITE SetIsSetupConfigParameter)
+
+ public:
+  explicit QenDsRBut(QWidget* parent = nullptr);
+
+  int Refresh(ConditionList& list) override;
+  bool IsDisabled() const { return mDisabled; }
+  void SetIsDisabled(bool disabled);
+  bool IsSetupConfigFunction() const { return mSetupFunction; }
+  bool IsSetupConfigParameter() const { return mSetupParameter; }
+  void SetIsSetupConfigFunction(bool on);
+  void SetIsSetupConfigParameter(bool on);
+
+  QString mOnValue;
+
+ private:
+  void HitButton(bool checked);
+  void Select(bool on);
+
+  bool mDisabled = false;
+  bool mSetupFunction = false;
+  bool mSetupParameter = false;
+};

@@ -1,0 +1,46 @@
+#include "params/ui/QenDsSTEd.h"
+
+#include "params/ValueText.h"
+
+QenDsSTEd::QenDsSTEd(QWidget* parent) : QLineEdit(parent), BoundControl(this, "QenDsSTEd") {
+  connect(this, &QLineEdit::returnPressed, this, &QenDsSTEd::HitReturn);
+}
+
+void QenDsSTEd::SetIsSetupConfigParameter(bool on) {
+  mSetupParameter = on;
+  Binding().SetRegistrationFlag(on ? 1 : 0);
+}
+
+int QenDsSTEd::Refresh(ConditionList& list) {
+  Dstring reply;
+  const int status = Binding().Query(false, reply, list);
+  if (status == 0 && Binding().GetDs() != nullptr) {
+    setText(ValueText::IsNoValue(reply) ? QString() : QString::fromStdString(reply));
+    setModified(false);
+  }
+  ShowSourceState();
+  return status;
+}
+
+int QenDsSTEd::SendValue(ConditionList& list) {
+  setModified(false);
+  // A refused text stays in the field for the user to correct.
+  const int status = Binding().Write(false, text().toStdString(), list);
+  ShowSourceState();
+  return status;
+}
+
+void QenDsSTEd::HitReturn() {
+  ConditionList list;
+  SendValue(list);
+  Report(list);
+}
+
+void QenDsSTEd::focusOutEvent(QFocusEvent* event) {
+  if (isModified()) {
+    ConditionList list;
+    SendValue(list);
+    Report(list);
+  }
+  QLineEdit::focusOutEvent(event);
+}

@@ -1,0 +1,32 @@
+#pragma once
+
+#include <QLineEdit>
+
+#include "params/ui/BoundControl.h"
+
+// A one-line text field bound to a parameter. The text is written as it stands on Return,
+// and on focus loss (or when its window is left) after the user changed it.
+class QenDsSTEd : public QLineEdit, public BoundControl {
+  Q_OBJECT
+  Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)
+  Q_PROPERTY(QString DsCmdName READ DsCmdNameProperty WRITE SetDsCmdNameProperty)
+  Q_PROPERTY(QColor BgColorFailed MEMBER mBgColorFailed)
+  Q_PROPERTY(QColor FgColorFailed MEMBER mFgColorFailed)
+  Q_PROPERTY(bool IsSetupConfigParameter READ IsSetupConfigParameter WRITE SetIsSetupConfigParameter)
+
+ public:
+  explicit QenDsSTEd(QWidget* parent = nullptr);
+
+  int Refresh(ConditionList& list) override;
+  int SendValue(ConditionList& list);
+  bool IsSetupConfigParameter() const { return mSetupParameter; }
+  void SetIsSetupConfigParameter(bool on);
+
+ protected:
+  void focusOutEvent(QFocusEvent* event) override;
+
+ private:
+  void HitReturn();
+
+  bool mSetupParameter = false;
+};

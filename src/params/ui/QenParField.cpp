@@ -1,0 +1,119 @@
+#include "params/ui/QenParField.h"
+
+#include <QHBoxLayout>
+#include <QLineEdit>
+
+#include "params/ValueText.h"
+#include "params/ui/ParSpinBox.h"
+#include "params/ui/UnitLabel.h"
+#include "support/FWBlocker.h"
+
+QenParField::QenParField(QWidget* parent, std::string_view className, UnitLabel* unitLabel)
+    : QWidget(parent), BoundControl(this, className, true), mSpin(new ParSpinBox(*this)), mUnitLabel(unitLabel) {
+  auto* layout = new QHBoxLayout(this);
+  layout->setContentsMargins(0, 0, 0, 0);
+  layout->setSpacing(4);
+  layout->addWidget(mSpin, 1);
+  layout->addWidget(mUnitLabel);
+  mUnitLabel->SetParEd(this);
+  setFocusProxy(mSpin);
+  SetColourTarget(mSpin);
+}
+
+QenParField::~QenParField() { NfyEnd(); }
+
+void QenParField::NfyInit() {
+  if (IsInitialised()) return;
+  ConditionList list;
+  FWBlocker blocker("QenParField::NfyInit", list);
+  mSpin->ShowText(QString());
+  mUnitLabel->NfyInit();
+  mUnitLabel->setVisible(mShowUnits);
+  SetEnabledComplete(mIsEnabled);
+  BoundControl::NfyInit();
+}
+
+int QenParField::Refresh(ConditionList& list) {
+  const int status = mState.ReadValue(Binding(), list);
+  ShowSourceState();
+  if (status != 0) return status;
+  if (Binding().GetDs() == nullptr) return 0;
+  if (int unitStatus = mUnitLabel->Refresh(list)) {
+    DisplayValue(mState.GetValue());
+    return unitStatus;
+  }
+  double asked = 0.0;
+  double held = 0.0;
+  if (mState.TakeAdjusted(asked, held)) {
+    const QString unit = mUnitLabel->text().trimmed();
+    const int exp = mState.DisplayExp();
+    MarkAdjusted(QString::fromStdString(ValueText::FormatDisplay(held, exp)) + " " + unit,
+                 QString::fromStdString(ValueText::FormatDisplay(asked, exp)) + " " + unit);
+  }
+  return 0;
+}
+
+int QenParField::RefreshUnits(ConditionList& list) { return mUnitLabel->Refresh(list); }
+
+Dstring QenParField::FormatValue(double value) const { return ValueText::FormatDisplay(value, mState.DisplayExp()); }
+
+void QenParField::DisplayValue(double) { mSpin->ShowText(QString::fromStdString(mState.DisplayText())); }
+
+int QenParField::AdjustAndSend(int steps, ConditionList& list) {
+  return mState.AdjustAndSend(mSpin->Text().toStdString(), steps, Binding(), list);
+}
+
+void QenParField::SetEnabledComplete(bool enabled) {
+  mSpin->setEnabled(enabled);
+  mUnitLabel->setEnabled(enabled);
+}
+
+void QenParField::SetIsEnabled(bool enabled) {
+  mIsEnabled = enabled;
+  // A field whose value may not be edited keeps its prefix and step changeable.
+  mSpin->setEnabled(enabled);
+  mUnitLabel->setEnabled(true);
+}
+
+void QenParField::SetShowUnits(bool show) {
+  mShowUnits = show;
+  mUnitLabel->setVisible(show);
+}
+
+void QenParField::SetIsSetupConfigParameter(bool on) {
+  mSetupParameter = on;
+  Binding().SetRegistrationFlag(on ? 1 : 0);
+}
+
+void QenParField::Commit(int steps) {
+  ConditionList list;
+  mSending = true;
+  const int status = AdjustAndSend(steps, list);
+  mSending = false;
+  // A refused value gives way to the instrument's, unless the text was never sent.
+  if (status != 0 && Binding().GetDs() != nullptr) {
+    ConditionList ignored;
+    Refresh(ignored);
+  }
+  Report(list);
+}
+
+void QenParField::CommitOnFocusLoss() {
+  if (!DsBinding::IsDesignMode()) Commit(0);
+}
+
+void QenParField::CommitOnKey() {
+  if (!mSending) Commit(0);
+}
+
+void QenParField::GuardUntilFocusLoss() {
+  if (!mSending && !DsBinding::IsDesignMode()) mSending = true;
+}
+
+bool QenParField::CanStep() const {
+  return !mSpin->IsUpdating() && isActiveWindow() && !mState.IsNoValue() && mIsEnabled && !mSending;
+}
+
+void QenParField::Step(int steps) {
+  if (CanStep()) Commit(steps);
+}

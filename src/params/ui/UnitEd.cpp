@@ -1,0 +1,3 @@
+#include "params/ui/UnitEd.h"
+
+UnitEd::UnitEd(QWidget* parent) : UnitLabel("unitsdlg") { setParent(parent); }

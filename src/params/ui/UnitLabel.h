@@ -1,0 +1,53 @@
+#pragma once
+
+#include <QLabel>
+
+#include "params/UnitsRecord.h"
+#include "support/ConditionList.h"
+
+class QenParField;
+class QMenu;
+
+// The unit label beside a parameter field: shows prefix and unit, opens the units dialog on
+// a click (its item number, 300 by default) and a menu of prefixes and steps on the popup
+// gesture. A change is sent to the server's attribute and comes back through its change
+// notification; nothing is applied locally. UnitEd and LbUnitEd are its two names.
+class UnitLabel : public QLabel {
+  Q_OBJECT
+  Q_PROPERTY(int ItemNumber MEMBER mItemNumber)
+
+ public:
+  void SetParEd(QenParField* field) { mField = field; }
+  QenParField* GetParEd() const { return mField; }
+
+  // Shows the bare unit until the first refresh.
+  void NfyInit();
+  // Reads the attribute into the field, sets the label and redisplays the value.
+  int Refresh(ConditionList& list);
+  // Writes the attribute; -19 is dropped without a word.
+  int SendUnits(const UnitsRecord& units, ConditionList& list);
+  // The label's item: 300 opens the units dialog.
+  void NfyItemHit(int item);
+  // Applies a menu choice (ids of UnitMenu) and sends the record when it changed.
+  void NfyPopupMenuItemSelect(int id);
+  // The menu as it shows now: prefix items visible and checked by the field's record.
+  QMenu* BuildPopupMenu(QWidget* parent);
+  bool IsHighlighted() const { return mHighlighted; }
+
+ protected:
+  explicit UnitLabel(const char* dialogLibrary);
+  void mousePressEvent(QMouseEvent* event) override;
+  void mouseMoveEvent(QMouseEvent* event) override;
+  void mouseReleaseEvent(QMouseEvent* event) override;
+  void contextMenuEvent(QContextMenuEvent* event) override;
+
+ private:
+  void SetHighlighted(bool on);
+  const UnitsRecord& Units() const;
+
+  const char* mDialogLibrary;
+  QenParField* mField = nullptr;
+  int mItemNumber = 300;
+  bool mTracking = false;
+  bool mHighlighted = false;
+};

@@ -1,0 +1,77 @@
+#include "params/ui/UnitsDialog.h"
+
+#include <QLabel>
+#include <QPushButton>
+#include <QRadioButton>
+
+#include "params/UnitsDialogTable.h"
+#include "toolkit/Toolkit.h"
+#include "toolkit/qt/ResourceLibrary.h"
+
+namespace {
+
+template <class T>
+T* Child(const QWidget* dialog, const char* name) {
+  return dialog->findChild<T*>(QString::fromLatin1(name));
+}
+
+}  // namespace
+
+UnitsDialog::UnitsDialog(const char* library, QWidget* parent) : QDialog(parent) {
+  mLoaded = ResourceLibrary::LoadInto(Dstring(library) + ".UnitsDialog", this, mLoadErrors) == 0;
+  if (!mLoaded) return;
+  if (auto* ok = Child<QPushButton>(this, "PButOK")) {
+    ok->setDefault(true);
+    connect(ok, &QPushButton::clicked, this, &QDialog::accept);
+  }
+  if (auto* cancel = Child<QPushButton>(this, "PButCancel")) connect(cancel, &QPushButton::clicked, this, &QDialog::reject);
+  if (auto* help = Child<QPushButton>(this, "PButHelp")) connect(help, &QPushButton::clicked, this, &UnitsDialog::HitPButHelp);
+}
+
+unsigned UnitsDialog::LoadProcess(UnitsRecord* units, ConditionList& list) {
+  if (!mLoaded) {
+    list.Append(mLoadErrors);
+    return 1;
+  }
+  NfyInit(*units);
+  if (exec() != QDialog::Accepted) return 1;
+  TakeChoice(*units);
+  return 0;
+}
+
+void UnitsDialog::NfyInit(const UnitsRecord& units) {
+  if (auto* label = Child<QLabel>(this, "TAreaUnitsLabel")) {
+    label->setText(QStringLiteral("Unit of %1").arg(QString::fromStdString(units.unitName)));
+  }
+  for (const auto& button : UnitsDialogTable::PrefixButtons()) {
+    auto* radio = Child<QRadioButton>(this, button.name);
+    if (radio == nullptr) continue;
+    const bool allowed = button.exp >= units.minExp && button.exp <= units.maxExp;
+    radio->setVisible(allowed);
+    if (!allowed) continue;
+    radio->setText(QString::fromStdString(Dstring(button.prefix) + units.unitName));
+    if (button.exp == units.curExp) radio->setChecked(true);
+  }
+  const auto& steps = UnitsDialogTable::StepButtons();
+  if (auto* radio = Child<QRadioButton>(this, steps[static_cast<std::size_t>(UnitsDialogTable::StepButtonIndex(units.step))].name)) {
+    radio->setChecked(true);
+  }
+}
+
+void UnitsDialog::TakeChoice(UnitsRecord& units) const {
+  for (const auto& button : UnitsDialogTable::PrefixButtons()) {
+    auto* radio = Child<QRadioButton>(this, button.name);
+    if (radio != nullptr && radio->isVisibleTo(this) && radio->isChecked()) units.curExp = button.exp;
+  }
+  for (const auto& button : UnitsDialogTable::StepButtons()) {
+    auto* radio = Child<QRadioButton>(this, button.name);
+    if (radio != nullptr && radio->isChecked()) units.step = button.step;
+  }
+}
+
+void UnitsDialog::HitPButHelp() {
+  Toolkit::Get().Alert(
+      "The prefix scales the value shown in the field (the instrument always works in the base unit). "
+      "The step is what the arrows, the Up and Down keys and the wheel add or take away, in the unit shown.",
+      ToolkitPort::Icon::Information);
+}
