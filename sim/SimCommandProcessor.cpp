@@ -318,7 +318,8 @@ void SimCommandProcessor::RunAttr(std::size_t index, const SimCommand& cmd) {
   if (cmd.IsQuery()) return Reply(param.GetAttr().Format());
   if (!cmd.HasArgs()) return Error(-109);
   if (int rc = mParams.WriteAttr(index, cmd.GetArgs()); rc != 0) return Error(rc);
-  MarkDirty(param.GetHeader() + ":ATTR", mHandle);
+  // The writer too: a client applies a new attribute only when the change set reports it.
+  MarkDirty(param.GetHeader() + ":ATTR", "");
 }
 
 bool SimCommandProcessor::UseHandle(const Dstring& name) {

@@ -86,6 +86,13 @@ bool SetMax(const Dstring& value, SimParam& param, Dstring&) {
   return true;
 }
 
+bool SetResolution(const Dstring& value, SimParam& param, Dstring&) {
+  double v = 0.0;
+  if (!value.ToDouble(v) || v <= 0.0) return false;
+  param.SetResolution(v);
+  return true;
+}
+
 bool SetUnit(const Dstring& value, SimParam&, Dstring& unit) {
   unit = value;
   return !value.empty();
@@ -107,6 +114,7 @@ constexpr ParamOption kParamOptions[] = {
     {"relock", false, SetRelock},
     {"min", true, SetMin},
     {"max", true, SetMax},
+    {"res", true, SetResolution},
     {"unit", true, SetUnit},
     {"values", true, SetValues},
 };

@@ -144,3 +144,7 @@ Dstring SimParam::FormatNumber(double v) const {
   }
   return buf;
 }
+
+double SimParam::Resolve(double number) const {
+  return mResolution > 0.0 ? std::round(number / mResolution) * mResolution : number;
+}

@@ -41,6 +41,9 @@ class SimParam {
   void SetRange(double lmax, double hmax);
   double GetLmax() const { return mLmax; }
   double GetHmax() const { return mHmax; }
+  // The step the instrument sets a numeric value in (0: any value); a write is rounded to it.
+  void SetResolution(double resolution) { mResolution = resolution; }
+  double Resolve(double number) const;
   double GetLlim() const { return mLlim; }
   double GetHlim() const { return mHlim; }
   void SetLimits(double llim, double hlim) {
@@ -70,6 +73,7 @@ class SimParam {
   Dstring mText;
   double mLmax;
   double mHmax;
+  double mResolution = 0.0;
   double mLlim;
   double mHlim;
   DstringList mWords;

@@ -72,6 +72,7 @@ int SimParamTable::Write(std::size_t index, std::string_view text) {
   double number = 0.0;
   Dstring word;
   if (int rc = param.ParseValue(text, number, word); rc != 0) return rc;
+  if (param.IsNumeric()) number = param.Resolve(number);
   if (param.IsNumeric() && !param.IsWithinLimits(number)) return kOutOfRange;
   Store(index, number, word);
   Propagate(index);

@@ -1,0 +1,323 @@
+#include <gtest/gtest.h>
+
+#include <QAbstractSpinBox>
+#include <QApplication>
+#include <QComboBox>
+#include <QDir>
+#include <QPluginLoader>
+#include <QPushButton>
+#include <QRadioButton>
+#include <QTest>
+#include <QTimer>
+#include <QtUiPlugin/QDesignerCustomWidgetCollectionInterface>
+#include <memory>
+
+#include "common/SimProcess.h"
+#include "core/uiapp.h"
+#include "instrument/QenGuiInst.h"
+#include "instrument/QenTcpInstrument.h"
+#include "params/ui/BoundControlClasses.h"
+#include "params/ui/ParSpinBox.h"
+#include "params/ui/QenDsCBox.h"
+#include "params/ui/QenDsCBut.h"
+#include "params/ui/QenDsRBut.h"
+#include "params/ui/QenDsSTEd.h"
+#include "params/ui/QenDsSlidr.h"
+#include "params/ui/QenParEd.h"
+#include "params/ui/QenParLb.h"
+#include "params/ui/UnitLabel.h"
+#include "params/ui/UnitsDialog.h"
+#include "toolkit/Toolkit.h"
+#include "toolkit/qt/QtToolkit.h"
+#include "toolkit/qt/ResourceLibrary.h"
+#include "toolkit/qt/WidgetClassTable.h"
+
+namespace {
+
+const char* const kAmpl = ":CGR1:MOD1:CONN1:VOLT:AMPL";
+
+// The test form of every control kind, bound to a private qensim through the whole library as
+// the GUI starts it; a second client on its own connection plays another user.
+class BoundControlsTest : public testing::Test {
+ protected:
+  static void SetUpTestSuite() {
+    static int argc = 1;
+    static char name[] = "test_params_ui";
+    static char* argv[] = {name, nullptr};
+    qputenv("QT_QPA_PLATFORM", "offscreen");
+    if (QApplication::instance() == nullptr) new QApplication(argc, argv);
+    sSim = new SimProcess({"--test-control"});
+  }
+  static void TearDownTestSuite() {
+    delete sSim;
+    sSim = nullptr;
+  }
+
+  void SetUp() override {
+    ASSERT_NE(sSim->Port(), 0);
+    Toolkit::Install(&mToolkit);
+    mToolkit.SetAlertSink([this](const Dstring& text, ToolkitPort::Icon) { mAlerts.push_back(text); });
+    BoundControlClasses::AddFactories();
+    ASSERT_EQ(uiapp::LoadDatLib(mList), 0) << mList.ToText();
+    ASSERT_EQ(uiapp::RegisterClasses(mList), 0) << mList.ToText();
+    ASSERT_EQ(uiapp::Init(mList), 0);
+    mHandle = Connect(QenGuiInst::SetInstrument, "_G");
+    mOther = std::make_unique<QenTcpInstrument>();
+    ASSERT_EQ(mOther->Connect("127.0.0.1", sSim->Port()), 0);
+    ASSERT_EQ(mOther->Call(":QEN:INST:HAND:CRE? _O,\"PSX\",\"O\"", mOtherHandle), 0);
+    // One qensim serves the suite: every test starts from the same settings.
+    for (const char* reset : {":CGR1:MOD1:CONN1:VOLT:AMPL 1", ":TRIG:MODE SEQ", ":CGR1:MOD1:CONN1:OUTP OFF",
+                              ":CGR1:MOD1:CONN1:VOLT:OFFS 0.5", ":CGR1:MOD1:CONN1:PULS:DEL 0", ":CGR1:FREQ 1E9",
+                              ":CGR1:MOD1:CONN1:VOLT:AMPL:ATTR (\"V\",-3,0,0,0.1d)",
+                              ":CGR1:MOD1:CONN1:PULS:DEL:ATTR (\"s\",-12,0,-9,0.1d)"}) {
+      Other(reset);
+    }
+    mForm.reset(ResourceLibrary::Load("qtest.BoundControls", nullptr, mList));
+    ASSERT_NE(mForm, nullptr) << mList.ToText();
+    ASSERT_EQ(BoundControl::SetDsBaseNameAll(mForm.get(), ":" + mHandle, mList), 0) << mList.ToText();
+    mForm->show();
+    QApplication::setActiveWindow(mForm.get());
+  }
+  void TearDown() override {
+    mForm.reset();
+    Dstring ignored;
+    mOther->Call(":TEST:LOCK OFF", ignored);
+    mOther.reset();
+    uiapp::EndPolling();
+    uiapp::End(mList);
+    Toolkit::Install(nullptr);
+    WidgetClassTable::UnregisterAll();
+  }
+
+  Dstring Connect(void (*set)(std::unique_ptr<QenInstrument>), const char* proposed) {
+    auto inst = std::make_unique<QenTcpInstrument>();
+    EXPECT_EQ(inst->Connect("127.0.0.1", sSim->Port()), 0);
+    Dstring handle;
+    EXPECT_EQ(inst->Call(Dstring::Format(":QEN:INST:HAND:CRE? %s,\"PSX\",\"G\"", proposed), handle), 0);
+    set(std::move(inst));
+    QenGuiInst::SetAppHandle(handle);
+    return handle;
+  }
+  // A command of the second client under its own handle; its reply.
+  Dstring Other(const Dstring& rest) {
+    Dstring reply;
+    EXPECT_EQ(mOther->Call(":" + mOtherHandle + rest, reply), 0) << rest;
+    return reply;
+  }
+  double OtherNumber(const Dstring& header) { return std::stod(Other(header + "?")); }
+  // One tick of the poll as the alarm and then the main loop run it.
+  void Poll() {
+    uiapp::AsyncAlarmProc(nullptr);
+    if (uiapp::IsSyncAlarmPending()) uiapp::SyncTimeOut();
+    QCoreApplication::processEvents();
+  }
+  template <class T>
+  T* Find(const char* name) {
+    T* widget = mForm->findChild<T*>(QString::fromLatin1(name));
+    EXPECT_NE(widget, nullptr) << name;
+    return widget;
+  }
+  // Types `text` over the field's text and presses `key`.
+  void Type(QenParField* field, const QString& text, Qt::Key key = Qt::Key_Return) {
+    field->Editor()->setFocus();
+    QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+    QTest::keyClicks(field->Editor(), text);
+    QTest::keyClick(field->Editor(), key);
+    QCoreApplication::processEvents();
+  }
+
+  static inline SimProcess* sSim = nullptr;
+  QtToolkit mToolkit;
+  std::vector<Dstring> mAlerts;
+  ConditionList mList;
+  Dstring mHandle;
+  Dstring mOtherHandle;
+  std::unique_ptr<QenTcpInstrument> mOther;
+  std::unique_ptr<QWidget> mForm;
+};
+
+}  // namespace
+
+TEST_F(BoundControlsTest, EveryControlShowsTheInstrumentAfterBinding) {
+  EXPECT_EQ(Find<QenParEd>("fieldAmpl")->Editor()->Text(), "1");
+  EXPECT_EQ(Find<QenParEd>("fieldAmpl")->GetUnitLabel()->text(), " V");
+  EXPECT_EQ(Find<QenParLb>("fieldFreq")->Editor()->Text(), "1000");
+  EXPECT_EQ(Find<QenParLb>("fieldFreq")->GetUnitLabel()->text(), "MHz");
+  EXPECT_EQ(Find<QenParEd>("fieldDelay")->GetUnitLabel()->text(), "ns");
+  EXPECT_EQ(Find<QenDsCBox>("boxTrigger")->currentText(), "Sequence");
+  EXPECT_TRUE(Find<QenDsRBut>("radioSeq")->isChecked());
+  EXPECT_FALSE(Find<QenDsCBut>("checkOutput")->isChecked());
+  EXPECT_EQ(Find<QenDsSlidr>("sliderOffset")->value(), 500);
+  EXPECT_EQ(Find<QenDsSTEd>("textType")->text(), "\"K2268A\"");
+  EXPECT_TRUE(Find<QenParEd>("fieldAmpl")->toolTip().endsWith(kAmpl));
+}
+
+TEST_F(BoundControlsTest, ASecondClientsChangesAppearWithinOnePoll) {
+  Other(Dstring(kAmpl) + " 2.5");
+  Other(":TRIG:MODE CLOC");
+  Other(":CGR1:MOD1:CONN1:OUTP ON");
+  Other(":CGR1:MOD1:CONN1:VOLT:OFFS 1.25");
+  Other(":CGR1:FREQ 2.5E9");
+  Poll();
+  EXPECT_EQ(Find<QenParEd>("fieldAmpl")->Editor()->Text(), "2.5");
+  EXPECT_EQ(Find<QenParLb>("fieldFreq")->Editor()->Text(), "2500");
+  EXPECT_EQ(Find<QenDsCBox>("boxTrigger")->currentText(), "Clock");
+  EXPECT_TRUE(Find<QenDsRBut>("radioClock")->isChecked());
+  EXPECT_FALSE(Find<QenDsRBut>("radioSeq")->isChecked());
+  EXPECT_TRUE(Find<QenDsCBut>("checkOutput")->isChecked());
+  EXPECT_EQ(Find<QenDsSlidr>("sliderOffset")->value(), 1250);
+}
+
+TEST_F(BoundControlsTest, TypedAndSteppedValuesReachTheServer) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  Type(field, "1.5");
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.5);
+  QTest::keyClick(field->Editor(), Qt::Key_Up);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.6);
+  QTest::keyClick(field->Editor(), Qt::Key_Down);
+  QTest::keyClick(field->Editor(), Qt::Key_Down);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.4);
+  EXPECT_EQ(field->Editor()->Text(), "1.4");
+  // A page key is swallowed; a unit typed after the number is ignored.
+  QTest::keyClick(field->Editor(), Qt::Key_PageUp);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.4);
+  Type(field, "2 V");
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 2.0);
+  EXPECT_TRUE(mAlerts.empty());
+}
+
+TEST_F(BoundControlsTest, FocusLossCommitsAndAnEmptyFieldKeepsTheValue) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  Type(field, "3", Qt::Key_Tab);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 3.0);
+  Type(field, "", Qt::Key_Tab);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 3.0);
+}
+
+TEST_F(BoundControlsTest, AValueTheInstrumentRoundedIsMarked) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  Type(field, "1.2345");
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.235);
+  EXPECT_EQ(field->Editor()->Text(), "1.235");
+  EXPECT_TRUE(field->IsMarkedAdjusted());
+  EXPECT_EQ(field->toolTip(), "set to 1.235 V (asked 1.2345 V)");
+}
+
+TEST_F(BoundControlsTest, ARefusedValueIsReportedAndTheServersValueShown) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  Type(field, "9");
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find("-222"), Dstring::npos) << mAlerts[0];
+  EXPECT_EQ(field->Editor()->Text(), "1");
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.0);
+}
+
+TEST_F(BoundControlsTest, ALockDuringACommitIsSilentAndLosesNothingOnTheServer) {
+  Dstring ignored;
+  ASSERT_EQ(mOther->Call(":TEST:LOCK ON", ignored), 0);
+  Type(Find<QenParEd>("fieldAmpl"), "4");
+  Find<QenParEd>("fieldDelay")->GetUnitLabel()->NfyPopupMenuItemSelect(88);
+  QCoreApplication::processEvents();
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+  ASSERT_EQ(mOther->Call(":TEST:LOCK OFF", ignored), 0);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.0);
+}
+
+TEST_F(BoundControlsTest, PrefixFromTheMenuGoesToTheServerAndComesBack) {
+  auto* delay = Find<QenParEd>("fieldDelay");
+  Other(":CGR1:MOD1:CONN1:PULS:DEL 2.5E-10");
+  Poll();
+  EXPECT_EQ(delay->Editor()->Text(), "0.25");
+  delay->GetUnitLabel()->NfyPopupMenuItemSelect(88);
+  EXPECT_EQ(Other(":CGR1:MOD1:CONN1:PULS:DEL:ATTR?"), "(\"s\",-12,0,-12,0.100000d)");
+  Poll();
+  EXPECT_EQ(delay->GetUnitLabel()->text(), "ps");
+  EXPECT_EQ(delay->Editor()->Text(), "250");
+}
+
+TEST_F(BoundControlsTest, UnitsDialogSetsPrefixAndStep) {
+  auto* ampl = Find<QenParEd>("fieldAmpl");
+  QTimer::singleShot(0, [] {
+    auto* dialog = qobject_cast<UnitsDialog*>(QApplication::activeModalWidget());
+    ASSERT_NE(dialog, nullptr);
+    EXPECT_FALSE(dialog->findChild<QRadioButton*>("RButUnitKilo")->isVisibleTo(dialog));
+    EXPECT_EQ(dialog->findChild<QRadioButton*>("RButUnitMilli")->text(), "mV");
+    EXPECT_TRUE(dialog->findChild<QRadioButton*>("RButStep_1")->isChecked());
+    dialog->findChild<QRadioButton*>("RButUnitMilli")->click();
+    dialog->findChild<QRadioButton*>("RButStep10")->click();
+    dialog->findChild<QPushButton*>("PButOK")->click();
+  });
+  QTest::mouseClick(ampl->GetUnitLabel(), Qt::LeftButton);
+  EXPECT_EQ(Other(Dstring(kAmpl) + ":ATTR?"), "(\"V\",-3,0,-3,10.000000d)");
+  Poll();
+  QApplication::setActiveWindow(mForm.get());
+  ampl->Editor()->setFocus();
+  EXPECT_EQ(ampl->GetUnitLabel()->text(), "mV");
+  EXPECT_EQ(ampl->Editor()->Text(), "1000");
+  QTest::keyClick(ampl->Editor(), Qt::Key_Down);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 0.99);
+}
+
+TEST_F(BoundControlsTest, ChoicesOfButtonsBoxAndSliderAreWritten) {
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  QTest::keyClick(Find<QenDsCBox>("boxTrigger"), Qt::Key_Down);
+  EXPECT_EQ(Other(":TRIG:MODE?"), "CLOC");
+  QTest::mouseClick(Find<QenDsRBut>("radioSeq"), Qt::LeftButton);
+  EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ");
+  Find<QenDsCBut>("checkOutput")->click();
+  EXPECT_EQ(Other(":CGR1:MOD1:CONN1:OUTP?"), "ON");
+  auto* slider = Find<QenDsSlidr>("sliderOffset");
+  slider->setFocus();
+  QTest::keyClick(slider, Qt::Key_Right);
+  EXPECT_DOUBLE_EQ(OtherNumber(":CGR1:MOD1:CONN1:VOLT:OFFS"), 0.501);
+  EXPECT_TRUE(mAlerts.empty());
+}
+
+TEST_F(BoundControlsTest, TheWheelLeavesAnUnfocusedControlAlone) {
+  auto* slider = Find<QenDsSlidr>("sliderOffset");
+  Find<QenParEd>("fieldAmpl")->Editor()->setFocus();
+  QWheelEvent wheel(QPointF(5, 5), slider->mapToGlobal(QPointF(5, 5)), QPoint(), QPoint(0, 120), Qt::NoButton,
+                    Qt::NoModifier, Qt::NoScrollPhase, false);
+  QApplication::sendEvent(slider, &wheel);
+  QApplication::sendEvent(Find<QenDsCBox>("boxTrigger"), &wheel);
+  EXPECT_DOUBLE_EQ(OtherNumber(":CGR1:MOD1:CONN1:VOLT:OFFS"), 0.5);
+  EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ");
+}
+
+TEST_F(BoundControlsTest, MissingAndBrokenResourcesAreNamed) {
+  ConditionList list;
+  EXPECT_EQ(ResourceLibrary::Load("nosuch.Window", nullptr, list), nullptr);
+  ASSERT_EQ(list.Size(), 1u);
+  EXPECT_NE(list[0].GetMessage().find("nosuch.Window"), Dstring::npos);
+  EXPECT_NE(ResourceLibrary::Check("nosuchlibrary", list), 0);
+  EXPECT_NE(WidgetClassTable::Register("NoSuchClass", list), 0);
+  EXPECT_EQ(list.Size(), 3u);
+}
+
+TEST_F(BoundControlsTest, Screenshot) {
+  const QByteArray dir = qgetenv("QEN_SCREENSHOT_DIR");
+  Type(Find<QenParEd>("fieldAmpl"), "1.2345");
+  mForm->resize(460, 300);
+  const QPixmap picture = mForm->grab();
+  EXPECT_FALSE(picture.isNull());
+  if (!dir.isEmpty()) {
+    EXPECT_TRUE(picture.save(QDir(QString::fromLocal8Bit(dir)).filePath("bound-controls.png")));
+  }
+}
+
+#ifdef QEN_DESIGNER_PLUGIN
+TEST(DesignerPluginTest, LoadsAndListsTheControls) {
+  QPluginLoader loader(QStringLiteral(QEN_DESIGNER_PLUGIN));
+  auto* collection = qobject_cast<QDesignerCustomWidgetCollectionInterface*>(loader.instance());
+  ASSERT_NE(collection, nullptr) << loader.errorString().toStdString();
+  QStringList names;
+  for (auto* widget : collection->customWidgets()) names << widget->name();
+  EXPECT_EQ(names.join(','), "QenDsCBut,QenDsRBut,QenDsCBox,QenDsSlidr,QenDsSTEd,QenParEd,QenParLb,UnitEd,LbUnitEd");
+  QWidget* field = collection->customWidgets()[5]->createWidget(nullptr);
+  EXPECT_TRUE(field->setProperty("DsCmdName", QStringLiteral(":CGR1:FREQ")));
+  EXPECT_EQ(field->property("DsCmdName").toString(), ":CGR1:FREQ");
+  EXPECT_TRUE(field->property("ShowUnits").toBool());
+  delete field;
+}
+#endif
