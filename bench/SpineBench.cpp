@@ -5,8 +5,6 @@
 
 #include <chrono>
 #include <cstdio>
-#include <filesystem>
-#include <fstream>
 #include <memory>
 #include <vector>
 
@@ -15,76 +13,17 @@
 #include "data/QenDs.h"
 #include "data/QenDsView.h"
 #include "data/QenParamDs.h"
-#include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
-#include "instrument/QenSimProcess.h"
-#include "instrument/QenTcpInstrument.h"
+#include "ManyParamsRig.h"
 
 namespace {
 
-constexpr int kManyParams = 1000;
-
-// Counts the round trips that pass through it.
-class CountingInstrument : public QenInstrument {
- public:
-  explicit CountingInstrument(std::unique_ptr<QenInstrument> inner) : mInner(std::move(inner)) {}
-  int Connect(const Dstring& host, unsigned short port) override { return mInner->Connect(host, port); }
-  int Disconnect() override { return mInner->Disconnect(); }
-  bool IsConnected() const override { return mInner->IsConnected(); }
-  int Call(const Dstring& cmd, Dstring& reply) override {
-    ++mCalls;
-    return mInner->Call(cmd, reply);
-  }
-  long mCalls = 0;
-
- private:
-  std::unique_ptr<QenInstrument> mInner;
-};
-
-// qensim with a configuration of many parameters, and the application started against it.
-class Rig {
- public:
-  Rig() {
-    const auto config = std::filesystem::temp_directory_path() / "qen-bench-many.qsc";
-    std::ofstream out(config);
-    for (int i = 0; i < kManyParams; ++i) out << "param :BENCH:P" << i << " double " << i << " min=-1E9 max=1E9\n";
-    out.close();
-    mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--config", config.string()});
-    ConditionList list;
-    uiapp::Init(list);
-    auto tcp = std::make_unique<QenTcpInstrument>();
-    tcp->Connect("127.0.0.1", mSim.Port());
-    auto counting = std::make_unique<CountingInstrument>(std::move(tcp));
-    mCounter = counting.get();
-    QenGuiInst::SetInstrument(std::move(counting));
-    Dstring handle = "_BENCH";
-    AppHandle::Create(QenGuiInst::GetInstrument(), handle, "BENCH", list);
-    QenGuiInst::SetAppHandle(handle);
-  }
-  bool Ok() const { return mSim.Port() != 0 && !QenGuiInst::GetAppHandle().empty(); }
-  long Calls() const { return mCounter->mCalls; }
-
- private:
-  QenSimProcess mSim;
-  CountingInstrument* mCounter = nullptr;
-};
-
-Rig& TheRig() {
-  static Rig rig;
-  return rig;
-}
-
-double Seconds(std::chrono::steady_clock::time_point since) {
-  return std::chrono::duration<double>(std::chrono::steady_clock::now() - since).count();
-}
-
-Dstring Header(int i) { return Dstring::Format(":%s:BENCH:P%d", QenGuiInst::GetAppHandle().c_str(), i); }
 
 void BM_RefreshManySourcesVsOneQueryEach(benchmark::State& state) {
-  Rig& rig = TheRig();
+  ManyParamsRig& rig = ManyParamsRig::Get();
   if (!rig.Ok()) return state.SkipWithError("qensim did not start");
   std::vector<QenParamDs*> sources;
-  for (int i = 0; i < kManyParams; ++i) sources.push_back(Dte::AllocDsByName(Header(i), 0));
+  for (int i = 0; i < ManyParamsRig::kManyParams; ++i) sources.push_back(Dte::AllocDsByName(Header(i), 0));
   double joined = 0, single = 0;
   long joinedCalls = 0, singleCalls = 0;
   for (auto _ : state) {
@@ -105,7 +44,7 @@ void BM_RefreshManySourcesVsOneQueryEach(benchmark::State& state) {
   }
   for (auto* s : sources) Dte::FreeDs(s);
   const double n = static_cast<double>(state.iterations());
-  state.counters["sources"] = kManyParams;
+  state.counters["sources"] = ManyParamsRig::kManyParams;
   state.counters["joined_ms"] = 1e3 * joined / n;
   state.counters["one_each_ms"] = 1e3 * single / n;
   state.counters["joined_round_trips"] = static_cast<double>(joinedCalls) / n;
@@ -114,7 +53,7 @@ void BM_RefreshManySourcesVsOneQueryEach(benchmark::State& state) {
 }
 
 void BM_IdlePollTickVsOneRawCall(benchmark::State& state) {
-  Rig& rig = TheRig();
+  ManyParamsRig& rig = ManyParamsRig::Get();
   if (!rig.Ok()) return state.SkipWithError("qensim did not start");
   const Dstring dfl = QenGuiInst::GetAppHandle() + ":DFL?";
   double tick = 0, raw = 0;

@@ -1,0 +1,41 @@
+#include "ManyParamsRig.h"
+
+#include <filesystem>
+#include <fstream>
+
+#include "core/uiapp.h"
+#include "instrument/AppHandle.h"
+#include "instrument/QenGuiInst.h"
+#include "instrument/QenTcpInstrument.h"
+
+ManyParamsRig& ManyParamsRig::Get() {
+  static ManyParamsRig rig;
+  return rig;
+}
+
+ManyParamsRig::ManyParamsRig() {
+  const auto config = std::filesystem::temp_directory_path() / "qen-bench-many.qsc";
+  std::ofstream out(config);
+  out << "unit V -3 0 0 0.1\n";
+  for (int i = 0; i < kManyParams; ++i) out << "param :BENCH:P" << i << " double " << i << " unit=V min=-1E9 max=1E9\n";
+  out.close();
+  mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--config", config.string()});
+  ConditionList list;
+  uiapp::Init(list);
+  auto tcp = std::make_unique<QenTcpInstrument>();
+  tcp->Connect("127.0.0.1", mSim.Port());
+  auto counting = std::make_unique<CountingInstrument>(std::move(tcp));
+  mCounter = counting.get();
+  QenGuiInst::SetInstrument(std::move(counting));
+  Dstring handle = "_BENCH";
+  AppHandle::Create(QenGuiInst::GetInstrument(), handle, "BENCH", list);
+  QenGuiInst::SetAppHandle(handle);
+}
+
+bool ManyParamsRig::Ok() const { return mSim.Port() != 0 && !QenGuiInst::GetAppHandle().empty(); }
+
+double Seconds(std::chrono::steady_clock::time_point since) {
+  return std::chrono::duration<double>(std::chrono::steady_clock::now() - since).count();
+}
+
+Dstring Header(int i) { return Dstring::Format(":%s:BENCH:P%d", QenGuiInst::GetAppHandle().c_str(), i); }

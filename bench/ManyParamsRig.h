@@ -1,0 +1,50 @@
+#pragma once
+
+#include <chrono>
+#include <memory>
+
+#include "instrument/QenInstrument.h"
+#include "instrument/QenSimProcess.h"
+#include "support/DstringList.h"
+
+// Counts the round trips that pass through it, and keeps their texts when asked.
+class CountingInstrument : public QenInstrument {
+ public:
+  explicit CountingInstrument(std::unique_ptr<QenInstrument> inner) : mInner(std::move(inner)) {}
+  int Connect(const Dstring& host, unsigned short port) override { return mInner->Connect(host, port); }
+  int Disconnect() override { return mInner->Disconnect(); }
+  bool IsConnected() const override { return mInner->IsConnected(); }
+  int Call(const Dstring& cmd, Dstring& reply) override {
+    ++mCalls;
+    if (mRecording) mRecorded.push_back(cmd);
+    return mInner->Call(cmd, reply);
+  }
+  long mCalls = 0;
+  bool mRecording = false;
+  DstringList mRecorded;
+
+ private:
+  std::unique_ptr<QenInstrument> mInner;
+};
+
+// qensim with a configuration of kManyParams numeric parameters in volts (":BENCH:P<i>"),
+// and the application started against it through a counting connection. One per program.
+class ManyParamsRig {
+ public:
+  static constexpr int kManyParams = 1000;
+
+  static ManyParamsRig& Get();
+  bool Ok() const;
+  long Calls() const { return mCounter->mCalls; }
+  CountingInstrument& Counter() { return *mCounter; }
+
+ private:
+  ManyParamsRig();
+
+  QenSimProcess mSim;
+  CountingInstrument* mCounter = nullptr;
+};
+
+double Seconds(std::chrono::steady_clock::time_point since);
+// The program header of parameter `i` under the application's handle.
+Dstring Header(int i);

@@ -1,0 +1,95 @@
+// A panel of 1,000 parameter fields refreshed after the server reports "ALL", against the same
+// joined queries sent raw plus 1,000 plain line edits given the same texts, both repainted.
+#include <benchmark/benchmark.h>
+
+#include <QApplication>
+#include <QGridLayout>
+#include <QLineEdit>
+#include <memory>
+#include <vector>
+
+#include "ManyParamsRig.h"
+#include "data/Dte.h"
+#include "instrument/QenGuiInst.h"
+#include "params/ui/BoundControl.h"
+#include "params/ui/ParSpinBox.h"
+#include "params/ui/QenParEd.h"
+
+namespace {
+
+constexpr int kColumns = 20;
+
+QApplication& App() {
+  static int argc = 1;
+  static char name[] = "qen_bench";
+  static char* argv[] = {name, nullptr};
+  qputenv("QT_QPA_PLATFORM", "offscreen");
+  static QApplication app(argc, argv);
+  return app;
+}
+
+template <class T>
+std::unique_ptr<QWidget> Panel(std::vector<T*>& widgets) {
+  auto panel = std::make_unique<QWidget>();
+  auto* grid = new QGridLayout(panel.get());
+  for (int i = 0; i < ManyParamsRig::kManyParams; ++i) {
+    widgets.push_back(new T(panel.get()));
+    grid->addWidget(widgets.back(), i / kColumns, i % kColumns);
+  }
+  panel->resize(kColumns * 140, ManyParamsRig::kManyParams / kColumns * 26);
+  panel->show();
+  return panel;
+}
+
+void BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits(benchmark::State& state) {
+  App();
+  ManyParamsRig& rig = ManyParamsRig::Get();
+  if (!rig.Ok()) return state.SkipWithError("qensim did not start");
+  std::vector<QenParEd*> fields;
+  auto bound = Panel(fields);
+  for (std::size_t i = 0; i < fields.size(); ++i) fields[i]->setProperty("DsCmdName", QStringLiteral(":BENCH:P%1").arg(i));
+  ConditionList list;
+  for (QenParEd* field : fields) field->NfyInit();
+  BoundControl::SetDsBaseNameAll(bound.get(), ":" + QenGuiInst::GetAppHandle(), list);
+  if (fields.back()->Editor()->Text() != QString::number(ManyParamsRig::kManyParams - 1)) {
+    return state.SkipWithError("the fields did not bind");
+  }
+  std::vector<QLineEdit*> edits;
+  auto plain = Panel(edits);
+  QCoreApplication::processEvents();
+
+  double refresh = 0, baseline = 0;
+  long calls = 0;
+  for (auto _ : state) {
+    const long before = rig.Calls();
+    rig.Counter().mRecording = true;
+    rig.Counter().mRecorded.clear();
+    auto t0 = std::chrono::steady_clock::now();
+    if (Dte::Update(list) != 0) return state.SkipWithError("refresh failed");
+    bound->repaint();
+    refresh += Seconds(t0);
+    rig.Counter().mRecording = false;
+    calls += rig.Calls() - before;
+
+    const DstringList queries = rig.Counter().mRecorded;
+    t0 = std::chrono::steady_clock::now();
+    for (const Dstring& query : queries) {
+      Dstring reply;
+      QenGuiInst::GetInstrument()->Call(query, reply);
+    }
+    for (std::size_t i = 0; i < edits.size(); ++i) edits[i]->setText(fields[i]->Editor()->Text());
+    plain->repaint();
+    baseline += Seconds(t0);
+  }
+  const double n = static_cast<double>(state.iterations());
+  state.counters["fields"] = ManyParamsRig::kManyParams;
+  state.counters["round_trips"] = static_cast<double>(calls) / n;
+  state.counters["refresh_ms"] = 1e3 * refresh / n;
+  state.counters["baseline_ms"] = 1e3 * baseline / n;
+  state.counters["ratio"] = refresh / baseline;
+  bound.reset();
+}
+
+}  // namespace
+
+BENCHMARK(BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(2.0);
