@@ -17,7 +17,8 @@ TEST_F(SimStateTest, DirtyFlagNamesOthersChangesOnceAndForgetsThemWhenRead) {
   Reply(
       ":_H:CGR1:MOD1:CONN1:VOLT:AMPL 2;:_H:TRIG:MODE CLOC;:_H:TRIG:MODE SEQ;:_H:CGR1:PER:ATTR "
       "(\"s\",-12,0,-12,1d)");
-  EXPECT_EQ(Dirty("_H", kConn), "");
+  // A unit attribute is applied by every client when the change set names it, the writer too.
+  EXPECT_EQ(Dirty("_H", kConn), "\":_H:CGR1:PER:ATTR\"");
   EXPECT_EQ(
       Dirty("_B", kOther),
       "\":_B:CGR1:MOD1:CONN1:VOLT:AMPL\",\":_B:CGR1:MOD1:CONN1:VOLT:HIGH\",\":_B:CGR1:MOD1:CONN1:VOLT:LOW\","

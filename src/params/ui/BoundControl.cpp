@@ -1,5 +1,6 @@
 #include "params/ui/BoundControl.h"
 
+#include <QEvent>
 #include <QPainter>
 #include <QTimer>
 #include <QWidget>
@@ -24,15 +25,21 @@ void ShowPendingReport(void*) {
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
 }
 
-// A frame drawn over a control that lets the mouse through.
+// A frame drawn over a control that lets the mouse through and follows its size.
 class AdjustedMark : public QWidget {
  public:
   explicit AdjustedMark(QWidget* parent) : QWidget(parent) {
     setAttribute(Qt::WA_TransparentForMouseEvents);
     setObjectName(QStringLiteral("AdjustedMark"));
+    setGeometry(parent->rect());
+    parent->installEventFilter(this);
   }
 
  protected:
+  bool eventFilter(QObject* watched, QEvent* event) override {
+    if (event->type() == QEvent::Resize) setGeometry(static_cast<QWidget*>(watched)->rect());
+    return false;
+  }
   void paintEvent(QPaintEvent*) override {
     QPainter painter(this);
     painter.setPen(QPen(QColor(0xe0, 0x80, 0x00), 2));
@@ -68,6 +75,21 @@ void BoundControl::SetDsCmdNameProperty(const QString& text) {
   Report(list);
 }
 
+void BoundControl::SetIsSetupConfigFunction(bool on) {
+  mSetupFunction = on;
+  mBinding.SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
+}
+
+void BoundControl::SetIsSetupConfigParameter(bool on) {
+  mSetupParameter = on;
+  mBinding.SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
+}
+
+void BoundControl::SetIsDisabled(bool disabled) {
+  mDisabled = disabled;
+  mWidget->setDisabled(disabled);
+}
+
 void BoundControl::SwapColours(bool failed) {
   if (failed == mShowsFailed) return;
   mShowsFailed = failed;
@@ -92,7 +114,6 @@ void BoundControl::ShowSourceState() {
 void BoundControl::MarkAdjusted(const QString& held, const QString& asked) {
   ClearMark();
   auto* mark = new AdjustedMark(mWidget);
-  mark->setGeometry(mWidget->rect());
   mark->show();
   mark->raise();
   mMark = mark;

@@ -42,6 +42,16 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
   QColor mBgColorFailed;
   QColor mFgColorFailed;
 
+  // The flags of the attributes "IsSetupConfigFunction" (read and write through the
+  // sub-command form) and "IsSetupConfigParameter"; registration passes either.
+  bool IsSetupConfigFunction() const { return mSetupFunction; }
+  bool IsSetupConfigParameter() const { return mSetupParameter; }
+  void SetIsSetupConfigFunction(bool on);
+  void SetIsSetupConfigParameter(bool on);
+  // "IsDisabled": the widget is disabled while set.
+  bool IsDisabled() const { return mDisabled; }
+  void SetIsDisabled(bool disabled);
+
   // Failed colours while the source is failed, and the tooltip.
   void ShowSourceState();
   // Marks the control for a moment: the instrument holds `held`, the user asked for `asked`.
@@ -69,6 +79,9 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
   DsBinding mBinding;
   QPalette mNormal;
   bool mShowsFailed = false;
+  bool mSetupFunction = false;
+  bool mSetupParameter = false;
+  bool mDisabled = false;
   QPointer<QWidget> mMark;
   QString mMarkTip;
 };

@@ -4,7 +4,7 @@
 
 class QenParField;
 
-// The editing part of a parameter field: a text element between a step-up arrow (box element
+// The editor inside a parameter field: a text element between a step-up arrow (box element
 // 0) and a step-down arrow (box element 2). It hands keys, steps and focus loss to its field.
 class ParSpinBox : public QAbstractSpinBox {
  public:

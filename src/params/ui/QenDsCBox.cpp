@@ -23,24 +23,9 @@ void QenDsCBox::ReInitList() {
   }
 }
 
-void QenDsCBox::SetIsDisabled(bool disabled) {
-  mDisabled = disabled;
-  setDisabled(disabled);
-}
-
-void QenDsCBox::SetIsSetupConfigFunction(bool on) {
-  mSetupFunction = on;
-  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
-}
-
-void QenDsCBox::SetIsSetupConfigParameter(bool on) {
-  mSetupParameter = on;
-  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
-}
-
 int QenDsCBox::Refresh(ConditionList& list) {
   Dstring reply;
-  const int status = Binding().Query(mSetupFunction, reply, list);
+  const int status = Binding().Query(IsSetupConfigFunction(), reply, list);
   if (status == 0 && Binding().GetDs() != nullptr) {
     if (ValueText::IsNoValue(reply)) {
       setCurrentIndex(-1);
@@ -56,7 +41,7 @@ int QenDsCBox::Refresh(ConditionList& list) {
 void QenDsCBox::HitItem(int index) {
   if (index < 0 || static_cast<std::size_t>(index) >= mItems.size()) return;
   ConditionList list;
-  if (Binding().Write(mSetupFunction, mItems[static_cast<std::size_t>(index)].ValueText(), list) != 0) Refresh(list);
+  if (Binding().Write(IsSetupConfigFunction(), mItems[static_cast<std::size_t>(index)].ValueText(), list) != 0) Refresh(list);
   Report(list);
 }
 

@@ -29,12 +29,6 @@ class QenDsCBox : public QComboBox, public BoundControl {
   void ReInitList();
   int Refresh(ConditionList& list) override;
   const CBoxItem& ItemRecord(int index) const { return mItems[static_cast<std::size_t>(index)]; }
-  bool IsDisabled() const { return mDisabled; }
-  void SetIsDisabled(bool disabled);
-  bool IsSetupConfigFunction() const { return mSetupFunction; }
-  bool IsSetupConfigParameter() const { return mSetupParameter; }
-  void SetIsSetupConfigFunction(bool on);
-  void SetIsSetupConfigParameter(bool on);
 
  protected:
   void wheelEvent(QWheelEvent* event) override;
@@ -43,7 +37,4 @@ class QenDsCBox : public QComboBox, public BoundControl {
   void HitItem(int index);
 
   std::vector<CBoxItem> mItems;
-  bool mDisabled = false;
-  bool mSetupFunction = false;
-  bool mSetupParameter = false;
 };

@@ -4,19 +4,9 @@ QenDsCBut::QenDsCBut(QWidget* parent) : QCheckBox(parent), BoundControl(this, "Q
   connect(this, &QCheckBox::clicked, this, &QenDsCBut::HitButton);
 }
 
-void QenDsCBut::SetIsSetupConfigFunction(bool on) {
-  mSetupFunction = on;
-  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
-}
-
-void QenDsCBut::SetIsSetupConfigParameter(bool on) {
-  mSetupParameter = on;
-  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
-}
-
 int QenDsCBut::Refresh(ConditionList& list) {
   Dstring reply;
-  const int status = Binding().Query(mSetupFunction, reply, list);
+  const int status = Binding().Query(IsSetupConfigFunction(), reply, list);
   if (status == 0 && Binding().GetDs() != nullptr) {
     const QString value = QString::fromStdString(reply);
     if (value == mOnValue) {
@@ -33,6 +23,6 @@ int QenDsCBut::Refresh(ConditionList& list) {
 void QenDsCBut::HitButton(bool checked) {
   ConditionList list;
   const QString& value = checked ? mOnValue : mOffValue;
-  if (Binding().Write(mSetupFunction, value.toStdString(), list) != 0) Refresh(list);
+  if (Binding().Write(IsSetupConfigFunction(), value.toStdString(), list) != 0) Refresh(list);
   Report(list);
 }

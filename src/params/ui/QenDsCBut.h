@@ -21,10 +21,6 @@ class QenDsCBut : public QCheckBox, public BoundControl {
   explicit QenDsCBut(QWidget* parent = nullptr);
 
   int Refresh(ConditionList& list) override;
-  bool IsSetupConfigFunction() const { return mSetupFunction; }
-  bool IsSetupConfigParameter() const { return mSetupParameter; }
-  void SetIsSetupConfigFunction(bool on);
-  void SetIsSetupConfigParameter(bool on);
 
   QString mOnValue;
   QString mOffValue;
@@ -32,6 +28,4 @@ class QenDsCBut : public QCheckBox, public BoundControl {
  private:
   void HitButton(bool checked);
 
-  bool mSetupFunction = false;
-  bool mSetupParameter = false;
 };

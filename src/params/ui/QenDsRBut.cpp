@@ -4,21 +4,6 @@ QenDsRBut::QenDsRBut(QWidget* parent) : QRadioButton(parent), BoundControl(this,
   connect(this, &QRadioButton::clicked, this, &QenDsRBut::HitButton);
 }
 
-void QenDsRBut::SetIsDisabled(bool disabled) {
-  mDisabled = disabled;
-  setDisabled(disabled);
-}
-
-void QenDsRBut::SetIsSetupConfigFunction(bool on) {
-  mSetupFunction = on;
-  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
-}
-
-void QenDsRBut::SetIsSetupConfigParameter(bool on) {
-  mSetupParameter = on;
-  Binding().SetRegistrationFlag(mSetupFunction || mSetupParameter ? 1 : 0);
-}
-
 // An exclusive group will not let its selected button go; the instrument may deselect it.
 void QenDsRBut::Select(bool on) {
   if (isChecked() == on) return;
@@ -30,7 +15,7 @@ void QenDsRBut::Select(bool on) {
 
 int QenDsRBut::Refresh(ConditionList& list) {
   Dstring reply;
-  const int status = Binding().Query(mSetupFunction, reply, list);
+  const int status = Binding().Query(IsSetupConfigFunction(), reply, list);
   if (status == 0 && Binding().GetDs() != nullptr) Select(QString::fromStdString(reply) == mOnValue);
   ShowSourceState();
   return status;
@@ -39,7 +24,7 @@ int QenDsRBut::Refresh(ConditionList& list) {
 void QenDsRBut::HitButton(bool checked) {
   if (!checked) return;
   ConditionList list;
-  if (Binding().Write(mSetupFunction, mOnValue.toStdString(), list) != 0 && parentWidget() != nullptr) {
+  if (Binding().Write(IsSetupConfigFunction(), mOnValue.toStdString(), list) != 0 && parentWidget() != nullptr) {
     // The group shows the instrument's choice again, not the one refused.
     for (auto* button : parentWidget()->findChildren<QenDsRBut*>(QString(), Qt::FindDirectChildrenOnly)) {
       if (button->GetDsName() == GetDsName()) button->Refresh(list);

@@ -21,12 +21,6 @@ class QenDsRBut : public QRadioButton, public BoundControl {
   explicit QenDsRBut(QWidget* parent = nullptr);
 
   int Refresh(ConditionList& list) override;
-  bool IsDisabled() const { return mDisabled; }
-  void SetIsDisabled(bool disabled);
-  bool IsSetupConfigFunction() const { return mSetupFunction; }
-  bool IsSetupConfigParameter() const { return mSetupParameter; }
-  void SetIsSetupConfigFunction(bool on);
-  void SetIsSetupConfigParameter(bool on);
 
   QString mOnValue;
 
@@ -34,7 +28,4 @@ class QenDsRBut : public QRadioButton, public BoundControl {
   void HitButton(bool checked);
   void Select(bool on);
 
-  bool mDisabled = false;
-  bool mSetupFunction = false;
-  bool mSetupParameter = false;
 };

@@ -6,11 +6,6 @@ QenDsSTEd::QenDsSTEd(QWidget* parent) : QLineEdit(parent), BoundControl(this, "Q
   connect(this, &QLineEdit::returnPressed, this, &QenDsSTEd::HitReturn);
 }
 
-void QenDsSTEd::SetIsSetupConfigParameter(bool on) {
-  mSetupParameter = on;
-  Binding().SetRegistrationFlag(on ? 1 : 0);
-}
-
 int QenDsSTEd::Refresh(ConditionList& list) {
   Dstring reply;
   const int status = Binding().Query(false, reply, list);

@@ -19,8 +19,6 @@ class QenDsSTEd : public QLineEdit, public BoundControl {
 
   int Refresh(ConditionList& list) override;
   int SendValue(ConditionList& list);
-  bool IsSetupConfigParameter() const { return mSetupParameter; }
-  void SetIsSetupConfigParameter(bool on);
 
  protected:
   void focusOutEvent(QFocusEvent* event) override;
@@ -28,5 +26,4 @@ class QenDsSTEd : public QLineEdit, public BoundControl {
  private:
   void HitReturn();
 
-  bool mSetupParameter = false;
 };

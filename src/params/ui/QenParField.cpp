@@ -80,11 +80,6 @@ void QenParField::SetShowUnits(bool show) {
   mUnitLabel->setVisible(show);
 }
 
-void QenParField::SetIsSetupConfigParameter(bool on) {
-  mSetupParameter = on;
-  Binding().SetRegistrationFlag(on ? 1 : 0);
-}
-
 void QenParField::Commit(int steps) {
   ConditionList list;
   mSending = true;

@@ -46,8 +46,6 @@ class QenParField : public QWidget, public BoundControl {
   void SetIsEnabled(bool enabled);
   bool ShowUnits() const { return mShowUnits; }
   void SetShowUnits(bool show);
-  bool IsSetupConfigParameter() const { return mSetupParameter; }
-  void SetIsSetupConfigParameter(bool on);
 
   ParFieldState& State() { return mState; }
   const ParFieldState& State() const { return mState; }
@@ -74,5 +72,4 @@ class QenParField : public QWidget, public BoundControl {
   bool mSending = false;
   bool mIsEnabled = true;
   bool mShowUnits = true;
-  bool mSetupParameter = false;
 };
