@@ -4,6 +4,7 @@
 #include <ostream>
 #include <string>
 
+#include "instrument/CommandText.h"
 #include "instrument/QenGuiInst.h"
 #include "support/ConditionList.h"
 
@@ -30,29 +31,11 @@ bool ConsoleHost::HandleLine(const Dstring& line) {
   }
   Dstring reply;
   ConditionList list;
-  int status = QenGuiInst::Call(ExpandHandle(line, QenGuiInst::GetAppHandle()), reply, list);
+  int status = QenGuiInst::Call(CommandText::ExpandHandle(line, QenGuiInst::GetAppHandle()), reply, list);
   if (!reply.empty()) mOut << reply << "\n";
   if (status != 0) mOut << "status " << status << "\n";
   for (const auto& c : list) mOut << "error " << c.GetCode() << ": " << c.GetMessage() << "\n";
   return true;
-}
-
-Dstring ConsoleHost::ExpandHandle(const Dstring& line, const Dstring& handle) {
-  Dstring out;
-  bool commandStart = true;
-  bool quoted = false;
-  for (std::size_t i = 0; i < line.size(); ++i) {
-    char c = line[i];
-    if (commandStart && c == ':' && i + 1 < line.size() && line[i + 1] == ':') {
-      out += ":" + handle;
-      commandStart = false;
-      continue;
-    }
-    if (c == '"') quoted = !quoted;
-    commandStart = !quoted && c == ';';
-    out += c;
-  }
-  return out;
 }
 
 void ConsoleHost::PrintHelp() {

@@ -12,11 +12,9 @@ class ConsoleHost {
 
   // Runs until end of input or "quit"; returns the process exit code.
   int Run();
-  // Handles one line; false when the console should end.
+  // Handles one line ("::TRIG:MODE?" stands for ":<handle>:TRIG:MODE?"); false when the
+  // console should end.
   bool HandleLine(const Dstring& line);
-
-  // "::TRIG:MODE?" stands for ":<handle>:TRIG:MODE?", the same after each ";".
-  static Dstring ExpandHandle(const Dstring& line, const Dstring& handle);
 
  private:
   void PrintHelp();

@@ -29,6 +29,18 @@ bool IsHeader(const std::string& text) {
   return true;
 }
 
+int ParseSize(const std::string& text, HostOptions& out) {
+  const auto x = text.find('x');
+  unsigned long w = 0, h = 0;
+  if (x == std::string::npos || !Dstring(text.substr(0, x)).ToULong(w) || !Dstring(text.substr(x + 1)).ToULong(h) ||
+      w < 200 || h < 150 || w > 8192 || h > 8192) {
+    return 1;
+  }
+  out.width = static_cast<int>(w);
+  out.height = static_cast<int>(h);
+  return 0;
+}
+
 int Bad(ConditionList& list, const std::string& what) {
   list.Add(1, Dstring("Unknown or incomplete option: ") + what);
   return 1;
@@ -45,9 +57,12 @@ int HostOptions::Parse(const std::vector<std::string>& args, HostOptions& out, C
       out.mode = Mode::Help;
     } else if (a == "--simulate") {
       out.simulate = haveServer = true;
-    } else if (a == "--console" && hasValue) {
-      if (ParseAddress(args[++i], out, list) != 0) return 1;
-      haveServer = true;
+    } else if (a == "--console") {
+      out.mode = Mode::Console;
+      if (hasValue && !args[i + 1].starts_with("--")) {
+        if (ParseAddress(args[++i], out, list) != 0) return 1;
+        haveServer = true;
+      }
     } else if (a == "--headless") {
       out.mode = Mode::Headless;
       if (hasValue && !args[i + 1].starts_with("--")) {
@@ -69,23 +84,43 @@ int HostOptions::Parse(const std::vector<std::string>& args, HostOptions& out, C
       unsigned long set = 0;
       if (!Dstring(args[++i]).ToULong(set)) return Bad(list, a + " " + args[i]);
       out.paramSet = set;
+    } else if (a == "--screenshot" && hasValue) {
+      out.screenshot = args[++i];
+    } else if (a == "--open" && hasValue) {
+      out.open.push_back(args[++i]);
+    } else if (a == "--size" && hasValue) {
+      if (ParseSize(args[++i], out) != 0) return Bad(list, a + " " + args[i]);
+    } else if (!a.starts_with("--") && !haveServer) {
+      if (ParseAddress(a, out, list) != 0) return 1;
+      haveServer = true;
     } else {
       return Bad(list, a);
     }
   }
-  if (!haveServer && out.mode != Mode::Help) out.simulate = true;
+  // Only the window asks for a server; the others, and a screenshot, take the simulator.
+  if (!haveServer && out.mode == Mode::Gui && out.screenshot.empty()) {
+    out.askServer = true;
+  } else if (!haveServer && out.mode != Mode::Help) {
+    out.simulate = true;
+  }
   return 0;
 }
 
 const char* HostOptions::Usage() {
-  return "usage: qengui [--console HOST:PORT | --headless [HOST:PORT] | --simulate] [options]\n"
-         "  --console HOST:PORT  command console to the instrument server at HOST:PORT\n"
+  return "usage: qengui [HOST:PORT | --simulate] [--console | --headless | --screenshot FILE] [options]\n"
+         "  HOST:PORT            the instrument server (the window asks when none is given)\n"
+         "  --console [ADDR]     command console instead of the window\n"
          "  --headless [ADDR]    run the application without a display: poll the server and print\n"
          "                       every change of its state and of the watched parameters\n"
          "  --watch HEADER       with --headless: also print this parameter (header without the\n"
          "                       handle, e.g. :TRIG:MODE); may be given several times\n"
          "  --seconds N          with --headless: end after N seconds (else on SIGINT or SIGTERM)\n"
-         "  --simulate           start a private qensim on a free loopback port (the default)\n"
+         "  --simulate           start a private qensim on a free loopback port (the default of\n"
+         "                       --console, --headless and --screenshot)\n"
+         "  --screenshot FILE    start, poll once, write a PNG of the main window and end\n"
+         "  --open RESOURCE      with --screenshot: open this window first (paramedit.ParamEd,\n"
+         "                       dtecmd.CmdWin, error.ErrorWin); may be given several times\n"
+         "  --size WxH           with --screenshot: the main window's size (1280x800)\n"
          "  --resource NAME      instrument resource name the application handle is made from (QEN1)\n"
          "  --log-dir DIR        directory of qengui.log (else QEN_LOG_DIR)\n"
          "  --param-set N        configuration parameter set (else QEN_CONFIG_PARAM_SET)\n";

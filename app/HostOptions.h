@@ -8,10 +8,12 @@
 
 // The command line of the qengui host.
 struct HostOptions {
-  enum class Mode { Console, Headless, Help };
+  enum class Mode { Gui, Console, Headless, Help };
 
-  Mode mode = Mode::Console;
+  Mode mode = Mode::Gui;
   bool simulate = false;
+  // The GUI was given no server: it asks with the connect dialog.
+  bool askServer = false;
   std::string host = "127.0.0.1";
   unsigned short port = 7130;
   std::string resource = "QEN1";
@@ -19,6 +21,11 @@ struct HostOptions {
   std::optional<unsigned long> paramSet;
   std::vector<std::string> watch;
   double seconds = 0.0;
+  // --screenshot: the PNG to write, the windows to open first and the window size.
+  std::string screenshot;
+  std::vector<std::string> open;
+  int width = 1280;
+  int height = 800;
 
   // Returns 0, or 1 with a condition naming the bad argument.
   static int Parse(const std::vector<std::string>& args, HostOptions& out, ConditionList& list);

@@ -5,14 +5,15 @@
 #include <vector>
 
 #include "ConsoleHost.h"
+#include "GuiHost.h"
 #include "HeadlessHost.h"
+#include "HostConnection.h"
 #include "HostOptions.h"
 #include "core/uiapp.h"
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
 #include "instrument/QenStatus.h"
-#include "instrument/QenTcpInstrument.h"
 #include "support/QenEnvironment.h"
 #include "toolkit/HeadlessToolkit.h"
 #include "toolkit/Toolkit.h"
@@ -30,29 +31,11 @@ void OnStopSignal(int) {
   if (gToolkit) gToolkit->Interrupt();
 }
 
-// Connects, hands the connection to QenGuiInst and creates the application handle.
-int ConnectAndCreateHandle(const HostOptions& options, ConditionList& list) {
-  auto instrument = std::make_unique<QenTcpInstrument>();
-  if (int status = instrument->Connect(Dstring(options.host), options.port); status != QenStatus::kOk) {
-    std::cerr << "qengui: cannot connect to " << options.host << ":" << options.port << ": "
-              << QenInstrument::GetErrMessage(status) << "\n";
-    return status;
-  }
-  QenGuiInst::SetInstrument(std::move(instrument));
-  const Dstring resource(options.resource);
-  Dstring handle = AppHandle::MakeFromResourceName(resource);
-  if (int status = AppHandle::Create(QenGuiInst::GetInstrument(), handle, resource, list); status != QenStatus::kOk) {
-    PrintConditions(list);
-    return status;
-  }
-  QenGuiInst::SetAppHandle(handle);
-  return QenStatus::kOk;
-}
-
 int RunConsole(const HostOptions& options) {
   ConditionList list;
   QenGuiInst::Init();
-  if (ConnectAndCreateHandle(options, list) != QenStatus::kOk) {
+  if (HostConnection::Open(options.host, options.port, options.resource, list) != QenStatus::kOk) {
+    PrintConditions(list);
     QenGuiInst::End();
     return 1;
   }
@@ -77,12 +60,13 @@ int RunHeadless(const HostOptions& options) {
   uiapp::RegisterVerbs();
   uiapp::RegisterWindows();
   uiapp::Init(list);
-  uiapp::SetCurrentResource(Dstring(options.resource));
   int code = 1;
-  if (ConnectAndCreateHandle(options, list) == QenStatus::kOk) {
+  if (HostConnection::Open(options.host, options.port, options.resource, list) == QenStatus::kOk) {
     uiapp::RegistrationFinished();
     HeadlessHost host(std::cout, toolkit, DstringList(options.watch.begin(), options.watch.end()), options.seconds);
     code = host.Run();
+  } else {
+    PrintConditions(list);
   }
   uiapp::End(list);
   uiapp::UnregisterWindows();
@@ -118,5 +102,9 @@ int main(int argc, char** argv) {
     options.port = sim.Port();
     std::cout << "Started qensim on 127.0.0.1:" << options.port << std::endl;
   }
-  return options.mode == HostOptions::Mode::Headless ? RunHeadless(options) : RunConsole(options);
+  switch (options.mode) {
+    case HostOptions::Mode::Headless: return RunHeadless(options);
+    case HostOptions::Mode::Console: return RunConsole(options);
+    default: return GuiHost::Run(argc, argv, options, sim);
+  }
 }

@@ -102,6 +102,7 @@ const SimCommandProcessor::Entry SimCommandProcessor::kHandleCommands[] = {
     {":SGEN:GLOB:PLL:STAT", &SimCommandProcessor::QueryPll, nullptr, false},
     {":SGEN:GLOB:CONN", &SimCommandProcessor::QueryConnected, &SimCommandProcessor::WriteConnected, false},
     {":SGEN:GLOB:SEQ:FORC", nullptr, &SimCommandProcessor::ForceSequence, false},
+    {":SYST:VERS", &SimCommandProcessor::QueryVersion, nullptr, false},
 };
 
 const SimCommandProcessor::Entry SimCommandProcessor::kGlobalCommands[] = {
@@ -373,6 +374,8 @@ void SimCommandProcessor::ListParams(const SimCommand& cmd) {
 void SimCommandProcessor::QueryError(const SimCommand&) {
   Reply(mTarget->Pop());
 }
+
+void SimCommandProcessor::QueryVersion(const SimCommand&) { Reply("\"qensim " QENGUI_VERSION "\""); }
 
 void SimCommandProcessor::QueryDirty(const SimCommand&) {
   Reply(mHandles.at(mHandle).Dirty().TakeReply(mHandle));

@@ -78,6 +78,7 @@ class SimCommandProcessor : public SimContext {
 
   void QueryError(const SimCommand& cmd);
   void QueryDirty(const SimCommand& cmd);
+  void QueryVersion(const SimCommand& cmd);
   void QueryLock(const SimCommand& cmd);
   void WriteLock(const SimCommand& cmd);
   void QueryRunning(const SimCommand& cmd);

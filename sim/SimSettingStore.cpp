@@ -1,6 +1,8 @@
 #include "SimSettingStore.h"
 
 #include <algorithm>
+#include <filesystem>
+#include <set>
 
 #include "support/ConditionList.h"
 #include "support/DstringList.h"
@@ -73,6 +75,7 @@ const SimSettingStore::Entry SimSettingStore::kCommands[] = {
     {":MMEM:SETT:NEW", nullptr, &SimSettingStore::NewSetting},
     {":MMEM:SETT:LOAD", nullptr, &SimSettingStore::LoadSetting},
     {":MMEM:SETT:SAVE", nullptr, &SimSettingStore::SaveSetting},
+    {":MMEM:SETT:CAT", &SimSettingStore::ListSettings, nullptr},
     {":CONF:CSET:PROF:EXPR", &SimSettingStore::QuerySettingProfile, &SimSettingStore::WriteSettingProfile},
     {":CONF:PROF", &SimSettingStore::QuerySystemValue, &SimSettingStore::WriteSystemValue},
     {":CONF:PROF:LIST", &SimSettingStore::ListSystemValues, nullptr},
@@ -118,6 +121,23 @@ void SimSettingStore::SaveSetting(const SimCommand& cmd, SimContext& context) {
   if (int rc = ReadItems(cmd, items, 1, 1)) return context.Error(rc);
   if (int rc = SettingPath(items, path)) return context.Error(rc);
   if (int rc = SimSettingFile::Capture(context.Params(), mSettingProfile).Write(path)) context.Error(rc);
+}
+
+void SimSettingStore::ListSettings(const SimCommand& cmd, SimContext& context) {
+  if (cmd.HasArgs()) return context.Error(kUndefined);
+  std::set<Dstring> names;
+  std::error_code error;
+  const std::filesystem::path dir = std::filesystem::path(mDataDir.c_str()) / "settings";
+  if (!mDataDir.empty() && std::filesystem::is_directory(dir, error)) {
+    for (const auto& entry : std::filesystem::directory_iterator(dir, error)) {
+      if (entry.path().extension() != ".qset") continue;
+      const Dstring name = entry.path().stem().string();
+      if (SimSettingFile::IsSettingName(name)) names.insert(name);
+    }
+  }
+  DstringList quoted;
+  for (const Dstring& name : names) quoted.push_back("\"" + name + "\"");
+  context.Reply(quoted.Join(","));
 }
 
 int SimSettingStore::SettingPath(const DataParcel& items, Dstring& path) const {

@@ -36,6 +36,7 @@ class SimSettingStore : public SimCommandModule {
   void NewSetting(const SimCommand& cmd, SimContext& context);
   void LoadSetting(const SimCommand& cmd, SimContext& context);
   void SaveSetting(const SimCommand& cmd, SimContext& context);
+  void ListSettings(const SimCommand& cmd, SimContext& context);
   void QuerySettingProfile(const SimCommand& cmd, SimContext& context);
   void WriteSettingProfile(const SimCommand& cmd, SimContext& context);
   void QuerySystemValue(const SimCommand& cmd, SimContext& context);

@@ -82,6 +82,14 @@ class DteRefresher {
     }
   }
 
+  static void ReadMissing(const std::vector<QenParamDs*>& sources) {
+    std::vector<QenParamDs*> missing;
+    for (QenParamDs* s : sources) {
+      if (!s->mValid || s->mValue.empty()) missing.push_back(s);
+    }
+    ReadValues(missing);
+  }
+
   // Forgets the cached values, reads them anew, then tells the views; the first failure of a
   // view is returned, but every source is told.
   static int Refresh(const std::vector<QenParamDs*>& sources, ConditionList& list) {
@@ -142,6 +150,8 @@ void Dte::End() {
   gDirtyFlag = nullptr;
   gErrorMgr = nullptr;
 }
+
+void Dte::Prefetch(const std::vector<QenParamDs*>& sources) { DteRefresher::ReadMissing(sources); }
 
 std::size_t Dte::NumSources() { return mDataSourceRepository.order.size(); }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <set>
+#include <vector>
 
 #include "data/DsNfyListEntry.h"
 #include "support/ConditionList.h"
@@ -71,6 +72,9 @@ class Dte {
   static unsigned IsFailed();
   static void ReleaseAllFailed();
   static std::size_t NumSources();
+  // Reads the sources that hold no valid value in joined queries, telling no view: a window
+  // about to bind many controls calls it first, so that each finds its value cached.
+  static void Prefetch(const std::vector<QenParamDs*>& sources);
 
  private:
   friend class QenParamDs;

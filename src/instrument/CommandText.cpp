@@ -41,3 +41,28 @@ int CommandText::CheckValue(std::string_view text, ConditionList& list) {
   }
   return quote ? Refuse(text, "a quote that is never closed", list) : QenStatus::kOk;
 }
+
+int CommandText::CheckLine(std::string_view text, ConditionList& list) {
+  for (char c : text) {
+    if (c != '"' && c != ';' && Offence(c) != nullptr) return Refuse(text, Offence(c), list);
+  }
+  return QenStatus::kOk;
+}
+
+Dstring CommandText::ExpandHandle(const Dstring& line, const Dstring& handle) {
+  Dstring out;
+  bool commandStart = true;
+  bool quoted = false;
+  for (std::size_t i = 0; i < line.size(); ++i) {
+    const char c = line[i];
+    if (commandStart && c == ':' && i + 1 < line.size() && line[i + 1] == ':') {
+      out += ":" + handle;
+      commandStart = false;
+      continue;
+    }
+    if (c == '"') quoted = !quoted;
+    commandStart = !quoted && c == ';';
+    out += c;
+  }
+  return out;
+}

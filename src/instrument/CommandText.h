@@ -16,4 +16,10 @@ class CommandText {
   // 0 when `text` may stand as a whole value after a header: quoted strings may hold ";",
   // but no line break or control character anywhere, no ";" outside quotes and no open quote.
   static int CheckValue(std::string_view text, ConditionList& list);
+  // 0 when `text` may go out as one typed command line: ";" joins commands and a ";" inside
+  // quotes is the user's business, but a line break or a control character is refused.
+  static int CheckLine(std::string_view text, ConditionList& list);
+  // Fills in the application handle where a command of the line starts with "::"
+  // ("::TRIG:MODE?" becomes ":<handle>:TRIG:MODE?"), leaving quoted text alone.
+  static Dstring ExpandHandle(const Dstring& line, const Dstring& handle);
 };

@@ -22,6 +22,11 @@ namespace {
 // A server that keeps answering with errors must not keep the caller here for ever.
 constexpr int kMaxErrorReads = 256;
 
+QenGuiInst::ErrorListenerProc& ErrorListener() {
+  static QenGuiInst::ErrorListenerProc listener;
+  return listener;
+}
+
 QenGuiInst::ServerDeathHandler& DeathHandler() {
   static QenGuiInst::ServerDeathHandler handler = [](const Dstring& message) {
     Toolkit::Get().Alert(message, ToolkitPort::Icon::Critical);
@@ -115,7 +120,11 @@ int QenGuiInst::Call(QenInstrument* instrument, const Dstring& cmd, Dstring& rep
     return status;
   }
   if (status != QenStatus::kOk && status != QenStatus::kLocked) {
+    const std::size_t before = list.Size();
     GetErrors(instrument, GetHandleFromCommand(cmd), status, list);
+    if (ErrorListener()) {
+      for (std::size_t i = before; i < list.Size(); ++i) ErrorListener()(cmd, list[i]);
+    }
   }
   return status;
 }
@@ -247,6 +256,8 @@ int QenGuiInst::ShowErrorDlg(ConditionList& list, int) {
 }
 
 void QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) { DeathHandler() = std::move(handler); }
+
+void QenGuiInst::SetErrorListener(ErrorListenerProc listener) { ErrorListener() = std::move(listener); }
 
 void QenGuiInst::Log(const Dstring& text) {
   if (!errorlog) return;

@@ -47,6 +47,16 @@ class QenGuiInst {
   // with exit code 0. The GUI installs its own alert; tests install one that records.
   using ServerDeathHandler = std::function<void(const Dstring& message)>;
   static void SetServerDeathHandler(ServerDeathHandler handler);
+  // Told of every condition that a failed command brought, with the command: the session's
+  // error list. Null removes it.
+  using ErrorListenerProc = std::function<void(const Dstring& cmd, const Condition& condition)>;
+  static void SetErrorListener(ErrorListenerProc listener);
+  // The hosts of `candidates` (loopback first when given) on which a server answers a
+  // connection at `port` within `timeoutMs` each, in the order given.
+  static void ListServerHostsAtPort(DstringList& found, unsigned short port, unsigned long timeoutMs,
+                                    const DstringList& candidates);
+  // The hosts worth asking: loopback, then QEN_SERVER_HOSTS (comma-separated), then `remembered`.
+  static DstringList CandidateHosts(const DstringList& remembered);
 
   // Whether the last exchange found the instrument held by another client. While it is, the
   // operation guards ask the server again (a harmless query) until the lock is gone.

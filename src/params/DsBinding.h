@@ -42,6 +42,7 @@ class DsBinding : public QenDsView {
   Dstring GetDsName() const { return mBaseName + mCmdName; }
   Dstring GetAttrDsName() const { return GetDsName() + ":ATTR"; }
   bool IsBound() const { return !mBaseName.empty(); }
+  bool HasAttrView() const { return mAttrView != nullptr; }
   bool IsInitialised() const { return mInitialised; }
   // The flag word handed to the engine at registration.
   void SetRegistrationFlag(unsigned flag) { mFlag = flag; }

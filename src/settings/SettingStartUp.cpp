@@ -2,7 +2,7 @@
 
 #include "instrument/QenGuiInst.h"
 #include "settings/QENSettingProfile.h"
-#include "settings/QENSystemProfile.h"
+#include "settings/SettingFile.h"
 #include "settings/SettingMRU.h"
 #include "settings/StartUpConfig.h"
 #include "support/ConditionListLoader.h"
@@ -30,21 +30,11 @@ int SettingStartUp::Run(unsigned long paramSet, ToolkitPort& toolkit, SettingMRU
 }
 
 int SettingStartUp::Load(const StartUpConfig& config, ConditionList& list) {
-  const Dstring& name = config.GetSettingName();
-  const Dstring cmd = Dstring::Format(":%s:MMEM:SETT:LOAD \"%s\", %s", QenGuiInst::GetAppHandle().c_str(),
-                                      name.c_str(), config.GetCableDelay() ? "ON" : "OFF");
-  Dstring reply;
-  return QenGuiInst::Call(cmd, reply, list);
+  return SettingFile::Load(config.GetSettingName(), config.GetCableDelay(), list);
 }
 
 int SettingStartUp::Record(const StartUpConfig& config, SettingMRU& mru, ConditionList& list) {
-  const Dstring& name = config.GetSettingName();
-  int status = QENSystemProfile::SetValue("OPENSETTING_NAME", name, list);
-  status = First(status, QENSystemProfile::SetValue("OPENSETTING_CABLEDELAY", config.GetCableDelay() ? 1UL : 0UL, list));
-  return First(status, mru.Record(name, list));
+  return SettingFile::RecordOpen(config.GetSettingName(), config.GetCableDelay(), mru, list);
 }
 
-int SettingStartUp::StartNew(ConditionList& list) {
-  Dstring reply;
-  return QenGuiInst::Call(Dstring::Format(":%s:MMEM:SETT:NEW", QenGuiInst::GetAppHandle().c_str()), reply, list);
-}
+int SettingStartUp::StartNew(ConditionList& list) { return SettingFile::New(list); }

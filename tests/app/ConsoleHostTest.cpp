@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include "ConsoleHost.h"
+#include "instrument/CommandText.h"
 #include "HostOptions.h"
 #include "common/SimProcess.h"
 
@@ -18,7 +19,7 @@ struct ExpandCase {
 class ConsoleExpand : public testing::TestWithParam<ExpandCase> {};
 
 TEST_P(ConsoleExpand, DoubleColonStandsForTheHandle) {
-  EXPECT_EQ(ConsoleHost::ExpandHandle(GetParam().line, "_QEN1X"), GetParam().sent);
+  EXPECT_EQ(CommandText::ExpandHandle(GetParam().line, "_QEN1X"), GetParam().sent);
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -53,13 +54,16 @@ TEST_P(HostOptionsParse, Table) {
 
 INSTANTIATE_TEST_SUITE_P(
     Table, HostOptionsParse,
-    testing::Values(OptionsCase{{}, 0, true, "127.0.0.1", 7130},
+    testing::Values(OptionsCase{{}, 0, false, "127.0.0.1", 7130}, OptionsCase{{"lab-pg:7131"}, 0, false, "lab-pg", 7131},
+                    OptionsCase{{"--screenshot", "a.png"}, 0, true, "127.0.0.1", 7130},
+                    OptionsCase{{"--screenshot", "a.png", "--size", "10x10"}, 1, false, "", 0},
+                    OptionsCase{{"a:1", "b:2"}, 1, false, "", 0},
                     OptionsCase{{"--console", "lab-pg:7131"}, 0, false, "lab-pg", 7131},
                     OptionsCase{{"--console", "::1:7130"}, 0, false, "::1", 7130},
                     OptionsCase{{"--console", "host"}, 1, false, "", 0},
                     OptionsCase{{"--console", "host:0"}, 1, false, "", 0},
                     OptionsCase{{"--console", "host:70000"}, 1, false, "", 0},
-                    OptionsCase{{"--console"}, 1, false, "", 0}, OptionsCase{{"--bogus"}, 1, false, "", 0},
+                    OptionsCase{{"--console"}, 0, true, "127.0.0.1", 7130}, OptionsCase{{"--bogus"}, 1, false, "", 0},
                     OptionsCase{{"--param-set", "x"}, 1, false, "", 0}));
 
 namespace {
@@ -96,7 +100,7 @@ TEST(ConsoleHostProcess, SendsLinesAndPrintsRepliesAndQueuedErrors) {
 
 TEST(ConsoleHostProcess, SimulateStartsAPrivateServer) {
   int code = -1;
-  std::string out = RunHost("--log-dir " + testing::TempDir() + " --simulate", "::SGEN:GLOB:INIT:CONT?\n", code);
+  std::string out = RunHost("--log-dir " + testing::TempDir() + " --console --simulate", "::SGEN:GLOB:INIT:CONT?\n", code);
   EXPECT_EQ(code, 0) << out;
   EXPECT_NE(out.find("Started qensim on 127.0.0.1:"), std::string::npos) << out;
   EXPECT_NE(out.find("qen> OFF\n"), std::string::npos) << out;

@@ -6,6 +6,7 @@
 #include <QWidget>
 
 #include "core/uiapp.h"
+#include "data/Dte.h"
 #include "instrument/QenGuiInst.h"
 #include "support/ErrorMgr.h"
 #include "toolkit/Toolkit.h"
@@ -148,9 +149,22 @@ QList<BoundControl*> BoundControl::FindAll(QWidget* root) {
 }
 
 int BoundControl::SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list) {
+  const QList<BoundControl*> controls = FindAll(root);
+  // Every value the controls are about to show is read first in joined queries, so that
+  // moving a panel of many controls costs a few round trips, not one or two per control.
+  std::vector<QenParamDs*> held;
+  if (!base.empty() && !DsBinding::IsDesignMode()) {
+    for (BoundControl* control : controls) {
+      const Dstring name = base + control->mBinding.GetDsCmdName();
+      held.push_back(Dte::AllocDsByName(name, 0));
+      if (control->mBinding.HasAttrView()) held.push_back(Dte::AllocDsByName(name + ":ATTR", 0));
+    }
+    Dte::Prefetch(held);
+  }
   int status = 0;
-  for (BoundControl* control : FindAll(root)) {
+  for (BoundControl* control : controls) {
     if (int rc = control->SetDsBaseName(base, list); rc != 0 && status == 0) status = rc;
   }
+  for (QenParamDs* source : held) Dte::FreeDs(source);
   return status;
 }

@@ -1,0 +1,273 @@
+#include "windows/MainWin.h"
+
+#include <QApplication>
+#include <QCloseEvent>
+#include <QInputDialog>
+#include <QLabel>
+#include <QMdiArea>
+#include <QMdiSubWindow>
+#include <QMenuBar>
+#include <QMessageBox>
+#include <QToolBar>
+#include <QVBoxLayout>
+
+#include "core/uiapp.h"
+#include "data/GuiLockDs.h"
+#include "data/QenDsView.h"
+#include "instrument/QenGuiInst.h"
+#include "settings/SettingFile.h"
+#include "support/ConditionList.h"
+#include "toolkit/WaitCursor.h"
+#include "windows/StateStatusBar.h"
+#include "windows/WindowFactory.h"
+
+namespace {
+
+constexpr const char* kResourceProperty = "qenResource";
+
+void Show(ConditionList& list) {
+  if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
+}
+
+}  // namespace
+
+class MainWin::LockView : public QenDsView {
+ public:
+  explicit LockView(MainWin& window) : mWindow(window) {}
+  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
+    mWindow.ShowLock(uiapp::GetGuiLockDs()->IsLocked());
+    return 0;
+  }
+
+ private:
+  MainWin& mWindow;
+};
+
+MainWin::MainWin(QWidget* parent)
+    : QMainWindow(parent), mArea(new QMdiArea), mBanner(new QLabel), mStatus(new StateStatusBar) {
+  setObjectName(QStringLiteral("MainWin"));
+  auto* central = new QWidget;
+  auto* layout = new QVBoxLayout(central);
+  layout->setContentsMargins(0, 0, 0, 0);
+  layout->setSpacing(0);
+  mBanner->setObjectName(QStringLiteral("LockBanner"));
+  mBanner->setText(QStringLiteral(
+      "Another client holds the instrument: every window is read-only until it lets go."));
+  mBanner->setStyleSheet(QStringLiteral("background: #fff3c4; color: #5c4400; padding: 6px; border-bottom: 1px solid #e0c060"));
+  mBanner->hide();
+  layout->addWidget(mBanner);
+  mArea->setViewMode(QMdiArea::SubWindowView);
+  mArea->setBackground(QColor(0x5a, 0x63, 0x70));
+  layout->addWidget(mArea, 1);
+  setCentralWidget(central);
+  setStatusBar(mStatus);
+  BuildMenus();
+  resize(1280, 800);
+  UpdateTitle();
+}
+
+MainWin::~MainWin() {
+  if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
+    ConditionList list;
+    uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
+  }
+}
+
+void MainWin::Attach() {
+  mStatus->Attach();
+  mLockView = std::make_unique<LockView>(*this);
+  ConditionList list;
+  uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
+  ShowLock(uiapp::GetGuiLockDs()->IsLocked());
+  UpdateTitle();
+}
+
+void MainWin::BuildMenus() {
+  BuildFileMenu();
+  BuildInstrumentMenu();
+  BuildWindowsMenu();
+  QMenu* help = menuBar()->addMenu(QStringLiteral("&Help"));
+  help->addAction(QStringLiteral("&About qengui"), this, &MainWin::HitAbout);
+}
+
+void MainWin::BuildFileMenu() {
+  QMenu* file = menuBar()->addMenu(QStringLiteral("&File"));
+  file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting);
+  file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting);
+  mRecent = file->addMenu(QStringLiteral("Recent &Settings"));
+  connect(mRecent, &QMenu::aboutToShow, this, &MainWin::FillRecentMenu);
+  file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
+  file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
+  file->addSeparator();
+  file->addAction(QStringLiteral("&Quit"), QKeySequence::Quit, this, &QWidget::close);
+}
+
+void MainWin::BuildInstrumentMenu() {
+  QMenu* menu = menuBar()->addMenu(QStringLiteral("&Instrument"));
+  QToolBar* bar = addToolBar(QStringLiteral("Run"));
+  bar->setObjectName(QStringLiteral("RunToolBar"));
+  bar->setToolButtonStyle(Qt::ToolButtonTextBesideIcon);
+  auto add = [&](const QString& text, QKeySequence key, int (*action)(ConditionList&), bool onBar) {
+    QAction* a = menu->addAction(text, this, [this, action] { RunAction(action); });
+    a->setShortcut(key);
+    if (onBar) bar->addAction(a);
+    return a;
+  };
+  add(QStringLiteral("\u25B6 &Run"), QKeySequence(Qt::Key_F5), &uiapp::Run, true);
+  add(QStringLiteral("\u25A0 S&top"), QKeySequence(Qt::SHIFT | Qt::Key_F5), &uiapp::Stop, true);
+  add(QStringLiteral("Sequence &Force"), QKeySequence(Qt::Key_F6), &uiapp::SequenceForce, true);
+  menu->addSeparator();
+  add(QStringLiteral("Outputs &On"), QKeySequence(), &uiapp::Connect, false);
+  add(QStringLiteral("Outputs O&ff"), QKeySequence(), &uiapp::Disconnect, false);
+  menu->addSeparator();
+  add(QStringLiteral("Check &Trigger Mode"), QKeySequence(), &uiapp::CheckTriggerMode, false);
+}
+
+void MainWin::BuildWindowsMenu() {
+  QMenu* menu = menuBar()->addMenu(QStringLiteral("&Windows"));
+  int index = 1;
+  for (const WindowFactory::Entry& entry : WindowFactory::Entries()) {
+    const QString resource = QString::fromStdString(entry.resource);
+    QAction* action = menu->addAction(QString::fromStdString(entry.title), this, [this, resource] { OpenWindow(resource); });
+    action->setShortcut(QKeySequence(Qt::CTRL | Qt::SHIFT | (Qt::Key_0 + index++)));
+  }
+  menu->addSeparator();
+  menu->addAction(QStringLiteral("&Cascade"), mArea, &QMdiArea::cascadeSubWindows);
+  menu->addAction(QStringLiteral("&Tile"), mArea, &QMdiArea::tileSubWindows);
+}
+
+void MainWin::FillRecentMenu() {
+  mRecent->clear();
+  for (const Dstring& name : uiapp::GetSettingMRU().GetNames()) {
+    const QString text = QString::fromStdString(name);
+    mRecent->addAction(text, this, [this, name] {
+      ConditionList list;
+      WaitCursor wait;
+      SettingFile::Open(name, false, uiapp::GetSettingMRU(), list);
+      Show(list);
+      UpdateTitle();
+    });
+  }
+  if (mRecent->isEmpty()) mRecent->addAction(QStringLiteral("(none)"))->setEnabled(false);
+}
+
+QWidget* MainWin::FindWindow(const QString& resource) const {
+  for (QMdiSubWindow* sub : mArea->subWindowList()) {
+    if (sub->property(kResourceProperty).toString() == resource) return sub->widget();
+  }
+  return nullptr;
+}
+
+QWidget* MainWin::OpenWindow(const QString& resource) {
+  if (QWidget* open = FindWindow(resource)) {
+    mArea->setActiveSubWindow(qobject_cast<QMdiSubWindow*>(open->parentWidget()));
+    open->parentWidget()->raise();
+    return open;
+  }
+  const WindowFactory::Entry* entry = WindowFactory::Find(resource.toStdString());
+  ConditionList list;
+  QWidget* window = nullptr;
+  if (entry == nullptr) {
+    list.Add(1, "There is no window \"" + resource.toStdString() + "\" in this program.");
+  } else {
+    WaitCursor wait;
+    window = entry->make(nullptr, list);
+  }
+  if (window == nullptr) {
+    Show(list);
+    return nullptr;
+  }
+  window->setAttribute(Qt::WA_DeleteOnClose);
+  QMdiSubWindow* sub = mArea->addSubWindow(window);
+  sub->setProperty(kResourceProperty, resource);
+  sub->setWindowTitle(QString::fromStdString(entry->title));
+  sub->setEnabled(!IsShowingLock());
+  sub->show();
+  Show(list);
+  return window;
+}
+
+bool MainWin::IsShowingLock() const { return mBanner->isVisibleTo(this); }
+
+void MainWin::ShowLock(bool locked) {
+  mBanner->setVisible(locked);
+  for (QMdiSubWindow* sub : mArea->subWindowList()) sub->widget()->setEnabled(!locked);
+  for (QAction* action : menuBar()->actions()) {
+    if (action->text() == QStringLiteral("&Instrument")) action->menu()->setEnabled(!locked);
+  }
+}
+
+void MainWin::RunAction(int (*action)(ConditionList&)) {
+  ConditionList list;
+  {
+    WaitCursor wait;
+    action(list);
+  }
+  Show(list);
+}
+
+void MainWin::HitNewSetting() {
+  ConditionList list;
+  SettingFile::New(list);
+  Show(list);
+  UpdateTitle();
+}
+
+void MainWin::HitOpenSetting() {
+  ConditionList list;
+  DstringList names;
+  if (SettingFile::Catalogue(names, list) != 0) return Show(list);
+  QStringList items;
+  for (const Dstring& name : names) items << QString::fromStdString(name);
+  if (items.isEmpty()) {
+    QMessageBox::information(this, windowTitle(), QStringLiteral("The instrument keeps no saved settings yet."));
+    return;
+  }
+  bool ok = false;
+  const QString name = QInputDialog::getItem(this, QStringLiteral("Open Setting"), QStringLiteral("Setting:"), items, 0,
+                                             false, &ok);
+  if (!ok) return;
+  WaitCursor wait;
+  SettingFile::Open(name.toStdString(), false, uiapp::GetSettingMRU(), list);
+  Show(list);
+  UpdateTitle();
+}
+
+void MainWin::HitSaveSetting() {
+  const Dstring current = SettingFile::CurrentName();
+  if (current.empty()) return HitSaveSettingAs();
+  ConditionList list;
+  SettingFile::Save(current, uiapp::GetSettingMRU(), list);
+  Show(list);
+}
+
+void MainWin::HitSaveSettingAs() {
+  bool ok = false;
+  const QString name = QInputDialog::getText(this, QStringLiteral("Save Setting As"), QStringLiteral("Name:"),
+                                             QLineEdit::Normal, QString::fromStdString(SettingFile::CurrentName()), &ok);
+  if (!ok) return;
+  ConditionList list;
+  SettingFile::Save(name.toStdString(), uiapp::GetSettingMRU(), list);
+  Show(list);
+  UpdateTitle();
+}
+
+void MainWin::HitAbout() {
+  Dstring identity;
+  ConditionList list;
+  QenGuiInst::Call(":" + QenGuiInst::GetAppHandle() + ":SYST:VERS?", identity, list);
+  QMessageBox::about(this, QStringLiteral("About qengui"),
+                     QStringLiteral("<b>qengui %1</b><br>Corvane 71300 user interface<br>Qt %2<br><br>Server: %3")
+                         .arg(QStringLiteral(QENGUI_VERSION), QLatin1String(qVersion()),
+                              identity.empty() ? QStringLiteral("(not known)") : QString::fromStdString(identity)));
+}
+
+void MainWin::UpdateTitle() {
+  const Dstring setting = SettingFile::CurrentName();
+  setWindowTitle(QStringLiteral("%1 - Corvane 71300").arg(setting.empty() ? QStringLiteral("UNTITLED") : QString::fromStdString(setting)));
+}
+
+void MainWin::closeEvent(QCloseEvent* event) {
+  uiapp::MainLoopExit();
+  QMainWindow::closeEvent(event);
+}

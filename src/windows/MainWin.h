@@ -1,0 +1,61 @@
+#pragma once
+
+#include <QMainWindow>
+#include <memory>
+
+class QAction;
+class QLabel;
+class QMdiArea;
+class QMdiSubWindow;
+class QMenu;
+class StateStatusBar;
+class ConditionList;
+
+// The frame of the program: the windows in an MDI area, the File, Instrument, Windows and Help
+// menus, the run toolbar and the status bar of the instrument's state. While another client
+// holds the instrument every window is read-only and a banner says so; it clears by itself.
+class MainWin : public QMainWindow {
+  Q_OBJECT
+
+ public:
+  explicit MainWin(QWidget* parent = nullptr);
+  ~MainWin() override;
+
+  // Registers with the state sources; call after uiapp::Init.
+  void Attach();
+  // Opens the window of a resource, or raises it when it is open; null when it cannot be built
+  // (the condition has been shown).
+  QWidget* OpenWindow(const QString& resource);
+  QWidget* FindWindow(const QString& resource) const;
+  QMdiArea* Area() const { return mArea; }
+  StateStatusBar* StatusBarView() const { return mStatus; }
+  bool IsShowingLock() const;
+  // Follows the lock state of the instrument.
+  void ShowLock(bool locked);
+
+ protected:
+  void closeEvent(QCloseEvent* event) override;
+
+ private:
+  class LockView;
+
+  void BuildMenus();
+  void BuildFileMenu();
+  void BuildInstrumentMenu();
+  void BuildWindowsMenu();
+  void FillRecentMenu();
+  // Runs an action of the instrument with the wait cursor and shows what went wrong.
+  void RunAction(int (*action)(ConditionList&));
+  void HitNewSetting();
+  void HitOpenSetting();
+  void HitSaveSetting();
+  void HitSaveSettingAs();
+  void HitAbout();
+  void UpdateTitle();
+
+  QMdiArea* mArea;
+  QLabel* mBanner;
+  StateStatusBar* mStatus;
+  QMenu* mRecent = nullptr;
+  std::unique_ptr<LockView> mLockView;
+};

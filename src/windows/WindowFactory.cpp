@@ -1,0 +1,35 @@
+#include "windows/WindowFactory.h"
+
+#include "windows/dtecmd/DtecmdCmdWin.h"
+#include "windows/error/ErrorErrorWin.h"
+#include "windows/paramedit/ParameditParamEdWin.h"
+
+namespace {
+
+template <class T>
+WindowFactory::Make Maker() {
+  return [](QWidget* parent, ConditionList& list) -> QWidget* {
+    auto* window = new T(parent);
+    if (window->Load(list) == 0) return window;
+    delete window;
+    return nullptr;
+  };
+}
+
+}  // namespace
+
+const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
+  static const std::vector<Entry> kEntries = {
+      {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>()},
+      {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
+      {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
+  };
+  return kEntries;
+}
+
+const WindowFactory::Entry* WindowFactory::Find(const Dstring& resource) {
+  for (const Entry& e : Entries()) {
+    if (e.resource == resource) return &e;
+  }
+  return nullptr;
+}
