@@ -59,7 +59,7 @@ bool AnswerAsServer(const Dstring& cmd, Dstring& reply) {
       {":SR:_H:CGR@:MOD1:CONN1:PULS:DEL", "1"},
       {":SR:_H:CGR1:MOD@:CONN1:PULS:DEL", "1"},
       {":_H:CGR1:MOD1:TYPE?", "\"K2268A\""},
-      {"_H:CGR1:MOD1:UCAS?", "FREE"},
+      {":_H:CGR1:MOD1:UCAS?", "FREE"},
       {"_H:SGEN:GLOB:CONN?", "ON"},
       {"_H:SGEN:GLOB:CONF?", "\"PATT\",\"\",(\":CGR1:MOD1:CONN1\",\"PDAT\",\"OUTPUT_PORT\",\"K2268A\")"},
       {":_H:SGEN:GLOB:SEQ?", "(3.0,\"\",(BLOCK,0,512,0,\"\",(),PAUSE,0,0))"},
