@@ -36,8 +36,12 @@ TEST_F(ProfileWire, SystemProfileSendsOneCommandPerValue) {
   const std::pair<Set, const char*> writes[] = {
       {[](ConditionList& l) { return QENSystemProfile::SetValue("N", -5L, l); }, "_H:CONF:PROF \"N\",(-5i)"},
       {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 7UL, l); }, "_H:CONF:PROF \"N\",(7u)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 1.5f, l); }, "_H:CONF:PROF \"N\",(1.5f)"},
+      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 1.5f, l); }, "_H:CONF:PROF \"N\",(1.500000f)"},
+      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 2.5, l); }, "_H:CONF:PROF \"N\",(2.500000d)"},
+      // Six decimals would turn these into other values: the shortest exact form instead.
       {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 2.5e-9, l); }, "_H:CONF:PROF \"N\",(2.5e-09d)"},
+      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 1.0f / 3, l); },
+       "_H:CONF:PROF \"N\",(0.33333334f)"},
       {[](ConditionList& l) { return QENSystemProfile::SetValue("N", Dstring("say \"hi\""), l); },
        "_H:CONF:PROF \"N\",\"say \"\"hi\"\"\""},
       {[](ConditionList& l) { return QENSystemProfile::SetValue("N", DataParcel(2, DataItem::MakeWord("x")), l); },
@@ -68,7 +72,7 @@ TEST_F(ProfileWire, SettingProfileWritesTheWholeListAppendingNewNames) {
   EXPECT_EQ(QENSettingProfile::SetValue("B", 2.5, mList), 0);
   EXPECT_EQ(QENSettingProfile::SetValue("A", Dstring("x;y"), mList), 0);
   EXPECT_TRUE(QENSettingProfile::IsDirty());
-  Inst().Expect("_H:CONF:CSET:PROF:EXPR (2.0,(\"A\",\"x;y\"),(\"B\",\"(2.5d)\"))", "");
+  Inst().Expect("_H:CONF:CSET:PROF:EXPR (2.0,(\"A\",\"x;y\"),(\"B\",\"(2.500000d)\"))", "");
   EXPECT_EQ(QENSettingProfile::Write(mList), 0);
   EXPECT_FALSE(QENSettingProfile::IsDirty());
 }
@@ -170,6 +174,22 @@ TEST_P(SettingProfileFollows, ReadsAgainWhenTheServerReportsItsChange) {
 
 INSTANTIATE_TEST_SUITE_P(Names, SettingProfileFollows,
                          testing::Values(DirtyCase{"\":_H:CONF:CSET:PROF:EXPR\"", true},
+                                         DirtyCase{"\":CONF:CSET:PROF:EXPR\"", true},
+                                         DirtyCase{"\":_OTHER:CONF:CSET:PROF:EXPR\"", false},
                                          DirtyCase{"\":_H:CGR1:PER\",\":_h:conf:cset:prof:expr\"", true},
                                          DirtyCase{"\"ALL\"", true}, DirtyCase{"\":_H:CONF:PROF\"", false},
                                          DirtyCase{"\":_H:CONF:CSET:PROF:EXPRX\"", false}));
+
+TEST_F(ProfileWire, NumbersReadInTheFixedAndTheShortForm) {
+  ReadProfile("(2.0,(\"A\",\"(1.5f)\"),(\"B\",\"(1.500000f)\"),(\"C\",\"(2.500000d)\"),(\"D\",\"(2.5e-09d)\"))");
+  float a = 0, b = 0;
+  double c = 0, d = 0;
+  EXPECT_EQ(QENSettingProfile::GetValue("A", a, mList), 0);
+  EXPECT_EQ(QENSettingProfile::GetValue("B", b, mList), 0);
+  EXPECT_EQ(QENSettingProfile::GetValue("C", c, mList), 0);
+  EXPECT_EQ(QENSettingProfile::GetValue("D", d, mList), 0);
+  EXPECT_EQ(a, 1.5f);
+  EXPECT_EQ(b, 1.5f);
+  EXPECT_EQ(c, 2.5);
+  EXPECT_EQ(d, 2.5e-9);
+}
