@@ -367,4 +367,22 @@ TEST_F(SegmentSimTest, ASixteenMegavectorSegmentOfSixtyFourTracesFits) {
   ds->Release();
 }
 
+
+// A server may answer the coding unquoted (01): the segment still opens, shows and edits.
+TEST_F(SegmentSimTest, AnUnquotedCodingIsTaken) {
+  QenSegmentDs* ds = Make("Work/Plain", "01", 16, 2);
+  Dstring reply;
+  const Dstring header = Dstring::Format(":EDIT:SEGM%u:PATT:COD?", ds->GetNumber());
+  ASSERT_EQ(QenGuiInst::Call(":TEST:MALF \"" + header + "\",\"01\",0", reply, mList), 0);
+  SegmentBuffer* buffer = Window(ds, 0, 16);
+  Dstring coding;
+  ASSERT_EQ(ds->GetCoding(coding, mList, true), 0) << mList.ToText();
+  EXPECT_EQ(coding, "01");
+  const std::string written = Scribble(ds, buffer, "01", 3);
+  ASSERT_EQ(ds->Write(mList), 0) << mList.ToText();
+  EXPECT_EQ(States(ds, Window(ds, 0, 16)), written);
+  ds->Close(mList);
+  QenSegmentPool::FreeDs(ds);
+}
+
 }  // namespace
