@@ -319,4 +319,19 @@ TEST_F(SimModelTest, DefaultSegmentsFromTheServersConfiguration) {
   EXPECT_EQ(mOther->Text(":SGEN:GLOB:SEQ?"), InitialOf("PAUSE"));
 }
 
+
+// A server may answer the start label unquoted; the model takes it and writes it back quoted.
+TEST_F(SimModelTest, ANumericStartLabelFromTheServerIsReadAndKept) {
+  Dstring reply;
+  // The reply text travels as a quoted argument: its quotes doubled.
+  Dstring served = "(3.0,5," + Block10(7) + ")";
+  for (std::size_t at = 0; (at = served.find('"', at)) != Dstring::npos; at += 2) served.insert(at, 1, '"');
+  ASSERT_EQ(QenGuiInst::Call(":TEST:MALF \":SGEN:GLOB:SEQ?\",\"" + served + "\"", reply, mList), 0);
+  ASSERT_EQ(Seq().ReadSequence(mList, 1), 0) << mList.ToText();
+  EXPECT_EQ(Seq().GetLabel(1), "5");
+  EXPECT_EQ(Seq().GetBlockLength(1), 7u);
+  ASSERT_EQ(Seq().SetBlockLength(1, 8, mList), 0) << mList.ToText();
+  EXPECT_EQ(mOther->Text(":SGEN:GLOB:SEQ?"), "(3.0,\"5\"," + Block10(8) + ")");
+}
+
 }  // namespace
