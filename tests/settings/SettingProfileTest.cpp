@@ -31,27 +31,6 @@ class ProfileWire : public InstrumentFixture {
 
 }  // namespace
 
-TEST_F(ProfileWire, SystemProfileSendsOneCommandPerValue) {
-  using Set = std::function<int(ConditionList&)>;
-  const std::pair<Set, const char*> writes[] = {
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", -5L, l); }, "_H:CONF:PROF \"N\",(-5i)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 7UL, l); }, "_H:CONF:PROF \"N\",(7u)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 1.5f, l); }, "_H:CONF:PROF \"N\",(1.500000f)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 2.5, l); }, "_H:CONF:PROF \"N\",(2.500000d)"},
-      // Six decimals would turn these into other values: the shortest exact form instead.
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 2.5e-9, l); }, "_H:CONF:PROF \"N\",(2.5e-09d)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 1.0f / 3, l); },
-       "_H:CONF:PROF \"N\",(0.33333334f)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", Dstring("say \"hi\""), l); },
-       "_H:CONF:PROF \"N\",\"say \"\"hi\"\"\""},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", DataParcel(2, DataItem::MakeWord("x")), l); },
-       "_H:CONF:PROF \"N\",(x,x)"}};
-  for (const auto& [set, command] : writes) {
-    Inst().Expect(command, "");
-    EXPECT_EQ(set(mList), 0) << command;
-  }
-}
-
 TEST_F(ProfileWire, SystemProfileQueriesAndRefusesNamesThatWouldBreakTheCommand) {
   Inst().Expect("_H:CONF:PROF? \"OPENSETTING_NAME\"", "\"bench\"");
   Dstring name;
