@@ -39,11 +39,18 @@ TEST_F(ProfileWire, SystemProfileQueriesAndRefusesNamesThatWouldBreakTheCommand)
   EXPECT_NE(QENSystemProfile::SetValue("a\"b", 1L, mList), 0);
   EXPECT_NE(QENSystemProfile::SetValue("N", std::nan(""), mList), 0);
   EXPECT_TRUE(mList.HasKey("GUI_PROFILE_VALUE_NOT_FINITE"));
-  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",B");
+  // The names may come quoted or bare, numbers included; a nested list is no list of names.
+  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",B,7");
   int exists = 0;
+  EXPECT_EQ(QENSystemProfile::Exists("B", exists, mList), 0) << mList.ToText();
+  EXPECT_EQ(exists, 1);
+  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",B,7");
+  EXPECT_EQ(QENSystemProfile::Exists("7", exists, mList), 0);
+  EXPECT_EQ(exists, 1);
+  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",(B)");
   EXPECT_NE(QENSystemProfile::Exists("B", exists, mList), 0);
   EXPECT_TRUE(mList.HasKey("GUI_SYSTEM_PROFILE_BAD_LIST"));
-  EXPECT_EQ(Inst().Sent().size(), 2u) << "nothing may be sent for a refused name or value";
+  EXPECT_EQ(Inst().Sent().size(), 4u) << "nothing may be sent for a refused name or value";
 }
 
 TEST_F(ProfileWire, SettingProfileWritesTheWholeListAppendingNewNames) {
