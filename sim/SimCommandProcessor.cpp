@@ -490,9 +490,14 @@ void SimCommandProcessor::TestErr(const SimCommand& cmd) {
 
 void SimCommandProcessor::TestMalformed(const SimCommand& cmd) {
   DataParcel items;
-  if (!ReadArgs(cmd, items, 2, 2)) return;
-  if (!items[0].IsText() || !items[1].IsText()) return Error(-104);
-  mSessions[mConnection].ArmMalformed(Dstring(items[0].GetText()).ToUpper(), Dstring(items[1].GetText()));
+  long count = 1;
+  if (!ReadArgs(cmd, items, 2, 3)) return;
+  if (!items[0].IsText() || !items[1].IsText() || (items.size() == 3 && !items[2].GetLong(count))) {
+    return Error(-104);
+  }
+  if (count < 0 || count > INT_MAX) return Error(-222);
+  mSessions[mConnection].ArmMalformed(Dstring(items[0].GetText()).ToUpper(), Dstring(items[1].GetText()),
+                                      static_cast<int>(count));
 }
 
 void SimCommandProcessor::TestBig(const SimCommand& cmd) {

@@ -22,13 +22,15 @@ class SimSession {
     return mDelayMs;
   }
 
-  void ArmMalformed(const Dstring& header, const Dstring& text) { mMalformed[header] = text; }
-  // The armed replacement for a reply to `header`, used up; false when there is none.
+  // The next `count` replies to `header` become `text`; a count of 0 keeps it for every reply
+  // until the header is armed again.
+  void ArmMalformed(const Dstring& header, const Dstring& text, int count) { mMalformed[header] = {text, count}; }
+  // The armed replacement for a reply to `header`, counted off; false when there is none.
   bool TakeMalformed(const Dstring& header, Dstring& text) {
     auto it = mMalformed.find(header);
     if (it == mMalformed.end()) return false;
-    text = it->second;
-    mMalformed.erase(it);
+    text = it->second.text;
+    if (it->second.count != 0 && --it->second.count == 0) mMalformed.erase(it);
     return true;
   }
 
@@ -36,5 +38,9 @@ class SimSession {
   SimErrorQueue mErrors;
   int mDelayMs = 0;
   int mDelayCount = 0;
-  std::map<Dstring, Dstring> mMalformed;
+  struct Replacement {
+    Dstring text;
+    int count;
+  };
+  std::map<Dstring, Replacement> mMalformed;
 };

@@ -56,6 +56,8 @@ int DataPortOneLockDs::UpdateFromFW(ConditionList& list) {
   mFoundCmdPath = Dstring::Format(":CGR%lu:MOD%lu:UCAS", group, module);
   SetSetting(mFoundCmdPath);
   Dstring word;
-  if (int status = Query(word, list)) return status;
-  return Change(mState, FromReply(word), list);
+  if (int status = QenGuiInst::Call(Dstring::Format(":%s:CGR%lu:MOD%lu:UCAS?", handle, group, module), word, list)) {
+    return status;
+  }
+  return Change(mState, FromReply(word.Trimmed()), list);
 }

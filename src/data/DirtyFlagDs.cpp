@@ -42,7 +42,7 @@ int DirtyFlagDs::UpdateFromFW(ConditionList& list) {
 int DirtyFlagDs::NotifyMatching(ConditionList& list) {
   const std::vector<DsNfyListEntry> copy = GetNfyList();
   const auto removals = GetRemovals();
-  Use();
+  Pin();
   int status = 0;
   for (const auto& entry : copy) {
     if (!IsStillRegistered(entry, removals)) continue;
@@ -52,7 +52,7 @@ int DirtyFlagDs::NotifyMatching(ConditionList& list) {
     });
     if (matches && (status = Notify(entry, list)) != 0) break;
   }
-  Release();
+  Unpin();
   return status;
 }
 

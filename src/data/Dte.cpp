@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "data/DirtyFlagDs.h"
+#include "data/PinnedSources.h"
 #include "data/QenDsView.h"
 #include "data/QenParamDs.h"
 #include "instrument/QenGuiInst.h"
@@ -38,22 +39,6 @@ std::string Key(const Dstring& name) { return name.ToUpper(); }
 std::vector<QenParamDs*> AllSources() {
   return {mDataSourceRepository.order.begin(), mDataSourceRepository.order.end()};
 }
-
-// References held while views are told, so that a view freeing a source cannot pull it away
-// from under the pass.
-class HeldSources {
- public:
-  explicit HeldSources(std::vector<QenParamDs*> sources) : mSources(std::move(sources)) {
-    for (auto* s : mSources) s->Use();
-  }
-  ~HeldSources() {
-    for (auto* s : mSources) s->Release();
-  }
-  const std::vector<QenParamDs*>& Get() const { return mSources; }
-
- private:
-  std::vector<QenParamDs*> mSources;
-};
 
 Dstring FirstHeader(const Dstring& batch) { return Dstring(batch.substr(0, batch.find_first_of(" ?;"))); }
 
@@ -93,7 +78,7 @@ class DteRefresher {
   // Forgets the cached values, reads them anew, then tells the views; the first failure of a
   // view is returned, but every source is told.
   static int Refresh(const std::vector<QenParamDs*>& sources, ConditionList& list) {
-    HeldSources held(sources);
+    PinnedSources<QenParamDs> held(sources);
     for (auto* s : held.Get()) s->Invalidate();
     ReadValues(held.Get());
     int first = 0;
@@ -337,7 +322,7 @@ int Dte::Write(QenParamDs* source, ConditionList& list) {
     if (s && std::find(refresh.begin(), refresh.end(), s) == refresh.end()) limitsOnly.push_back(s);
   }
   DteRefresher::Refresh(refresh, list);
-  HeldSources held(limitsOnly);
+  PinnedSources<QenParamDs> held(limitsOnly);
   for (auto* s : held.Get()) s->Update(list, 0);
   return status;
 }

@@ -9,11 +9,15 @@
 unsigned QenDs::Use() { return ++mRefCount; }
 
 unsigned QenDs::Release() {
-  if (--mRefCount == 0) {
-    delete this;
+  if (mRefCount == 0 || --mRefCount == 0) {
+    if (mPins == 0) delete this;
     return 0;
   }
   return mRefCount;
+}
+
+void QenDs::Unpin() {
+  if (--mPins == 0 && mRefCount == 0) delete this;
 }
 
 void QenDs::Append(DsNfyListEntry entry) {
@@ -80,12 +84,12 @@ int QenDs::Update(ConditionList& list, unsigned block) {
   }
   const std::uint64_t removals = mRemovals;
   // A view may release the last reference to this source while being told.
-  Use();
+  Pin();
   int status = 0;
   for (const auto& entry : copy) {
     if (!IsStillRegistered(entry, removals)) continue;
     if ((status = Notify(entry, list)) != 0) break;
   }
-  Release();
+  Unpin();
   return status;
 }

@@ -32,6 +32,12 @@ class QenDs {
   virtual void UnregisterProc(QenDsProc proc, QenDsMatchProc matchProc, void* client);
   virtual void UnregisterProc(QenDsProc proc, void* client);
 
+  // A pin keeps the object alive across a pass that works on it without being a reference:
+  // Use, Release, NumRefs and the engines' free decide as if no pass ran. A Release that takes
+  // the count to zero while pinned leaves the deletion to the last Unpin.
+  void Pin() { ++mPins; }
+  void Unpin();
+
  protected:
   const std::vector<DsNfyListEntry>& GetNfyList() const { return mNfyList; }
   // Notifies one registration; the dirty-flag source filters by name before calling it.
@@ -45,6 +51,7 @@ class QenDs {
   void EraseAt(std::size_t index);
 
   unsigned mRefCount = 1;
+  unsigned mPins = 0;
   std::vector<DsNfyListEntry> mNfyList;
   std::uint64_t mNextSerial = 1;
   std::uint64_t mRemovals = 0;

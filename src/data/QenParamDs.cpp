@@ -41,19 +41,28 @@ bool QenParamDs::TakeReadReply(const Dstring& reply) {
   return true;
 }
 
+// The value and its clash state in one round trip. A server that refuses or garbles the clash
+// form still gets asked the value alone; the clash state is then unknown, and the refusal,
+// which is no fault of the user's, stays out of the list.
+int QenParamDs::ReadValue(ConditionList& list) {
+  Dstring reply;
+  ConditionList joined;
+  int status = QenGuiInst::Call(GetReadWithClashCmdStr(), reply, joined);
+  if (status == QenStatus::kOk && TakeReadReply(reply)) return status;
+  if (status == QenStatus::kLocked || status == QenStatus::kServerTerminated) return status;
+  status = QenGuiInst::Call(GetReadCmdStr(), reply, list);
+  if (status == QenStatus::kOk) {
+    TakeReadValue(reply, false);
+  } else if (status != QenStatus::kLocked) {
+    mFailed = 1;
+  }
+  return status;
+}
+
 int QenParamDs::QueryStrValue(Dstring& out, ConditionList& list) {
   mUsed = 1;
   if (!mValid || mValue.empty()) {
-    Dstring reply;
-    int status = QenGuiInst::Call(GetReadWithClashCmdStr(), reply, list);
-    if (status == QenStatus::kOk && !TakeReadReply(reply)) {
-      ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {GetReadWithClashCmdStr(), reply}, 1);
-      status = 1;
-    }
-    if (status != QenStatus::kOk) {
-      if (status != QenStatus::kLocked) mFailed = 1;
-      return status;
-    }
+    if (int status = ReadValue(list)) return status;
   }
   Dstring text;
   if (mSubCmdEnabled && QuotedText(mValue, text)) {
@@ -80,7 +89,9 @@ int QenParamDs::SetStrValue(const Dstring& value, ConditionList& list) {
   if (mSubCmdEnabled) {
     if (int status = CommandText::CheckArgument(value, list)) return status;
     Dstring current;
-    if (mValue.empty() && QueryStrValue(current, list) != QenStatus::kOk) return QenStatus::kCommError;
+    if (mValue.empty()) {
+      if (int status = QueryStrValue(current, list)) return status;
+    }
     Dstring sub = CurrentSubCmd();
     if (!sub.empty()) text = "\"" + sub + " " + value + "\"";
   } else if (int status = CommandText::CheckValue(value, list)) {

@@ -13,7 +13,8 @@
 // - failed: set by a failed read or write of this source, cleared by a successful one. A lock
 //   (-19) is a state of the instrument, not a failure of the source.
 // - clashing: the parameter clashes with another setting ("<header>? CLAS" answers 1). Every
-//   read of the value asks it in the same round trip, so IsClashing asks nothing.
+//   read of the value asks it in the same round trip, so IsClashing asks nothing. A server
+//   that refuses the clash form is asked the value alone ("<header>?"), the clash unknown.
 // - in transaction: set by a write inside a transaction, cleared when the batch is sent.
 // - sub-command: the value is a quoted sub-command word and value, as in "\"PRBS 7\"".
 class QenParamDs : public QenDs, public QenDsView {
@@ -70,6 +71,7 @@ class QenParamDs : public QenDs, public QenDsView {
   void TakeReadValue(const Dstring& value, bool clashing);
   // Takes the reply of GetReadWithClashCmdStr; false when it is not two parts.
   bool TakeReadReply(const Dstring& reply);
+  int ReadValue(ConditionList& list);
   void Invalidate() { mValid = false; }
 
   Dstring mProgramHeader;

@@ -158,7 +158,7 @@ int QenSegmentDs::GetCoding(Dstring& coding, ConditionList& list, bool force) {
   if (int status = CheckOpen(list)) return status;
   Dstring reply;
   if (int status = Query(Cmd(":PATT:COD?"), reply, list)) return status;
-  if (SegmentReply::FirstText(reply, coding)) return SegmentStatus::kOk;
+  if (SegmentReply::FirstItemText(reply, coding)) return SegmentStatus::kOk;
   return SegmentReply::Refuse(list, "GUI_SEGMENTDS_BAD_CODING", {SegmentReply::Shown(reply)},
                               SegmentStatus::kBadReply);
 }

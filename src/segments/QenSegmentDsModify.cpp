@@ -137,7 +137,7 @@ int QenSegmentDs::GetClipBoardLength(long& length, ConditionList& list) {
 int QenSegmentDs::GetClipBoardCoding(Dstring& coding, ConditionList& list) {
   Dstring reply;
   if (int status = Query(ClipCmd(":COD?"), reply, list)) return status;
-  if (SegmentReply::FirstText(reply, coding)) return SegmentStatus::kOk;
+  if (SegmentReply::FirstItemText(reply, coding)) return SegmentStatus::kOk;
   return SegmentReply::Refuse(list, "GUI_SEGMENTDS_BAD_CLIPBOARDCODING", {SegmentReply::Shown(reply)},
                               SegmentStatus::kBadReply);
 }

@@ -302,7 +302,7 @@ int QenSegmentDs::SetProperties(const SegmentProperties& properties, ConditionLi
   FWBlocker guard("QenSegmentDs::SetProperties", list);
   if (int status = guard.Block()) return status;
   if (int status = SetType(properties.type, list)) return status;
-  if (properties.type == SegmentType::kMemory || properties.type == SegmentType::kNone) {
+  if (properties.type == SegmentType::kMemory) {
     if (int status = SetCoding(properties.coding, list)) return status;
     if (int status = SetLength(properties.length, list)) return status;
     return SetWidth(properties.width, list);

@@ -5,6 +5,7 @@
 #include <set>
 
 #include "data/DirtyFlagDs.h"
+#include "data/PinnedSources.h"
 #include "instrument/CommandText.h"
 #include "instrument/QenGuiInst.h"
 #include "segments/QenSegmentDs.h"
@@ -30,22 +31,6 @@ int Call(const Dstring& cmd, ConditionList& list) {
   Dstring reply;
   return QenGuiInst::Call(cmd, reply, list);
 }
-
-// References held while the sources are worked on, so that a view freeing one cannot pull it
-// away during the pass.
-class HeldSources {
- public:
-  explicit HeldSources(std::vector<QenSegmentDs*> sources) : mSources(std::move(sources)) {
-    for (auto* s : mSources) s->Use();
-  }
-  ~HeldSources() {
-    for (auto* s : mSources) s->Release();
-  }
-  const std::vector<QenSegmentDs*>& Get() const { return mSources; }
-
- private:
-  std::vector<QenSegmentDs*> mSources;
-};
 
 }  // namespace
 
@@ -116,7 +101,7 @@ int QenSegmentPool::UnregisterView(QenSegmentDs* ds, QenDsView* view, ConditionL
 int QenSegmentPool::Sync(ConditionList& list) {
   FWBlocker guard("QenSegmentPool::Sync", list);
   if (int status = guard.Block()) return status;
-  HeldSources held(mPool);
+  PinnedSources<QenSegmentDs> held(mPool);
   int first = SegmentStatus::kOk;
   for (QenSegmentDs* ds : held.Get()) {
     const int status = ds->Write(list);
@@ -148,7 +133,7 @@ int QenSegmentPool::UpdateWhere(bool all, ConditionList& list) {
   if (!all && mDirtyFlag) {
     for (const Dstring& name : mDirtyFlag->GetChangedNames()) changed.insert(NumberOf(name));
   }
-  HeldSources held(mPool);
+  PinnedSources<QenSegmentDs> held(mPool);
   int first = SegmentStatus::kOk;
   for (QenSegmentDs* ds : held.Get()) {
     if (ds->GetNumber() == 0 || (!all && !changed.contains(ds->GetNumber()))) continue;

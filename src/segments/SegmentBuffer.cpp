@@ -162,9 +162,11 @@ int SegmentBuffer::SetBufferStartAndLength(long start, long length, ConditionLis
   return Move(start, length, list);
 }
 
+// A closed segment may change before it is opened again, so its last known length does not
+// bound the window then: ReadDimension fits the window when the segment is read again.
 int SegmentBuffer::CheckWindow(long start, long length, ConditionList& list) const {
-  const bool outside = start < 0 || length < 0 || (mHasDimension && start + length > mSegmentLength);
-  if (outside) {
+  const bool bounded = mHasDimension && mSegment->GetNumber() != 0;
+  if (start < 0 || length < 0 || (bounded && start + length > mSegmentLength)) {
     return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_BAD_WINDOW",
                                 {Number(start), Number(length), Number(mSegmentLength)},
                                 SegmentStatus::kOutOfRange);

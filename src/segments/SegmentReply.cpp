@@ -43,6 +43,13 @@ bool SegmentReply::FirstText(const Dstring& reply, Dstring& out) {
   return true;
 }
 
+bool SegmentReply::FirstItemText(const Dstring& reply, Dstring& out) {
+  DataItem item;
+  if (!ItemAt(reply, 0, item) || item.GetText().empty()) return false;
+  out = Dstring(item.GetText());
+  return true;
+}
+
 bool SegmentReply::FirstNumber(const Dstring& reply, long min, long max, long& out) {
   DataItem item;
   return ItemAt(reply, 0, item) && IntegerItem(item, min, max, out);

@@ -787,7 +787,8 @@ int CSequence::Parse(const Dstring& text, ConditionList& cond) {
   const LispList& body = top[2];
   const bool empty =
       body.IsItem() && body.GetItem().GetType() == DataItemType::Word && body.GetItem().GetText().empty();
-  if (!top[1].IsItem() || !top[1].GetItem().IsText() || (!empty && !body.IsList())) {
+  Dstring label;
+  if (!CSequenceReader::Label(top[1], label) || (!empty && !body.IsList())) {
     return Refuse(cond, "GUI_SEQUENCE_SYNTAX", {Shown(text)});
   }
   if (!empty) {
@@ -796,7 +797,6 @@ int CSequence::Parse(const Dstring& text, ConditionList& cond) {
     if (!CSequenceReader::Read(body, generation, this, mContent))
       return Refuse(cond, "GUI_SEQUENCE_SYNTAX", {Shown(text)});
   }
-  const Dstring label(top[1].GetItem().GetText());
   if (!label.empty() && !mContent.blocks.empty()) mContent.blocks.front()->SetLabel(label);
   // Never empty once read; the block added here is the same as AddBlockAfter(0) adds.
   if (mContent.blocks.empty()) InsertBlock(0, true, nullptr);

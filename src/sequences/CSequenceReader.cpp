@@ -58,6 +58,16 @@ bool Segment(const LispList& e, DataItem& out) {
   return true;
 }
 
+}  // namespace
+
+bool CSequenceReader::Label(const LispList& element, Dstring& out) {
+  if (!element.IsItem() || element.GetItem().GetType() == DataItemType::Block) return false;
+  out = Dstring(element.GetItem().GetText());
+  return true;
+}
+
+namespace {
+
 class Reader {
  public:
   Reader(CSequenceReader::Generation generation, CSequence* owner, CSequence::Content& out)
@@ -150,7 +160,7 @@ bool Reader::Sequential(const LispList& e, unsigned long& level) {
   if (e.Size() < 2 || e.Size() % 2 != 0) return false;
   for (std::size_t i = 1; i < e.Size(); i += 2) {
     Dstring label;
-    if (i > 1 && !Text(e[i - 1], label)) return false;
+    if (i > 1 && !CSequenceReader::Label(e[i - 1], label)) return false;
     const std::size_t firstBlock = mOut.blocks.size();
     unsigned long inner = 0;
     if (!Element(e[i], inner)) return false;

@@ -21,6 +21,10 @@ class CSequenceReader {
   // then half built and must be cleared).
   static bool Read(const LispList& element, Generation generation, CSequence* owner, CSequence::Content& out);
 
+  // A label: any plain item, quoted or not, as its text (a start label 5 is "5"); false for a
+  // list or a block.
+  static bool Label(const LispList& element, Dstring& out);
+
   // The reader names, one per generation.
   static bool ReadBlockExpression(const LispList& element, CSequence* owner, CSequence::Content& out) {
     return Read(element, Generation::First, owner, out);

@@ -1,6 +1,7 @@
 #include "settings/ProfileValue.h"
 
 #include <cmath>
+#include <cstdlib>
 
 #include "settings/SettingsStatus.h"
 #include "support/ConditionListLoader.h"
@@ -43,9 +44,15 @@ Dstring ProfileValue::Format(long v, bool parens) { return Wrapped(Dstring::Form
 
 Dstring ProfileValue::Format(unsigned long v, bool parens) { return Wrapped(Dstring::Format("%luu", v), parens); }
 
-Dstring ProfileValue::Format(float v, bool parens) { return Wrapped(DataItem::MakeFloat(v).AsExpression(), parens); }
+Dstring ProfileValue::Format(float v, bool parens) {
+  const Dstring fixed = Dstring::Format("%f", static_cast<double>(v));
+  if (std::strtof(fixed.c_str(), nullptr) == v) return Wrapped(fixed + "f", parens);
+  return Wrapped(DataItem::MakeFloat(v).AsExpression(), parens);
+}
 
 Dstring ProfileValue::Format(double v, bool parens) {
+  const Dstring fixed = Dstring::Format("%f", v);
+  if (std::strtod(fixed.c_str(), nullptr) == v) return Wrapped(fixed + "d", parens);
   return Wrapped(DataItem::MakeDouble(v).AsExpression(), parens);
 }
 

@@ -8,9 +8,10 @@
 #include "support/LispList.h"
 
 // The typed value texts of the three profiles. A number carries its type in a one-letter
-// suffix ("12i", "7u", "1.5f", "2.5e-09d"), inside parentheses for the server profiles
-// ("(12i)"). Floats and doubles are written with the fewest digits that read back to the very
-// same value: six fixed decimals would store a delay of 1.5E-9 s as 0. A list is written as
+// suffix ("12i", "7u", "1.500000f", "2.5e-09d"), inside parentheses for the server profiles
+// ("(12i)"). Floats and doubles are written with six fixed decimals ("1.500000f") when that
+// reads back to the very same value, and otherwise with the fewest digits that do: six fixed
+// decimals would store a delay of 1.5E-9 s as 0. A list is written as
 // its expression, always in parentheses, so a list of one number reads like that number.
 class ProfileValue {
  public:

@@ -211,10 +211,10 @@ int QENSettingProfile::SetValue(const Dstring& name, const LispList& value, Cond
   return Put(name, ProfileValue::Format(value), list);
 }
 
-// The server writes the name with the handle of the client it tells: ":_H:CONF:CSET:PROF:EXPR".
+// The name as it stands, or with the handle of this client first (":_H:CONF:CSET:PROF:EXPR").
 int QENSettingProfile::MatchDirtyFlag(QenDs*, void*, const Dstring& name) {
-  std::size_t at = name.find(':', name.StartsWith(":") ? 1 : 0);
-  return at != Dstring::npos && Dstring(name.substr(at)).ToUpper() == kChangedName;
+  const Dstring upper = name.ToUpper();
+  return upper == kChangedName || upper == Dstring(":" + QenGuiInst::GetAppHandle() + kChangedName).ToUpper();
 }
 
 // Only the lock stops the pass: a profile that cannot be read must not keep the other

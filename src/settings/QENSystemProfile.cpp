@@ -34,7 +34,8 @@ int QENSystemProfile::Exists(const Dstring& name, int& exists, ConditionList& li
   DataParcel names;
   ConditionList parser;
   bool ok = ParserExpression::Parse(reply, names, parser) == 0;
-  for (const DataItem& item : names) ok = ok && item.GetType() == DataItemType::String;
+  // A name is any plain item, quoted or not, as its text.
+  for (const DataItem& item : names) ok = ok && item.GetType() != DataItemType::Block;
   if (!ok) {
     ConditionListLoader::ConditionToken(list, "GUI_SYSTEM_PROFILE_BAD_LIST", {reply}, SettingsStatus::kBadReply);
     return SettingsStatus::kBadReply;

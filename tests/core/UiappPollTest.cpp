@@ -4,6 +4,7 @@
 #include <map>
 
 #include "common/InstrumentFixture.h"
+#include "common/WireTable.h"
 #include "core/uiapp.h"
 #include "data/BerSvr.h"
 #include "data/DirtyFlagDs.h"
@@ -59,7 +60,7 @@ bool AnswerAsServer(const Dstring& cmd, Dstring& reply) {
       {":SR:_H:CGR@:MOD1:CONN1:PULS:DEL", "1"},
       {":SR:_H:CGR1:MOD@:CONN1:PULS:DEL", "1"},
       {":_H:CGR1:MOD1:TYPE?", "\"K2268A\""},
-      {"_H:CGR1:MOD1:UCAS?", "FREE"},
+      {":_H:CGR1:MOD1:UCAS?", "FREE"},
       {"_H:SGEN:GLOB:CONN?", "ON"},
       {"_H:SGEN:GLOB:CONF?", "\"PATT\",\"\",(\":CGR1:MOD1:CONN1\",\"PDAT\",\"OUTPUT_PORT\",\"K2268A\")"},
       {":_H:SGEN:GLOB:SEQ?", "(3.0,\"\",(BLOCK,0,512,0,\"\",(),PAUSE,0,0))"},
@@ -200,3 +201,48 @@ TEST_F(UiappTest, WindowsAndScriptItemsAreRegistered) {
   uiapp::RegisterVerbs();
   EXPECT_GT(mToolkit.ScriptItemCount(), 10u);
 }
+
+namespace {
+
+const std::map<Dstring, WireReply> kCoreReplies = {
+    {":QEN:INST:HAND:CRE? _RES,\"PSX\",\"RES\"", {"_RES"}},
+    {":_H:TRIG:MODE?;:_H:TRIG:MODE? CLAS", {"SEQ;0"}},
+    {":_H:BAD", {"", 1}},
+    {":_H:SYST:ERR?", {"0,\"No error\""}},
+};
+
+// The application core's command texts, to the byte.
+const WireRow kCoreRows[] = {
+    {"create handle",
+     [](ConditionList& l) {
+       Dstring handle = "_RES";
+       return uiapp::CreateAppHandle(handle, "RES", l);
+     },
+     {":QEN:INST:HAND:CRE? _RES,\"PSX\",\"RES\""}},
+    {"destroy handle", [](ConditionList& l) { return uiapp::DestroyAppHandle("_H", l); },
+     {":QEN:INST:HAND:DEST _H"}},
+    {"error queue after a failed command",
+     [](ConditionList& l) {
+       Dstring reply;
+       return QenGuiInst::Call(":_H:BAD", reply, l) == 1 ? 0 : 1;
+     },
+     {":_H:BAD", ":_H:SYST:ERR?"}},
+    {"clear the error queue",
+     [](ConditionList&) { return QenGuiInst::ClearErrorQueue(QenGuiInst::GetInstrument(), "_H"); },
+     {":_H:SYST:ERR?"}},
+    {"run", [](ConditionList& l) { return uiapp::Run(l); }, {"_H:SGEN:GLOB:INIT:CONT ON"}},
+    {"stop", [](ConditionList& l) { return uiapp::Stop(l); }, {"_H:SGEN:GLOB:INIT:CONT OFF"}},
+    {"force the sequence", [](ConditionList& l) { return uiapp::SequenceForce(l); }, {":_H:SGEN:GLOB:SEQ:FORC"}},
+    {"connect", [](ConditionList& l) { return uiapp::Connect(l); }, {"_H:SGEN:GLOB:CONN ON"}},
+    {"disconnect", [](ConditionList& l) { return uiapp::Disconnect(l); }, {"_H:SGEN:GLOB:CONN OFF"}},
+    {"trigger mode", [](ConditionList& l) { return uiapp::CheckTriggerMode(l); },
+     {":_H:TRIG:MODE?;:_H:TRIG:MODE? CLAS"}},
+};
+
+class CoreWire : public UiappTest, public testing::WithParamInterface<WireRow> {};
+
+TEST_P(CoreWire, SendsItsTextsToTheByte) { CheckWireRow(GetParam(), Inst(), kCoreReplies, mList); }
+
+INSTANTIATE_TEST_SUITE_P(Table, CoreWire, testing::ValuesIn(kCoreRows), WireRowName);
+
+}  // namespace

@@ -7,6 +7,8 @@
 #include "instrument/QenStatus.h"
 #include "support/ErrorMgr.h"
 
+#include <utility>
+
 namespace {
 
 // A control bound to a parameter: on each notification it reads the value, as a widget does.
@@ -256,4 +258,94 @@ TEST_F(DteTest, NamedRegistrationHoldsAReference) {
   EXPECT_EQ(Dte::UnregisterView(":_H:TRIG:MODE", &view, mList), 0);
   EXPECT_EQ(Dte::GetDsByName(":_H:TRIG:MODE"), nullptr);
   EXPECT_EQ(Dte::UnregisterView(":_H:TRIG:MODE", &view, mList), 1);
+}
+
+// A server that does not know the clash form still answers the value; its refusal of the
+// clash query is not the user's error.
+TEST_F(DteTest, ReadOfAServerWithoutTheClashFormTakesTheValueAlone) {
+  QenParamDs* name = Dte::AllocDsByName(":_H:NAME", 0);
+  Inst().Expect(":_H:NAME?;:_H:NAME? CLAS", "\"abc\"", 1);
+  Inst().Expect(":_H:SYST:ERR?", "-224,\"Illegal parameter value\"");
+  Inst().Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  Inst().Expect(":_H:NAME?", "\"abc\"");
+  Dstring value = "old";
+  EXPECT_EQ(name->QueryStrValue(value, mList), 0);
+  EXPECT_EQ(value, "\"abc\"");
+  EXPECT_FALSE(name->IsClashing());
+  EXPECT_FALSE(name->IsFailed());
+  EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
+  // A value read this way is cached like any other.
+  EXPECT_EQ(name->QueryStrValue(value, mList), 0);
+  Dte::FreeDs(name);
+}
+
+TEST_F(DteTest, ReadThatFailsAloneTooReportsTheReadsOwnStatus) {
+  QenParamDs* name = Dte::AllocDsByName(":_H:NAME", 0);
+  Inst().Expect(":_H:NAME?;:_H:NAME? CLAS", "", 1);
+  Inst().Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  Inst().Expect(":_H:NAME?", "", 1);
+  Inst().Expect(":_H:SYST:ERR?", "-113,\"Undefined header\"");
+  Inst().Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  Dstring value;
+  EXPECT_EQ(name->QueryStrValue(value, mList), 1);
+  ASSERT_EQ(mList.Size(), 1u) << mList.ToText();
+  EXPECT_EQ(mList[0], Condition(-113, "Undefined header"));
+  EXPECT_TRUE(name->IsFailed());
+  Inst().Expect(":_H:NAME?;:_H:NAME? CLAS", "", QenStatus::kLocked);
+  EXPECT_EQ(name->QueryStrValue(value, mList), QenStatus::kLocked) << "a lock is not retried";
+  Dte::ReleaseAllFailed();
+  Dte::FreeDs(name);
+  Dte::ReleaseAllFailed();
+}
+
+// A window that closes while it is being told must not erase a failed write.
+class ClosingView : public QenDsView {
+ public:
+  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
+    if (mSource) Dte::FreeDs(std::exchange(mSource, nullptr));
+    return 0;
+  }
+  QenParamDs* mSource = nullptr;
+};
+
+TEST_F(DteTest, LastFreeOfAFailedSourceDuringItsNotificationStillDefersTheRelease) {
+  QenParamDs* period = Dte::AllocDsByName(":_H:CGR1:PER", 0);
+  Inst().Expect(":_H:CGR1:PER 5", "", 1);
+  Inst().Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  EXPECT_EQ(period->SetStrValue("5", mList), 1);
+  ClosingView view;
+  view.mSource = period;
+  period->RegisterView(&view, mList);
+  Inst().Expect(":_H:CGR1:PER?;:_H:CGR1:PER? CLAS", "", QenStatus::kLocked);
+  EXPECT_EQ(Dte::UpdateDsByName(":_H:CGR1:PER", mList), 0);
+  ASSERT_EQ(Dte::GetDsByName(":_H:CGR1:PER"), period);
+  EXPECT_TRUE(Dte::IsFailed());
+  period->UnregisterView(&view, mList);
+  Dte::ReleaseAllFailed();
+  EXPECT_EQ(Dte::GetDsByName(":_H:CGR1:PER"), nullptr);
+  EXPECT_FALSE(Dte::IsFailed());
+}
+
+TEST_F(DteTest, LastFreeOfASoundSourceDuringItsNotificationRemovesItAfterThePass) {
+  QenParamDs* period = Dte::AllocDsByName(":_H:CGR1:PER", 0);
+  ClosingView view;
+  view.mSource = period;
+  period->RegisterView(&view, mList);
+  Inst().Expect(":_H:CGR1:PER?;:_H:CGR1:PER? CLAS", "1;0");
+  EXPECT_EQ(Dte::UpdateDsByName(":_H:CGR1:PER", mList), 0);
+  EXPECT_EQ(Dte::GetDsByName(":_H:CGR1:PER"), nullptr);
+}
+
+// A lock refuses the preliminary read of a sub-command write: -19 comes back as it is.
+TEST_F(DteTest, SubCommandWriteOfALockedInstrumentPassesTheLockUp) {
+  QenParamDs* kind = Dte::AllocDsByName(":_H:SEGM:TYPE", Dte::kSubCmd);
+  Inst().Expect(":_H:SEGM:TYPE?;:_H:SEGM:TYPE? CLAS", "", QenStatus::kLocked);
+  EXPECT_EQ(kind->SetStrValue("15", mList), QenStatus::kLocked);
+  EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
+  EXPECT_EQ(Inst().Sent().size(), 1u) << "no error-queue read";
+  Inst().Expect(":_H:SEGM:TYPE?;:_H:SEGM:TYPE? CLAS", "", QenStatus::kTimeOut);
+  Inst().Expect(":_H:SEGM:TYPE?", "", QenStatus::kTimeOut);
+  EXPECT_EQ(kind->SetStrValue("15", mList), QenStatus::kTimeOut);
+  Dte::FreeDs(kind);
+  Dte::ReleaseAllFailed();
 }

@@ -91,7 +91,7 @@ TEST_F(StateSourcesTest, DataPortOneLockFollowsTheLockableModule) {
   Inst().Expect(":SR:_H:CGR@:MOD1:CONN1:PULS:DEL", "2");
   Inst().Expect(":SR:_H:CGR2:MOD@:CONN1:PULS:DEL", "3");
   Inst().Expect(":_H:CGR2:MOD3:TYPE?", "\"K2269B\"");
-  Inst().Expect("_H:CGR2:MOD3:UCAS?", "DMUX");
+  Inst().Expect(":_H:CGR2:MOD3:UCAS?", "DMUX");
   EXPECT_EQ(lock->UpdateFromFW(mList), 0);
   EXPECT_EQ(lock->GetState(), kDataPortDemux);
   EXPECT_EQ(lock->getFoundCmdPath(), ":CGR2:MOD3:UCAS");

@@ -348,6 +348,51 @@ INSTANTIATE_TEST_SUITE_P(
                      "GUI_SEGMENTDS_BAD_REPLY"}),
     [](const auto& info) { return std::to_string(info.index); });
 
+// The coding is the first element's text, whatever the type of the item.
+TEST_F(QenSegmentDsTest, CodingsAnsweredInAnyItemFormAreTaken) {
+  QenSegmentDs* ds = OpenSegment();
+  const std::pair<const char*, const char*> cases[] = {
+      {"01", "01"}, {"\"01XZ\"", "01XZ"}, {"01LH", "01LH"}, {"012,x", "012"}, {"(\"01\")", "01"}, {"((01))", nullptr}, {"", nullptr}};
+  for (const auto& [reply, coding] : cases) {
+    Inst().Expect(Seg(":PATT:COD?"), reply);
+    Dstring read = "kept";
+    mList.Clear();
+    EXPECT_EQ(ds->GetCoding(read, mList, true), coding ? 0 : SegmentStatus::kBadReply) << reply;
+    EXPECT_EQ(read, coding ? coding : "kept") << reply;
+    EXPECT_EQ(mList.HasKey("GUI_SEGMENTDS_BAD_CODING"), coding == nullptr) << reply;
+  }
+  Inst().Expect("_H:EDIT:SEGM:PATT:CLIP:COD?", "01");
+  Dstring clip;
+  EXPECT_EQ(ds->GetClipBoardCoding(clip, mList), 0);
+  EXPECT_EQ(clip, "01");
+  ds->Release();
+}
+
+// Every type but memory data sets the generator parameters; the pattern data is left alone.
+TEST_F(QenSegmentDsTest, PropertiesOfTypeZeroSetTheGeneratorNotThePattern) {
+  QenSegmentDs* ds = OpenSegment();
+  SegmentProperties p;
+  p.type = SegmentType::kNone;
+  p.coding = "01";
+  p.length = 8;
+  p.width = 2;
+  p.polynomial = "2^7-1";
+  p.logic = PRxSLogic::kInverted;
+  p.subType = PRxSSubType::kErrored;
+  p.errorCount = 3;
+  for (const char* tail : {":TYPE MEM", ":PARA \"_Polynom\",(\"2^7-1\")", ":PARA \"_Logic\",(INVERTED)",
+                           ":PARA \"_PRxSType\",(ERRORED)", ":PARA \"_Rotating\",()", ":PARA \"_Errors\",(3)"}) {
+    Inst().Expect(Seg(tail), "");
+  }
+  EXPECT_EQ(ds->SetProperties(p, mList), 0) << mList.ToText();
+  // Stops at the first failure.
+  Inst().Expect(Seg(":TYPE MEM"), "");
+  Inst().Expect(Seg(":PARA \"_Polynom\",(\"2^7-1\")"), "", 1);
+  ExpectErrors("-224,\"Illegal parameter value\"");
+  EXPECT_EQ(ds->SetProperties(p, mList), 1);
+  ds->Release();
+}
+
 // Text that would break a command is refused with nothing sent.
 TEST_F(QenSegmentDsTest, TextThatWouldBreakACommandIsNeverSent) {
   QenSegmentDs* ds = OpenSegment();

@@ -314,3 +314,28 @@ TEST_F(SegmentBufferTest, EmptyWindowsAndSegmentsMoveNoData) {
 }
 
 }  // namespace
+
+// A closed segment's window only stores its numbers; it is fitted to the segment when the
+// dimension is read again, as the segment may have changed meanwhile.
+TEST_F(SegmentBufferTest, AClosedSegmentsWindowMovesWithoutAskingAndFitsWhenReadAgain) {
+  QenSegmentDs* ds = OpenSegment();
+  SegmentBuffer* buffer = Load(ds, "01", 100, 1, 0, 30, std::string(4, '\0'));
+  Inst().Expect(Seg(":CLOS"), "");
+  EXPECT_EQ(ds->Close(mList), 0);
+  const std::size_t sent = Inst().Sent().size();
+  EXPECT_EQ(ds->SetBufferStart(buffer, 95, mList), 0) << mList.ToText();
+  EXPECT_EQ(ds->GetBufferStart(buffer), 95);
+  EXPECT_EQ(ds->SetBufferStartAndLength(buffer, 95, 40, mList), 0) << mList.ToText();
+  EXPECT_EQ(ds->GetBufferLength(buffer), 40);
+  EXPECT_EQ(Inst().Sent().size(), sent) << "nothing is sent for a closed segment";
+  EXPECT_NE(ds->SetBufferStart(buffer, -1, mList), 0);
+  EXPECT_EQ(ds->GetBufferStart(buffer), 95);
+
+  OpenSegment();
+  ExpectDimension("01", 110, 1);
+  EXPECT_EQ(ds->ReadDimension(buffer, mList), 0) << mList.ToText();
+  EXPECT_EQ(ds->GetBufferStart(buffer), 70);
+  EXPECT_EQ(ds->GetBufferLength(buffer), 40);
+  ds->Release();
+  ds->Release();
+}

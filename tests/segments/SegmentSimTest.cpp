@@ -367,4 +367,25 @@ TEST_F(SegmentSimTest, ASixteenMegavectorSegmentOfSixtyFourTracesFits) {
   ds->Release();
 }
 
+
+// A server may answer the coding in any item form: quoted, bare, or as a number (01); the
+// segment still opens, shows and edits.
+TEST_F(SegmentSimTest, CodingsInEveryReplyFormAreTaken) {
+  QenSegmentDs* ds = Make("Work/Plain", "01", 16, 2);
+  const Dstring header = Dstring::Format(":EDIT:SEGM%u:PATT:COD?", ds->GetNumber());
+  for (const char* form : {"01", "\"\"01\"\"", "(01)", "01,"}) {
+    Dstring reply;
+    ASSERT_EQ(QenGuiInst::Call(":TEST:MALF \"" + header + "\",\"" + form + "\",0", reply, mList), 0) << form;
+    SegmentBuffer* buffer = Window(ds, 0, 16);
+    Dstring coding;
+    ASSERT_EQ(ds->GetCoding(coding, mList, true), 0) << form << mList.ToText();
+    EXPECT_EQ(coding, "01") << form;
+    const std::string written = Scribble(ds, buffer, "01", 3);
+    ASSERT_EQ(ds->Write(mList), 0) << mList.ToText();
+    EXPECT_EQ(States(ds, Window(ds, 0, 16)), written) << form;
+  }
+  ds->Close(mList);
+  QenSegmentPool::FreeDs(ds);
+}
+
 }  // namespace

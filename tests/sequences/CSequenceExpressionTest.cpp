@@ -111,6 +111,15 @@ TEST_F(ExpressionTest, VersionsTwoAndThreeAreReadBySecondGenerationAndAboveThree
   EXPECT_EQ(mList.Last().GetArgs(), std::vector<Dstring>{"3.5"});
 }
 
+// A label is any plain item: a server may send a number or a bare word unquoted.
+TEST_F(ExpressionTest, LabelsThatAreNumbersOrBareWordsAreRead) {
+  ASSERT_EQ(mSeq.fromExpression("(3.0,5,(BLOCK,0,5,0,\"\",(),PAUSE,0,0,PAUSE0,0,0))", mList), 0) << mList.ToText();
+  EXPECT_EQ(mSeq.GetLabel(1), "5");
+  ASSERT_EQ(mSeq.fromExpression("(3.0,start,(SEQ," + Blk(1) + ",2.5," + Blk(2) + "))", mList), 0) << mList.ToText();
+  EXPECT_EQ(mSeq.GetLabel(1), "start");
+  EXPECT_EQ(mSeq.GetLabel(2), "2.5");
+}
+
 class Refused : public SequenceFixture, public testing::WithParamInterface<std::string> {};
 
 TEST_P(Refused, IsASyntaxErrorAndLeavesNothing) {

@@ -319,4 +319,23 @@ TEST_F(SimModelTest, DefaultSegmentsFromTheServersConfiguration) {
   EXPECT_EQ(mOther->Text(":SGEN:GLOB:SEQ?"), InitialOf("PAUSE"));
 }
 
+
+// A server may answer the start label in any plain form; the model takes its text and writes
+// it back quoted.
+TEST_F(SimModelTest, StartLabelsInEveryReplyFormAreReadAndKept) {
+  const std::pair<const char*, const char*> forms[] = {{"5", "5"}, {"start", "start"}, {"2.5", "2.5"}, {"\"5\"", "5"}};
+  unsigned long length = 7;
+  for (const auto& [form, label] : forms) {
+    // The reply text travels as a quoted argument: its quotes doubled.
+    Dstring served = "(3.0," + Dstring(form) + "," + Block10(length) + ")";
+    for (std::size_t at = 0; (at = served.find('"', at)) != Dstring::npos; at += 2) served.insert(at, 1, '"');
+    Dstring reply;
+    ASSERT_EQ(QenGuiInst::Call(":TEST:MALF \":SGEN:GLOB:SEQ?\",\"" + served + "\"", reply, mList), 0);
+    ASSERT_EQ(Seq().ReadSequence(mList, 1), 0) << form << mList.ToText();
+    EXPECT_EQ(Seq().GetLabel(1), label) << form;
+    ASSERT_EQ(Seq().SetBlockLength(1, ++length, mList), 0) << mList.ToText();
+    EXPECT_EQ(mOther->Text(":SGEN:GLOB:SEQ?"), "(3.0,\"" + std::string(label) + "\"," + Block10(length) + ")");
+  }
+}
+
 }  // namespace

