@@ -56,6 +56,7 @@ void PollOnce() {
 
 int Screenshot(MainWin& window, const HostOptions& options) {
   window.resize(options.width, options.height);
+  window.show();
   PollOnce();
   for (const std::string& resource : options.open) {
     if (window.OpenWindow(QString::fromStdString(resource)) == nullptr) {

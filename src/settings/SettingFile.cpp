@@ -47,7 +47,10 @@ int SettingFile::Save(const Dstring& name, SettingMRU& mru, ConditionList& list)
   if (int status = Send(Dstring::Format(":%s:MMEM:SETT:SAVE \"%s\"", Handle(), name.c_str()), list)) return status;
   unsigned long cableDelay = 0;
   ConditionList ignored;
-  QENSystemProfile::GetValue("OPENSETTING_CABLEDELAY", cableDelay, ignored);
+  int exists = 0;
+  if (QENSystemProfile::Exists("OPENSETTING_CABLEDELAY", exists, ignored) == 0 && exists) {
+    QENSystemProfile::GetValue("OPENSETTING_CABLEDELAY", cableDelay, ignored);
+  }
   return RecordOpen(name, cableDelay != 0, mru, list);
 }
 
@@ -66,6 +69,9 @@ int SettingFile::Catalogue(DstringList& names, ConditionList& list) {
 Dstring SettingFile::CurrentName() {
   Dstring name;
   ConditionList ignored;
-  QENSystemProfile::GetValue("OPENSETTING_NAME", name, ignored);
+  int exists = 0;
+  if (QENSystemProfile::Exists("OPENSETTING_NAME", exists, ignored) == 0 && exists) {
+    QENSystemProfile::GetValue("OPENSETTING_NAME", name, ignored);
+  }
   return name;
 }

@@ -4,7 +4,9 @@
 #include <QCloseEvent>
 #include <QInputDialog>
 #include <QLabel>
+#include <QIcon>
 #include <QMdiArea>
+#include <QPixmap>
 #include <QMdiSubWindow>
 #include <QMenuBar>
 #include <QMessageBox>
@@ -181,6 +183,8 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
   QMdiSubWindow* sub = mArea->addSubWindow(window);
   sub->setProperty(kResourceProperty, resource);
   sub->setWindowTitle(QString::fromStdString(entry->title));
+  sub->setWindowIcon(QIcon(QPixmap(1, 1)));
+  sub->resize(window->sizeHint().expandedTo(window->size()));
   sub->setEnabled(!IsShowingLock());
   sub->show();
   Show(list);

@@ -148,8 +148,16 @@ QList<BoundControl*> BoundControl::FindAll(QWidget* root) {
   return found;
 }
 
-int BoundControl::SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list) {
-  const QList<BoundControl*> controls = FindAll(root);
+int BoundControl::SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list,
+                                   const std::function<bool(const Dstring& name)>& exists) {
+  QList<BoundControl*> controls;
+  for (BoundControl* control : FindAll(root)) {
+    if (!exists || exists(base + control->mBinding.GetDsCmdName())) {
+      controls.append(control);
+    } else if (int rc = control->SetDsBaseName("", list); rc != 0) {
+      return rc;
+    }
+  }
   // Every value the controls are about to show is read first in joined queries, so that
   // moving a panel of many controls costs a few round trips, not one or two per control.
   std::vector<QenParamDs*> held;

@@ -4,6 +4,7 @@
 #include <QList>
 #include <QPalette>
 #include <QPointer>
+#include <functional>
 #include <string_view>
 
 #include "params/DsBinding.h"
@@ -62,8 +63,10 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
   static void Report(const ConditionList& list);
   // Every bound control in `root` (and root itself).
   static QList<BoundControl*> FindAll(QWidget* root);
-  // Moves every bound control in `root` to the base name `base`.
-  static int SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list);
+  // Moves every bound control in `root` to the base name `base`; with `exists`, a control whose
+  // new name it refuses is unbound instead (the item has no such parameter).
+  static int SetDsBaseNameAll(QWidget* root, const Dstring& base, ConditionList& list,
+                              const std::function<bool(const Dstring& name)>& exists = {});
 
  protected:
   // The widget whose palette shows the failed colours (the inner editor of a compound).

@@ -60,7 +60,10 @@ int ParameditParamEdWin::Load(ConditionList& list) {
     return 1;
   }
   connect(mTree, &QTreeWidget::itemSelectionChanged, this, &ParameditParamEdWin::NfySelectionChanged);
-  return Rebuild(list);
+  if (int status = Rebuild(list)) return status;
+  // The first port is where most work starts.
+  if (!CPortInfo::GetPorts().empty()) SelectPath(CPortInfo::GetPorts().front().path);
+  return 0;
 }
 
 int ParameditParamEdWin::Rebuild(ConditionList& list) {
@@ -135,7 +138,8 @@ int ParameditParamEdWin::ShowItem(const Dstring& path, const Dstring& panelResou
   std::set<Dstring> headers;
   int status = ReadHeaders(base, headers, list);
   if (status == 0) ShowRows(panel, base, headers);
-  if (int rc = BoundControl::SetDsBaseNameAll(panel, base, list); status == 0) status = rc;
+  auto exists = [&headers](const Dstring& name) { return headers.contains(name.ToUpper()); };
+  if (int rc = BoundControl::SetDsBaseNameAll(panel, base, list, exists); status == 0) status = rc;
   ShowMemory(panel, base, headers);
   mStack->setCurrentWidget(panel);
   mBound = panel;

@@ -12,11 +12,7 @@
 #include <QtUiPlugin/QDesignerCustomWidgetCollectionInterface>
 #include <memory>
 
-#include "common/SimProcess.h"
-#include "core/uiapp.h"
-#include "instrument/QenGuiInst.h"
-#include "instrument/QenTcpInstrument.h"
-#include "params/ui/BoundControlClasses.h"
+#include "common/gui/GuiSimFixture.h"
 #include "params/ui/ParSpinBox.h"
 #include "params/ui/QenDsCBox.h"
 #include "params/ui/QenDsCBut.h"
@@ -27,51 +23,18 @@
 #include "params/ui/QenParLb.h"
 #include "params/ui/UnitLabel.h"
 #include "params/ui/UnitsDialog.h"
-#include "toolkit/Toolkit.h"
-#include "toolkit/qt/QtToolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
-// The system's font library keeps caches for the life of the process.
-extern "C" const char* __lsan_default_suppressions() { return "leak:libfontconfig.so\n"; }
-
 namespace {
-
-void EnsureApplication() {
-  static int argc = 1;
-  static char name[] = "test_params_ui";
-  static char* argv[] = {name, nullptr};
-  qputenv("QT_QPA_PLATFORM", "offscreen");
-  if (QApplication::instance() == nullptr) new QApplication(argc, argv);
-}
 
 const char* const kAmpl = ":CGR1:MOD1:CONN1:VOLT:AMPL";
 
-// The test form of every control kind, bound to a private qensim through the whole library as
-// the GUI starts it; a second client on its own connection plays another user.
-class BoundControlsTest : public testing::Test {
+// The test form of every control kind, bound to qensim through the whole library.
+class BoundControlsTest : public GuiSimFixture {
  protected:
-  static void SetUpTestSuite() {
-    EnsureApplication();
-    sSim = new SimProcess({"--test-control"});
-  }
-  static void TearDownTestSuite() {
-    delete sSim;
-    sSim = nullptr;
-  }
-
   void SetUp() override {
-    ASSERT_NE(sSim->Port(), 0);
-    Toolkit::Install(&mToolkit);
-    mToolkit.SetAlertSink([this](const Dstring& text, ToolkitPort::Icon) { mAlerts.push_back(text); });
-    BoundControlClasses::AddFactories();
-    ASSERT_EQ(uiapp::LoadDatLib(mList), 0) << mList.ToText();
-    ASSERT_EQ(uiapp::RegisterClasses(mList), 0) << mList.ToText();
-    ASSERT_EQ(uiapp::Init(mList), 0);
-    mHandle = Connect(QenGuiInst::SetInstrument, "_G");
-    mOther = std::make_unique<QenTcpInstrument>();
-    ASSERT_EQ(mOther->Connect("127.0.0.1", sSim->Port()), 0);
-    ASSERT_EQ(mOther->Call(":QEN:INST:HAND:CRE? _O,\"PSX\",\"O\"", mOtherHandle), 0);
+    GuiSimFixture::SetUp();
     // One qensim serves the suite: every test starts from the same settings.
     for (const char* reset : {":CGR1:MOD1:CONN1:VOLT:AMPL 1", ":TRIG:MODE SEQ", ":CGR1:MOD1:CONN1:OUTP OFF",
                               ":CGR1:MOD1:CONN1:VOLT:OFFS 0.5", ":CGR1:MOD1:CONN1:PULS:DEL 0", ":CGR1:FREQ 1E9",
@@ -87,36 +50,7 @@ class BoundControlsTest : public testing::Test {
   }
   void TearDown() override {
     mForm.reset();
-    Dstring ignored;
-    mOther->Call(":TEST:LOCK OFF", ignored);
-    mOther.reset();
-    uiapp::EndPolling();
-    uiapp::End(mList);
-    Toolkit::Install(nullptr);
-    WidgetClassTable::UnregisterAll();
-  }
-
-  Dstring Connect(void (*set)(std::unique_ptr<QenInstrument>), const char* proposed) {
-    auto inst = std::make_unique<QenTcpInstrument>();
-    EXPECT_EQ(inst->Connect("127.0.0.1", sSim->Port()), 0);
-    Dstring handle;
-    EXPECT_EQ(inst->Call(Dstring::Format(":QEN:INST:HAND:CRE? %s,\"PSX\",\"G\"", proposed), handle), 0);
-    set(std::move(inst));
-    QenGuiInst::SetAppHandle(handle);
-    return handle;
-  }
-  // A command of the second client under its own handle; its reply.
-  Dstring Other(const Dstring& rest) {
-    Dstring reply;
-    EXPECT_EQ(mOther->Call(":" + mOtherHandle + rest, reply), 0) << rest;
-    return reply;
-  }
-  double OtherNumber(const Dstring& header) { return std::stod(Other(header + "?")); }
-  // One tick of the poll as the alarm and then the main loop run it.
-  void Poll() {
-    uiapp::AsyncAlarmProc(nullptr);
-    if (uiapp::IsSyncAlarmPending()) uiapp::SyncTimeOut();
-    QCoreApplication::processEvents();
+    GuiSimFixture::TearDown();
   }
   template <class T>
   T* Find(const char* name) {
@@ -133,13 +67,6 @@ class BoundControlsTest : public testing::Test {
     QCoreApplication::processEvents();
   }
 
-  static inline SimProcess* sSim = nullptr;
-  QtToolkit mToolkit;
-  std::vector<Dstring> mAlerts;
-  ConditionList mList;
-  Dstring mHandle;
-  Dstring mOtherHandle;
-  std::unique_ptr<QenTcpInstrument> mOther;
   std::unique_ptr<QWidget> mForm;
 };
 
@@ -221,13 +148,12 @@ TEST_F(BoundControlsTest, ARefusedValueIsReportedAndTheServersValueShown) {
 }
 
 TEST_F(BoundControlsTest, ALockDuringACommitIsSilentAndLosesNothingOnTheServer) {
-  Dstring ignored;
-  ASSERT_EQ(mOther->Call(":TEST:LOCK ON", ignored), 0);
+  Control(":TEST:LOCK ON");
   Type(Find<QenParEd>("fieldAmpl"), "4");
   Find<QenParEd>("fieldDelay")->GetUnitLabel()->NfyPopupMenuItemSelect(88);
   QCoreApplication::processEvents();
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
-  ASSERT_EQ(mOther->Call(":TEST:LOCK OFF", ignored), 0);
+  Control(":TEST:LOCK OFF");
   EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.0);
 }
 

@@ -1,0 +1,86 @@
+#include "common/gui/GuiSimFixture.h"
+
+#include <QApplication>
+#include <string>
+
+#include "core/ErrorJournal.h"
+#include "core/uiapp.h"
+#include "instrument/AppHandle.h"
+#include "instrument/QenGuiInst.h"
+#include "params/ui/BoundControlClasses.h"
+#include "toolkit/Toolkit.h"
+#include "toolkit/qt/WidgetClassTable.h"
+
+// The system's font library keeps caches for the life of the process.
+extern "C" const char* __lsan_default_suppressions() { return "leak:libfontconfig.so\n"; }
+
+void EnsureApplication() {
+  static int argc = 1;
+  static char name[] = "qen_gui_test";
+  static char* argv[] = {name, nullptr};
+  qputenv("QT_QPA_PLATFORM", "offscreen");
+  if (QApplication::instance() == nullptr) new QApplication(argc, argv);
+}
+
+void GuiSimFixture::SetUpTestSuite() {
+  EnsureApplication();
+  sSim = new SimProcess({"--test-control"});
+}
+
+void GuiSimFixture::TearDownTestSuite() {
+  delete sSim;
+  sSim = nullptr;
+}
+
+void GuiSimFixture::SetUp() {
+  ASSERT_NE(sSim->Port(), 0);
+  Toolkit::Install(&mToolkit);
+  mToolkit.SetAlertSink([this](const Dstring& text, ToolkitPort::Icon) { mAlerts.push_back(text); });
+  BoundControlClasses::AddFactories();
+  ASSERT_EQ(uiapp::LoadDatLib(mList), 0) << mList.ToText();
+  ASSERT_EQ(uiapp::RegisterClasses(mList), 0) << mList.ToText();
+  ASSERT_EQ(uiapp::Init(mList), 0);
+  ErrorJournal::Install();
+  ErrorJournal::Clear();
+  auto inst = std::make_unique<QenTcpInstrument>();
+  ASSERT_EQ(inst->Connect("127.0.0.1", sSim->Port()), 0);
+  mHandle = "_G";
+  ASSERT_EQ(AppHandle::Create(inst.get(), mHandle, "G", mList), 0);
+  QenGuiInst::SetInstrument(std::move(inst));
+  QenGuiInst::SetAppHandle(mHandle);
+  mOther = std::make_unique<QenTcpInstrument>();
+  ASSERT_EQ(mOther->Connect("127.0.0.1", sSim->Port()), 0);
+  ASSERT_EQ(mOther->Call(":QEN:INST:HAND:CRE? _O,\"PSX\",\"O\"", mOtherHandle), 0);
+}
+
+void GuiSimFixture::TearDown() {
+  Control(":TEST:LOCK OFF");
+  mOther.reset();
+  uiapp::EndPolling();
+  ErrorJournal::Uninstall();
+  ConditionList list;
+  uiapp::End(list);
+  Toolkit::Install(nullptr);
+  WidgetClassTable::UnregisterAll();
+}
+
+Dstring GuiSimFixture::Other(const Dstring& rest) {
+  Dstring reply;
+  EXPECT_EQ(mOther->Call(":" + mOtherHandle + rest, reply), 0) << rest;
+  return reply;
+}
+
+double GuiSimFixture::OtherNumber(const Dstring& header) { return std::stod(Other(header + "?")); }
+
+void GuiSimFixture::Control(const Dstring& cmd) {
+  Dstring ignored;
+  if (mOther) {
+    EXPECT_EQ(mOther->Call(cmd, ignored), 0) << cmd;
+  }
+}
+
+void GuiSimFixture::Poll() {
+  uiapp::AsyncAlarmProc(nullptr);
+  if (uiapp::IsSyncAlarmPending()) uiapp::SyncTimeOut();
+  QCoreApplication::processEvents();
+}
