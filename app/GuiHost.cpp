@@ -83,6 +83,10 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
   QApplication::setApplicationDisplayName(QStringLiteral("qengui"));
   QtToolkit toolkit;
   Toolkit::Install(&toolkit);
+  // A picture taken without anyone watching must not wait for a message to be dismissed.
+  if (!options.screenshot.empty()) {
+    toolkit.SetAlertSink([](const Dstring& text, ToolkitPort::Icon) { std::cerr << "qengui: " << text << "\n"; });
+  }
   BoundControlClasses::AddFactories();
   ConditionList list;
   uiapp::LoadDatLib(list);

@@ -17,7 +17,9 @@ ManyParamsRig::ManyParamsRig() {
   const auto config = std::filesystem::temp_directory_path() / "qen-bench-many.qsc";
   std::ofstream out(config);
   out << "unit V -3 0 0 0.1\n";
-  for (int i = 0; i < kManyParams; ++i) out << "param :BENCH:P" << i << " double " << i << " unit=V min=-1E9 max=1E9\n";
+  for (int i = 0; i < kManyParams; ++i) {
+    out << "param :BENCH:G" << i / kGroupSize << ":P" << i % kGroupSize << " double " << i << " unit=V min=-1E9 max=1E9\n";
+  }
   out.close();
   mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--config", config.string()});
   ConditionList list;
@@ -38,4 +40,7 @@ double Seconds(std::chrono::steady_clock::time_point since) {
   return std::chrono::duration<double>(std::chrono::steady_clock::now() - since).count();
 }
 
-Dstring Header(int i) { return Dstring::Format(":%s:BENCH:P%d", QenGuiInst::GetAppHandle().c_str(), i); }
+Dstring Header(int i) {
+  return Dstring::Format(":%s:BENCH:G%d:P%d", QenGuiInst::GetAppHandle().c_str(), i / ManyParamsRig::kGroupSize,
+                         i % ManyParamsRig::kGroupSize);
+}

@@ -27,11 +27,13 @@ class CountingInstrument : public QenInstrument {
   std::unique_ptr<QenInstrument> mInner;
 };
 
-// qensim with a configuration of kManyParams numeric parameters in volts (":BENCH:P<i>"),
+// qensim with a configuration of kManyParams numeric parameters in volts, in groups of
+// kGroupSize as the parameters of a port are (":BENCH:G<g>:P<i>"),
 // and the application started against it through a counting connection. One per program.
 class ManyParamsRig {
  public:
   static constexpr int kManyParams = 1000;
+  static constexpr int kGroupSize = 50;
 
   static ManyParamsRig& Get();
   bool Ok() const;

@@ -47,7 +47,9 @@ void BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits(benchmark::State& state) {
   if (!rig.Ok()) return state.SkipWithError("qensim did not start");
   std::vector<QenParEd*> fields;
   auto bound = Panel(fields);
-  for (std::size_t i = 0; i < fields.size(); ++i) fields[i]->setProperty("DsCmdName", QStringLiteral(":BENCH:P%1").arg(i));
+  for (std::size_t i = 0; i < fields.size(); ++i) {
+    fields[i]->setProperty("DsCmdName", QStringLiteral(":BENCH:G%1:P%2").arg(i / ManyParamsRig::kGroupSize).arg(i % ManyParamsRig::kGroupSize));
+  }
   ConditionList list;
   for (QenParEd* field : fields) field->NfyInit();
   BoundControl::SetDsBaseNameAll(bound.get(), ":" + QenGuiInst::GetAppHandle(), list);
@@ -90,6 +92,54 @@ void BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits(benchmark::State& state) {
   bound.reset();
 }
 
+// A panel of one port's 50 fields moved between two ports, as the parameter editor moves it,
+// against reading the same 100 sources (values and attributes) in one joined query.
+void BM_PanelSwitchBetweenPortsVsOneJoinedRead(benchmark::State& state) {
+  App();
+  ManyParamsRig& rig = ManyParamsRig::Get();
+  if (!rig.Ok()) return state.SkipWithError("qensim did not start");
+  auto panel = std::make_unique<QWidget>();
+  auto* grid = new QGridLayout(panel.get());
+  for (int i = 0; i < ManyParamsRig::kGroupSize; ++i) {
+    auto* field = new QenParEd(panel.get());
+    field->setProperty("DsCmdName", QStringLiteral(":P%1").arg(i));
+    grid->addWidget(field, i / 5, i % 5);
+    field->NfyInit();
+  }
+  panel->show();
+  const Dstring base = ":" + QenGuiInst::GetAppHandle() + ":BENCH:G";
+  Dstring joined;
+  for (int i = 0; i < ManyParamsRig::kGroupSize; ++i) {
+    const Dstring h = Dstring::Format("%s9:P%d", base.c_str(), i);
+    joined += Dstring::Format("%s%s?;%s? CLAS;%s:ATTR?;%s:ATTR? CLAS", i ? ";" : "", h.c_str(), h.c_str(), h.c_str(), h.c_str());
+  }
+  ConditionList list;
+  double moving = 0, raw = 0;
+  long calls = 0;
+  int port = 0;
+  for (auto _ : state) {
+    const long before = rig.Calls();
+    auto t0 = std::chrono::steady_clock::now();
+    BoundControl::SetDsBaseNameAll(panel.get(), base + Dstring::Format("%d", port), list);
+    panel->repaint();
+    moving += Seconds(t0);
+    calls += rig.Calls() - before;
+    port = 1 - port;
+    t0 = std::chrono::steady_clock::now();
+    Dstring reply;
+    QenGuiInst::GetInstrument()->Call(joined, reply);
+    raw += Seconds(t0);
+  }
+  BoundControl::SetDsBaseNameAll(panel.get(), "", list);
+  const double n = static_cast<double>(state.iterations());
+  state.counters["controls"] = ManyParamsRig::kGroupSize;
+  state.counters["round_trips_per_switch"] = static_cast<double>(calls) / n;
+  state.counters["switch_ms"] = 1e3 * moving / n;
+  state.counters["joined_read_ms"] = 1e3 * raw / n;
+  state.counters["ratio"] = moving / raw;
+}
+
 }  // namespace
 
+BENCHMARK(BM_PanelSwitchBetweenPortsVsOneJoinedRead)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(1.0);
 BENCHMARK(BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(2.0);

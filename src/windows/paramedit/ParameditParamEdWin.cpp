@@ -2,6 +2,7 @@
 
 #include <QGridLayout>
 #include <QLabel>
+#include <QSplitter>
 #include <QStackedWidget>
 #include <QTreeWidget>
 
@@ -60,6 +61,11 @@ int ParameditParamEdWin::Load(ConditionList& list) {
     return 1;
   }
   connect(mTree, &QTreeWidget::itemSelectionChanged, this, &ParameditParamEdWin::NfySelectionChanged);
+  if (auto* splitter = findChild<QSplitter*>(QStringLiteral("Splitter"))) {
+    splitter->setStretchFactor(0, 0);
+    splitter->setStretchFactor(1, 1);
+    splitter->setSizes({260, 520});
+  }
   if (int status = Rebuild(list)) return status;
   // The first port is where most work starts.
   if (!CPortInfo::GetPorts().empty()) SelectPath(CPortInfo::GetPorts().front().path);
@@ -113,7 +119,9 @@ void ParameditParamEdWin::NfySelectionChanged() {
     WaitCursor wait;
     ShowItem(selected.first()->data(0, kPathRole).toString().toStdString(),
              selected.first()->data(0, kPanelRole).toString().toStdString(), list);
-    mTitle->setText(selected.first()->text(0).simplified());
+    QStringList path;
+    for (const QTreeWidgetItem* at = selected.first(); at != nullptr; at = at->parent()) path.prepend(at->text(0).simplified());
+    mTitle->setText(path.join(QStringLiteral("  \u203A  ")));
   }
   BoundControl::Report(list);
 }
@@ -123,6 +131,8 @@ QWidget* ParameditParamEdWin::Panel(const Dstring& resource, ConditionList& list
   if (found != mPanels.end()) return found->second;
   QWidget* panel = ResourceLibrary::Load(resource, mStack, list);
   if (panel != nullptr) {
+    // The labels of every group share one width, so that the fields line up down the panel.
+    for (auto* grid : panel->findChildren<QGridLayout*>()) grid->setColumnMinimumWidth(0, 130);
     mStack->addWidget(panel);
     mPanels[resource] = panel;
   }
