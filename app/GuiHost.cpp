@@ -110,6 +110,8 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
       } else {
         uiapp::StartPolling();
         window->show();
+        // Where most work starts; the frame is never empty on a first run.
+        if (QWidget* editor = window->OpenWindow(QStringLiteral("paramedit.ParamEd"))) editor->parentWidget()->showMaximized();
         uiapp::MainLoop();
         uiapp::EndPolling();
         code = 0;

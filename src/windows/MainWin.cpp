@@ -131,7 +131,7 @@ void MainWin::BuildWindowsMenu() {
   for (const WindowFactory::Entry& entry : WindowFactory::Entries()) {
     const QString resource = QString::fromStdString(entry.resource);
     QAction* action = menu->addAction(QString::fromStdString(entry.title), this, [this, resource] { OpenWindow(resource); });
-    action->setShortcut(QKeySequence(Qt::CTRL | Qt::SHIFT | (Qt::Key_0 + index++)));
+    action->setShortcut(QKeySequence(Qt::CTRL | (Qt::Key_0 + index++)));
   }
   menu->addSeparator();
   menu->addAction(QStringLiteral("&Cascade"), mArea, &QMdiArea::cascadeSubWindows);
@@ -164,6 +164,7 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
   if (QWidget* open = FindWindow(resource)) {
     mArea->setActiveSubWindow(qobject_cast<QMdiSubWindow*>(open->parentWidget()));
     open->parentWidget()->raise();
+    open->setFocus();
     return open;
   }
   const WindowFactory::Entry* entry = WindowFactory::Find(resource.toStdString());
@@ -187,6 +188,7 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
   sub->resize(window->sizeHint().expandedTo(window->size()));
   sub->setEnabled(!IsShowingLock());
   sub->show();
+  window->setFocus();
   Show(list);
   return window;
 }
