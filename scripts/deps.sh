@@ -26,8 +26,6 @@ qen_install_deps() {
 
 # The packages every build needs.
 QEN_BUILD_PACKAGES=(cmake ninja-build g++ pkg-config libgtest-dev libgmock-dev libbenchmark-dev)
-# The scripting test drives qensim through PyVISA over its raw SCPI socket.
-QEN_TEST_PACKAGES=(python3 python3-pyvisa-py)
 
 # Runs a command quietly; its output is shown only when it fails.
 qen_quiet() {
@@ -40,3 +38,6 @@ qen_quiet() {
   fi
   rm -f "$log"
 }
+
+# The scripting test drives qensim through PyVISA over its raw SCPI socket.
+QEN_TEST_PACKAGES=(python3 python3-pyvisa-py)
