@@ -118,8 +118,9 @@ TEST(DataItem, NodesStaySmallAndCopiesOwnTheirText) {
   DataItem c = a;
   a = b;
   b = std::move(c);
+  const DataItem& same = b;
+  b = same;
   c = b;
-  c = std::move(c);
   EXPECT_EQ(a.GetText(), "short");
   EXPECT_EQ(b.GetText(), std::string(100, 'x'));
   EXPECT_EQ(c, b);
