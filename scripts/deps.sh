@@ -39,3 +39,6 @@ qen_quiet() {
   fi
   rm -f "$log"
 }
+
+# The scripting test drives qensim through PyVISA over its raw SCPI socket.
+QEN_TEST_PACKAGES=(python3 python3-pyvisa-py)

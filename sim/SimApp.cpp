@@ -62,8 +62,13 @@ int SimApp::Run(const SimOptions& options) {
   SimCommandProcessor processor(std::move(params), clock, options.mTestControl, dataDir);
   SimServer server(processor, clock, options.mQuiet);
   if (server.Listen(options.mBind, options.mPort, list) != 0) return Fail(list.ToText());
+  if (options.mScpiPort >= 0 &&
+      server.ListenScpi(options.mBind, static_cast<unsigned short>(options.mScpiPort), list) != 0) {
+    return Fail(list.ToText());
+  }
   SimServer::InstallSignalHandlers();
   std::printf("qensim listening on %s\n", server.GetEndpoint().c_str());
+  if (options.mScpiPort >= 0) std::printf("qensim SCPI on %s\n", server.GetScpiEndpoint().c_str());
   std::fflush(stdout);
   return server.Run();
 }

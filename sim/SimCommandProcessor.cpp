@@ -155,6 +155,7 @@ void SimCommandProcessor::Disconnect(int connection) {
   bool phantomGone = mLockHolder == kPhantom && mPhantomArmer == connection;
   if (mLockHolder == connection || phantomGone) mLockHolder = kNobody;
   mSessions.erase(connection);
+  mQueriesPassLock.erase(connection);
 }
 
 void SimCommandProcessor::MarkAllDirty() {
@@ -185,14 +186,17 @@ SimReply SimCommandProcessor::FinishFrame(int delayMs) {
 
 bool SimCommandProcessor::IsRefused(std::string_view text) const {
   if (mLockHolder == kNobody || mLockHolder == mConnection) return false;
-  if (!mTestControl) return true;
+  const bool queriesPass = mQueriesPassLock.contains(mConnection);
+  if (!mTestControl && !queriesPass) return true;
   // Test control stays usable under a lock so that a test can always undo what it set up.
   std::vector<std::string_view> parts;
   ConditionList ignored;
   if (ParserExpression::SplitJoined(text, parts, ignored) != 0) return true;
   for (std::string_view part : parts) {
     SimCommand cmd(part);
-    if (!cmd.GetPath().empty() && cmd.GetPath()[0] != "TEST") return true;
+    if (cmd.GetPath().empty()) continue;
+    const bool passes = (mTestControl && cmd.GetPath()[0] == "TEST") || (queriesPass && cmd.IsQuery());
+    if (!passes) return true;
   }
   return false;
 }

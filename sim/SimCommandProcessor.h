@@ -30,6 +30,9 @@ class SimCommandProcessor : public SimContext {
   SimReply Execute(int connection, std::string_view text);
   // The connection has gone: its handles die and its lock is released.
   void Disconnect(int connection);
+  // Frames of only queries from this connection run while another one holds the lock (a
+  // script reads, and is told why its writes fail, instead of waiting).
+  void LetQueriesPassLock(int connection) { mQueriesPassLock.insert(connection); }
 
   // SimContext, for the command modules.
   void Reply(const Dstring& text) override { mReplies.push_back(text); }
@@ -124,6 +127,7 @@ class SimCommandProcessor : public SimContext {
   SimGlobalState mGlobal;
   std::map<Dstring, SimHandle> mHandles;
   std::map<int, SimSession> mSessions;
+  std::set<int> mQueriesPassLock;
   int mLockHolder = kNobody;
   int mPhantomArmer = kNobody;  // the connection that set up the phantom lock
 

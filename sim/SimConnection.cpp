@@ -26,7 +26,11 @@ bool SimConnection::Receive() {
     ssize_t n = recv(mFd, buf, sizeof buf, 0);
     if (n == 0) return false;
     if (n < 0) return WouldBlock();
-    mDecoder.Feed(buf, static_cast<std::size_t>(n));
+    if (mScpi) {
+      mScpiReader.Feed(buf, static_cast<std::size_t>(n));
+    } else {
+      mDecoder.Feed(buf, static_cast<std::size_t>(n));
+    }
     total += static_cast<std::size_t>(n);
   }
   return true;

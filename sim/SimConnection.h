@@ -1,11 +1,15 @@
 #pragma once
 
 #include <cstddef>
+#include <memory>
 #include <string>
 
+#include "SimScpiReader.h"
+#include "SimScpiSession.h"
 #include "instrument/Frame.h"
 
-// One client socket of the server: the frames coming in and the bytes still to go out.
+// One client socket of the server: the frames (or, on the SCPI port, the program messages)
+// coming in and the bytes still to go out.
 class SimConnection {
  public:
   SimConnection(int fd, int id) : mFd(fd), mId(id) {}
@@ -16,6 +20,10 @@ class SimConnection {
   int GetFd() const { return mFd; }
   int GetId() const { return mId; }
   FrameDecoder& Decoder() { return mDecoder; }
+  // A raw SCPI connection reads messages with its session instead of frames.
+  void SetScpi(std::unique_ptr<SimScpiSession> session) { mScpi = std::move(session); }
+  SimScpiSession* Scpi() { return mScpi.get(); }
+  SimScpiReader& ScpiReader() { return mScpiReader; }
 
   // Reads what the socket has now into the decoder; false once the peer is gone.
   bool Receive();
@@ -32,6 +40,8 @@ class SimConnection {
   int mId;
   bool mClosed = false;
   FrameDecoder mDecoder;
+  SimScpiReader mScpiReader;
+  std::unique_ptr<SimScpiSession> mScpi;
   std::string mOut;
   std::size_t mSent = 0;
 };

@@ -14,6 +14,8 @@ class SimErrorQueue {
   void Push(int code, const Dstring& text);
   // Removes and returns the oldest entry as code,"text"; 0,"No error" when empty.
   Dstring Pop();
+  bool IsEmpty() const { return mEntries.empty(); }
+  void Clear() { mEntries.clear(); }
 
  private:
   std::deque<Dstring> mEntries;

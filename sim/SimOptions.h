@@ -8,6 +8,7 @@ class SimOptions {
   static constexpr unsigned short kDefaultPort = 7130;
 
   unsigned short mPort = kDefaultPort;
+  int mScpiPort = -1;  // the raw SCPI socket; -1 for none, 0 for a free port
   Dstring mBind = "127.0.0.1";
   Dstring mConfigPath;  // empty: the configuration built into the program
   Dstring mDataDir;     // empty: the per-user default

@@ -49,16 +49,8 @@ Dstring EndpointOf(int fd) {
   return Dstring::Format("%s:%u", host, port);
 }
 
-}  // namespace
-
-SimServer::SimServer(SimCommandProcessor& processor, const SimClock& clock, bool quiet)
-    : mProcessor(processor), mClock(clock), mQuiet(quiet) {}
-
-SimServer::~SimServer() {
-  if (mListenFd >= 0) close(mListenFd);
-}
-
-int SimServer::Listen(const Dstring& address, unsigned short port, ConditionList& list) {
+// A non-blocking listening socket on the address and port; -1 with a condition otherwise.
+int OpenListener(const Dstring& address, unsigned short port, ConditionList& list) {
   addrinfo hints{};
   hints.ai_family = AF_UNSPEC;
   hints.ai_socktype = SOCK_STREAM;
@@ -66,7 +58,7 @@ int SimServer::Listen(const Dstring& address, unsigned short port, ConditionList
   addrinfo* found = nullptr;
   if (int rc = getaddrinfo(address.c_str(), std::to_string(port).c_str(), &hints, &found); rc != 0) {
     list.Add(1, Dstring::Format("cannot resolve %s: %s", address.c_str(), gai_strerror(rc)));
-    return 1;
+    return -1;
   }
   int fd = socket(found->ai_family, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
   if (fd >= 0) SetOption(fd, SOL_SOCKET, SO_REUSEADDR);
@@ -76,10 +68,32 @@ int SimServer::Listen(const Dstring& address, unsigned short port, ConditionList
   if (!ok) {
     if (fd >= 0) close(fd);
     list.Add(1, Dstring::Format("cannot listen on %s:%u: %s", address.c_str(), port, std::strerror(err)));
-    return 1;
+    return -1;
   }
-  mListenFd = fd;
-  mEndpoint = EndpointOf(fd);
+  return fd;
+}
+
+}  // namespace
+
+SimServer::SimServer(SimCommandProcessor& processor, const SimClock& clock, bool quiet)
+    : mProcessor(processor), mClock(clock), mQuiet(quiet) {}
+
+SimServer::~SimServer() {
+  if (mListenFd >= 0) close(mListenFd);
+  if (mScpiFd >= 0) close(mScpiFd);
+}
+
+int SimServer::Listen(const Dstring& address, unsigned short port, ConditionList& list) {
+  mListenFd = OpenListener(address, port, list);
+  if (mListenFd < 0) return 1;
+  mEndpoint = EndpointOf(mListenFd);
+  return 0;
+}
+
+int SimServer::ListenScpi(const Dstring& address, unsigned short port, ConditionList& list) {
+  mScpiFd = OpenListener(address, port, list);
+  if (mScpiFd < 0) return 1;
+  mScpiEndpoint = EndpointOf(mScpiFd);
   return 0;
 }
 
@@ -105,7 +119,8 @@ int SimServer::Run() {
   std::vector<pollfd> fds;
   std::vector<SimConnection*> polled;
   while (!gStop && !mDie) {
-    fds.assign(1, pollfd{mListenFd, POLLIN, 0});
+    // The SCPI listener, when there is none, is a negative descriptor that poll passes over.
+    fds.assign({pollfd{mListenFd, POLLIN, 0}, pollfd{mScpiFd, POLLIN, 0}});
     polled.clear();
     for (auto& [id, c] : mConnections) {
       short events = c->Pending() < kMaxPendingOut ? POLLIN : 0;
@@ -120,17 +135,18 @@ int SimServer::Run() {
       Log(std::strerror(errno), 0);
       return 1;
     }
-    for (std::size_t i = 0; n > 0 && i < polled.size() && !mDie; ++i) Serve(*polled[i], fds[i + 1].revents);
-    if (n > 0 && (fds[0].revents & POLLIN)) Accept();
+    for (std::size_t i = 0; n > 0 && i < polled.size() && !mDie; ++i) Serve(*polled[i], fds[i + 2].revents);
+    if (n > 0 && (fds[0].revents & POLLIN)) Accept(mListenFd, false);
+    if (n > 0 && (fds[1].revents & POLLIN)) Accept(mScpiFd, true);
     FireTimers();
     Reap();
   }
   return 0;
 }
 
-void SimServer::Accept() {
+void SimServer::Accept(int listenFd, bool scpi) {
   while (true) {
-    int fd = accept4(mListenFd, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
+    int fd = accept4(listenFd, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
     if (fd < 0) {
       if (errno != EAGAIN && errno != EWOULDBLOCK && errno != EINTR) Log(std::strerror(errno), 0);
       return;
@@ -143,14 +159,20 @@ void SimServer::Accept() {
     SetOption(fd, IPPROTO_TCP, TCP_NODELAY);
     SetOption(fd, SOL_SOCKET, SO_KEEPALIVE);
     int id = mNextId++;
-    mConnections.emplace(id, std::make_unique<SimConnection>(fd, id));
+    auto connection = std::make_unique<SimConnection>(fd, id);
+    if (scpi) connection->SetScpi(std::make_unique<SimScpiSession>(mProcessor, id));
+    mConnections.emplace(id, std::move(connection));
   }
 }
 
 void SimServer::Serve(SimConnection& connection, short events) {
   if (events & (POLLIN | POLLHUP | POLLERR)) {
     bool open = connection.Receive();
-    HandleFrames(connection);
+    if (connection.Scpi()) {
+      HandleScpi(connection);
+    } else {
+      HandleFrames(connection);
+    }
     if (!open) connection.Close();
   }
   if (!connection.IsClosed() && connection.Pending() > 0 && !connection.Flush()) connection.Close();
@@ -182,6 +204,20 @@ void SimServer::HandleFrames(SimConnection& connection) {
   if (connection.Decoder().GetError() != FrameError::None) {
     Log(FrameErrorText(connection.Decoder().GetError()), connection.GetId());
     connection.Close();
+  }
+}
+
+void SimServer::HandleScpi(SimConnection& connection) {
+  std::string message;
+  for (;;) {
+    SimScpiReader::Result result = connection.ScpiReader().Next(message);
+    if (result == SimScpiReader::Result::None) return;
+    if (result == SimScpiReader::Result::Overrun) {
+      connection.Scpi()->Overrun();
+      continue;
+    }
+    Dstring reply;
+    if (connection.Scpi()->Execute(message, reply)) connection.Queue(reply + "\n");
   }
 }
 

@@ -23,6 +23,9 @@ class SimServer {
   int Listen(const Dstring& address, unsigned short port, ConditionList& list);
   // The address and port actually bound, as "ADDR:PORT".
   const Dstring& GetEndpoint() const { return mEndpoint; }
+  // Opens the raw SCPI socket as well (newline-terminated messages); port 0 picks a free one.
+  int ListenScpi(const Dstring& address, unsigned short port, ConditionList& list);
+  const Dstring& GetScpiEndpoint() const { return mScpiEndpoint; }
 
   // SIGINT and SIGTERM make Run return; SIGPIPE is ignored. Call once, before Run.
   static void InstallSignalHandlers();
@@ -36,9 +39,10 @@ class SimServer {
     std::string bytes;
   };
 
-  void Accept();
+  void Accept(int listenFd, bool scpi);
   void Serve(SimConnection& connection, short events);
   void HandleFrames(SimConnection& connection);
+  void HandleScpi(SimConnection& connection);
   void FireTimers();
   void Reap();
   int PollTimeoutMs() const;
@@ -49,6 +53,8 @@ class SimServer {
   bool mQuiet;
   int mListenFd = -1;
   Dstring mEndpoint;
+  int mScpiFd = -1;
+  Dstring mScpiEndpoint;
   int mNextId = 1;
   bool mDie = false;
   std::map<int, std::unique_ptr<SimConnection>> mConnections;

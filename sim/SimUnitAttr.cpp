@@ -15,6 +15,15 @@ bool IsExponent(int e) {
   return e % 3 == 0 && e >= -12 && e <= 9;
 }
 
+// The reply form writes the unit between plain quotes and the step with six decimals: a unit
+// with a quote or a control character, or a step that would be written as 0, cannot be told.
+bool FitsReplyForm(const Dstring& unit, double step) {
+  for (char c : unit) {
+    if (c == '"' || static_cast<unsigned char>(c) < 0x20 || c == 0x7F) return false;
+  }
+  return Dstring::Format("%f", step) != "0.000000";
+}
+
 bool ReadInt(const DataItem& item, int& out) {
   long v = 0;
   if (!item.IsInteger() || !item.GetLong(v) || v < -100000 || v > 100000) return false;
@@ -39,7 +48,7 @@ int SimUnitAttr::Parse(std::string_view text, SimUnitAttr& out) {
       !ReadInt(items[3], attr.mCurExp) || !items[4].GetDouble(attr.mStep)) {
     return kBadType;
   }
-  if (attr.Check() != 0) return kBadValue;
+  if (attr.Check() != 0 || !FitsReplyForm(attr.mUnit, attr.mStep)) return kBadValue;
   out = attr;
   return 0;
 }

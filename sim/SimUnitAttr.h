@@ -18,7 +18,8 @@ class SimUnitAttr {
   Dstring Format() const;
   // Reads the reply form. Returns 0, -104 when the text is not five items of the right
   // types, or -224 when the values make no sense (exponents not multiples of 3 in -12..9,
-  // current exponent outside the span, a step that is not positive).
+  // current exponent outside the span, a step that is not positive) or cannot be written back
+  // in the reply form (a quote or control character in the unit, a step it writes as 0.000000).
   static int Parse(std::string_view text, SimUnitAttr& out);
   // -224 when the values make no sense, else 0.
   int Check() const;

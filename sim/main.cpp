@@ -6,12 +6,20 @@
 namespace {
 
 constexpr const char* kUsage =
-    "usage: qensim [--port N] [--bind ADDR] [--config FILE] [--data-dir DIR] [--test-control] [--quiet]\n";
+    "usage: qensim [--port N] [--scpi-port N] [--bind ADDR] [--config FILE] [--data-dir DIR] [--test-control]"
+    " [--quiet]\n";
 
 bool ReadPort(const char* text, SimOptions& options) {
   unsigned long port = 0;
   if (!Dstring(text).ToULong(port) || port > 65535) return false;
   options.mPort = static_cast<unsigned short>(port);
+  return true;
+}
+
+bool ReadScpiPort(const char* text, SimOptions& options) {
+  unsigned long port = 0;
+  if (!Dstring(text).ToULong(port) || port > 65535) return false;
+  options.mScpiPort = static_cast<int>(port);
   return true;
 }
 
@@ -41,7 +49,7 @@ struct FlagOption {
 };
 
 constexpr ValueOption kValueOptions[] = {
-    {"--port", ReadPort}, {"--bind", ReadBind}, {"--config", ReadConfig}, {"--data-dir", ReadDataDir}};
+    {"--port", ReadPort}, {"--scpi-port", ReadScpiPort}, {"--bind", ReadBind}, {"--config", ReadConfig}, {"--data-dir", ReadDataDir}};
 constexpr FlagOption kFlagOptions[] = {{"--test-control", &SimOptions::mTestControl},
                                        {"--quiet", &SimOptions::mQuiet}};
 

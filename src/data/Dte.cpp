@@ -48,22 +48,28 @@ Dstring FirstHeader(const Dstring& batch) { return Dstring(batch.substr(0, batch
 class DteRefresher {
  public:
   static void ReadValues(const std::vector<QenParamDs*>& sources) {
-    for (std::size_t start = 0; start < sources.size(); start += Dte::kRefreshBatch) {
-      std::size_t end = std::min(sources.size(), start + Dte::kRefreshBatch);
-      Dstring cmd;
-      for (std::size_t i = start; i < end; ++i) {
-        if (i > start) cmd += ';';
-        cmd += sources[i]->GetReadWithClashCmdStr();
+    for (std::size_t start = 0, end = 0; start < sources.size(); start = end) {
+      Dstring cmd = sources[start]->GetReadWithClashCmdStr();
+      for (end = start + 1; end < sources.size(); ++end) {
+        const Dstring read = sources[end]->GetReadWithClashCmdStr();
+        if (cmd.size() + 1 + read.size() > Dte::kRefreshBatchBytes) break;
+        cmd += ';' + read;
       }
-      Dstring reply;
-      ConditionList ignored;
-      if (QenGuiInst::Call(cmd, reply, ignored) != QenStatus::kOk) continue;
-      std::vector<std::string_view> parts;
-      if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != 2 * (end - start)) continue;
-      for (std::size_t i = start; i < end; ++i) {
-        const std::size_t at = 2 * (i - start);
-        sources[i]->TakeReadValue(Dstring(parts[at]), Dstring(parts[at + 1]).Trimmed() == "1");
-      }
+      ReadBatch(sources, start, end, cmd);
+    }
+  }
+
+  // Takes the replies of sources [start, end), read with the joined command `cmd`.
+  static void ReadBatch(const std::vector<QenParamDs*>& sources, std::size_t start, std::size_t end,
+                        const Dstring& cmd) {
+    Dstring reply;
+    ConditionList ignored;
+    if (QenGuiInst::Call(cmd, reply, ignored) != QenStatus::kOk) return;
+    std::vector<std::string_view> parts;
+    if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != 2 * (end - start)) return;
+    for (std::size_t i = start; i < end; ++i) {
+      const std::size_t at = 2 * (i - start);
+      sources[i]->TakeReadValue(Dstring(parts[at]), Dstring(parts[at + 1]).Trimmed() == "1");
     }
   }
 

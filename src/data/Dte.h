@@ -33,13 +33,14 @@ class QenParamDs;
 // - The run bracket ("CONT OFF" before, "CONT ON" after) is used when clashing sources were
 //   added and the run state reads "ON".
 // - A refresh of many sources (a coupled change, a dirty-flag report, Update, ResetEngine)
-//   first reads their values in ";"-joined queries of at most kRefreshBatch headers, so every
+//   first reads their values in ";"-joined queries of at most kRefreshBatchBytes, so every
 //   view then finds a valid cache. If such a query fails, its sources stay unread and each
 //   view's own query reports the error.
 class Dte {
  public:
   static constexpr unsigned kSubCmd = 1;
-  static constexpr std::size_t kRefreshBatch = 256;
+  // A quarter of the 16 MiB frame: the joined replies, longer than the queries, fit as well.
+  static constexpr std::size_t kRefreshBatchBytes = 4u << 20;
 
   // The dirty-flag source (may be null) is followed so that sources refresh when the server
   // reports their parameters changed; the error manager (may be null) is cleared after each

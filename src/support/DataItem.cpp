@@ -1,8 +1,11 @@
 #include "support/DataItem.h"
 
+#include <cassert>
 #include <charconv>
 #include <cmath>
+#include <cstring>
 #include <limits>
+#include <new>
 #include <utility>
 
 namespace {
@@ -59,39 +62,57 @@ bool ReadValue(std::string_view body, T& value) {
   return result.ec == std::errc() && result.ptr == body.data() + body.size();
 }
 
-bool ReadSigned(std::string_view body, DataItem& out) {
-  long long v = 0;
-  if (!ReadValue(body, v)) return false;
-  out = DataItem::MakeSigned(v);
-  return true;
+// A number read from a token, before it becomes an item.
+struct Number {
+  DataItemType type = DataItemType::Signed;
+  long long s = 0;
+  unsigned long long u = 0;
+  double d = 0;
+};
+
+bool ReadSigned(std::string_view body, Number& out) {
+  out.type = DataItemType::Signed;
+  return ReadValue(body, out.s);
 }
 
-bool ReadUnsigned(std::string_view body, DataItem& out) {
+bool ReadUnsigned(std::string_view body, Number& out) {
   bool negative = body[0] == '-';
-  unsigned long long v = 0;
-  if (!ReadValue(negative ? body.substr(1) : body, v) || (negative && v != 0)) return false;
-  out = DataItem::MakeUnsigned(v);
-  return true;
+  out.type = DataItemType::Unsigned;
+  return ReadValue(negative ? body.substr(1) : body, out.u) && !(negative && out.u != 0);
 }
 
 // Overflow and underflow alike are refused: the value would not read back as written.
-bool ReadDouble(std::string_view body, DataItem& out) {
-  double v = 0;
-  if (!ReadValue(body, v)) return false;
-  out = DataItem::MakeDouble(v);
-  return true;
+bool ReadDouble(std::string_view body, Number& out) {
+  out.type = DataItemType::Double;
+  return ReadValue(body, out.d);
 }
 
-bool ReadFloat(std::string_view body, DataItem& out) {
+bool ReadFloat(std::string_view body, Number& out) {
   float v = 0;
+  out.type = DataItemType::Float;
   if (!ReadValue(body, v)) return false;
-  out = DataItem::MakeFloat(v);
+  out.d = v;
   return true;
 }
 
 // Without a suffix: Signed, else Unsigned, else (too large for both) Double.
-bool ReadInteger(std::string_view body, DataItem& out) {
+bool ReadInteger(std::string_view body, Number& out) {
   return ReadSigned(body, out) || (body[0] != '-' && ReadUnsigned(body, out)) || ReadDouble(body, out);
+}
+
+bool ReadNumber(std::string_view body, char suffix, bool integral, Number& out) {
+  switch (suffix) {
+    case 'i':
+      return ReadSigned(body, out);
+    case 'u':
+      return ReadUnsigned(body, out);
+    case 'f':
+      return ReadFloat(body, out);
+    case 'd':
+      return ReadDouble(body, out);
+    default:
+      return integral ? ReadInteger(body, out) : ReadDouble(body, out);
+  }
 }
 
 // The shortest text that reads back to the same value, with the suffix naming its type.
@@ -136,11 +157,66 @@ std::string BlockText(std::string_view bytes) {
 
 }  // namespace
 
+DataItem& DataItem::operator=(const DataItem& other) {
+  if (this == &other) return *this;
+  ReleaseText();
+  mType = other.mType;
+  mQuote = other.mQuote;
+  mUnsigned = other.mUnsigned;
+  CopyTextFrom(other);
+  return *this;
+}
+
+DataItem& DataItem::operator=(DataItem&& other) noexcept {
+  if (this == &other) return *this;
+  ReleaseText();
+  mType = other.mType;
+  mQuote = other.mQuote;
+  mUnsigned = other.mUnsigned;
+  MoveTextFrom(other);
+  return *this;
+}
+
+void DataItem::ReleaseText() {
+  if (!mInline) mShared.~Shared();
+  mInline = true;
+  mSize = 0;
+}
+
+void DataItem::CopySharedFrom(const DataItem& other) {
+  new (&mShared) Shared(other.mShared);
+}
+
+void DataItem::MoveSharedFrom(DataItem& other) noexcept {
+  new (&mShared) Shared(std::move(other.mShared));
+  other.ReleaseText();
+}
+
+void DataItem::SetText(std::string_view text) {
+  if (text.size() > kInlineSize) {
+    auto owner = std::make_shared<const std::string>(text);
+    const std::string_view copy = *owner;
+    SetShared(copy, std::move(owner));
+    return;
+  }
+  ReleaseText();
+  if (!text.empty()) std::memcpy(mChars, text.data(), text.size());
+  mSize = static_cast<std::uint32_t>(text.size());
+}
+
+void DataItem::SetShared(std::string_view text, std::shared_ptr<const std::string> owner) {
+  assert(text.size() <= std::numeric_limits<std::uint32_t>::max());
+  ReleaseText();
+  new (&mShared) Shared{text.data(), std::move(owner)};
+  mInline = false;
+  mSize = static_cast<std::uint32_t>(text.size());
+}
+
 DataItem DataItem::MakeSigned(long long v) {
   DataItem item;
   item.mType = DataItemType::Signed;
   item.mSigned = v;
-  item.mText = std::to_string(v);
+  item.SetText(std::to_string(v));
   return item;
 }
 
@@ -148,7 +224,7 @@ DataItem DataItem::MakeUnsigned(unsigned long long v) {
   DataItem item;
   item.mType = DataItemType::Unsigned;
   item.mUnsigned = v;
-  item.mText = std::to_string(v) + "u";
+  item.SetText(std::to_string(v) + "u");
   return item;
 }
 
@@ -156,7 +232,7 @@ DataItem DataItem::MakeFloat(float v) {
   DataItem item;
   item.mType = DataItemType::Float;
   item.mDouble = v;
-  item.mText = NumberText(v, 'f');
+  item.SetText(NumberText(v, 'f'));
   return item;
 }
 
@@ -164,7 +240,7 @@ DataItem DataItem::MakeDouble(double v) {
   DataItem item;
   item.mType = DataItemType::Double;
   item.mDouble = v;
-  item.mText = NumberText(v, 'd');
+  item.SetText(NumberText(v, 'd'));
   return item;
 }
 
@@ -172,53 +248,65 @@ DataItem DataItem::MakeString(std::string_view text, char quote) {
   DataItem item;
   item.mType = DataItemType::String;
   item.mQuote = quote == '\'' ? '\'' : '"';
-  item.mText = text;
+  item.SetText(text);
   return item;
 }
 
 DataItem DataItem::MakeWord(std::string_view text) {
   DataItem item;
-  item.mText = text;
+  item.SetText(text);
   return item;
 }
 
 DataItem DataItem::MakeBlock(std::string_view bytes, std::shared_ptr<const std::string> owner) {
   DataItem item;
   item.mType = DataItemType::Block;
-  item.mBlock = bytes;
-  item.mOwner = std::move(owner);
+  item.SetShared(bytes, std::move(owner));
+  return item;
+}
+
+DataItem DataItem::MakeShared(DataItemType type, std::string_view text, char quote,
+                              const std::shared_ptr<const std::string>& owner) {
+  assert(type == DataItemType::String || type == DataItemType::Word);
+  DataItem item;
+  item.mType = type;
+  item.mQuote = quote == '\'' ? '\'' : '"';
+  if (text.size() > kInlineSize && owner) {
+    item.SetShared(text, owner);
+  } else {
+    item.SetText(text);
+  }
   return item;
 }
 
 bool DataItem::FromToken(std::string_view token, DataItem& out) {
+  return FromToken(token, out, nullptr);
+}
+
+bool DataItem::FromToken(std::string_view token, DataItem& out, const std::shared_ptr<const std::string>& owner) {
   std::string_view body;
   char suffix = 0;
   bool integral = true;
   if (!ScanNumber(token, body, suffix, integral)) {
-    out = MakeWord(token);
+    out = MakeShared(DataItemType::Word, token, '"', owner);
     return true;
   }
+  Number number;
+  if (!ReadNumber(body, suffix, integral, number)) return false;
   DataItem item;
-  bool ok = false;
-  switch (suffix) {
-    case 'i':
-      ok = ReadSigned(body, item);
-      break;
-    case 'u':
-      ok = ReadUnsigned(body, item);
-      break;
-    case 'f':
-      ok = ReadFloat(body, item);
-      break;
-    case 'd':
-      ok = ReadDouble(body, item);
-      break;
-    default:
-      ok = integral ? ReadInteger(body, item) : ReadDouble(body, item);
-      break;
+  item.mType = number.type;
+  if (number.type == DataItemType::Signed) {
+    item.mSigned = number.s;
+  } else if (number.type == DataItemType::Unsigned) {
+    item.mUnsigned = number.u;
+  } else {
+    item.mDouble = number.d;
   }
-  if (!ok) return false;
-  item.mText = token;
+  if (token.size() > kInlineSize && owner) {
+    item.SetShared(token, owner);
+  } else {
+    item.SetText(token);
+  }
   out = std::move(item);
   return true;
 }
@@ -294,17 +382,17 @@ bool DataItem::GetFloat(float& out) const {
 }
 
 std::string_view DataItem::GetText() const {
-  return mType == DataItemType::Block ? mBlock : std::string_view(mText);
+  return {mInline ? mChars : mShared.data, mSize};
 }
 
 Dstring DataItem::AsExpression() const {
   switch (mType) {
     case DataItemType::String:
-      return Quoted(mText, mQuote);
+      return Quoted(GetText(), mQuote);
     case DataItemType::Block:
-      return BlockText(mBlock);
+      return BlockText(GetText());
     default:
-      return mText;
+      return GetText();
   }
 }
 
@@ -319,11 +407,10 @@ bool DataItem::operator==(const DataItem& other) const {
     case DataItemType::Double:
       return mDouble == other.mDouble || (std::isnan(mDouble) && std::isnan(other.mDouble));
     case DataItemType::String:
-      return mQuote == other.mQuote && mText == other.mText;
+      return mQuote == other.mQuote && GetText() == other.GetText();
     case DataItemType::Word:
-      return mText == other.mText;
     case DataItemType::Block:
-      return mBlock == other.mBlock;
+      return GetText() == other.GetText();
   }
   return false;
 }

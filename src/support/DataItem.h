@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -8,11 +9,27 @@
 #include "support/Dstring.h"
 
 // One typed value of a reply or expression.
-enum class DataItemType { Signed, Unsigned, Float, Double, String, Word, Block };
+enum class DataItemType : std::uint8_t { Signed, Unsigned, Float, Double, String, Word, Block };
 
+// 40 bytes a node: the value and a text of up to 24 bytes are held in place, a longer text (or
+// a block) is a view into a shared string, so the items of one parsed text share one copy of it.
 class DataItem {
  public:
-  DataItem() = default;  // an empty bare word, as between two commas
+  // Texts up to this size are held in place; longer ones are shared.
+  static constexpr std::size_t kInlineSize = 24;
+
+  DataItem() noexcept {}  // an empty bare word, as between two commas
+  DataItem(const DataItem& other) : mType(other.mType), mQuote(other.mQuote), mUnsigned(other.mUnsigned) {
+    CopyTextFrom(other);
+  }
+  DataItem(DataItem&& other) noexcept : mType(other.mType), mQuote(other.mQuote), mUnsigned(other.mUnsigned) {
+    MoveTextFrom(other);
+  }
+  DataItem& operator=(const DataItem& other);
+  DataItem& operator=(DataItem&& other) noexcept;
+  ~DataItem() {
+    if (!mInline) ReleaseText();
+  }
 
   static DataItem MakeSigned(long long v);
   static DataItem MakeUnsigned(unsigned long long v);
@@ -22,9 +39,14 @@ class DataItem {
   static DataItem MakeWord(std::string_view text);
   // A block refers to `bytes`, which must stay alive as long as `owner` does.
   static DataItem MakeBlock(std::string_view bytes, std::shared_ptr<const std::string> owner);
+  // A string or word whose text lies in `owner`, which must hold it (the parser's texts).
+  static DataItem MakeShared(DataItemType type, std::string_view text, char quote,
+                             const std::shared_ptr<const std::string>& owner);
   // Reads a bare token: a number keeping the token as its text, or else a word.
   // False when the token is a number that does not fit its type ("1e400", "-1u").
   static bool FromToken(std::string_view token, DataItem& out);
+  // As above; a token longer than the in-place text refers into `owner` when it is given.
+  static bool FromToken(std::string_view token, DataItem& out, const std::shared_ptr<const std::string>& owner);
 
   DataItemType GetType() const { return mType; }
   bool IsNumber() const;
@@ -48,12 +70,47 @@ class DataItem {
   bool operator==(const DataItem& other) const;
 
  private:
+  struct Shared {
+    const char* data;
+    std::shared_ptr<const std::string> owner;
+  };
+
+  void SetText(std::string_view text);
+  void SetShared(std::string_view text, std::shared_ptr<const std::string> owner);
+  void ReleaseText();
+  // Both are only called on an item whose text is released (in place and empty).
+  void CopyTextFrom(const DataItem& other) {
+    mSize = other.mSize;
+    mInline = other.mInline;
+    if (mInline) {
+      __builtin_memcpy(mChars, other.mChars, kInlineSize);
+    } else {
+      CopySharedFrom(other);
+    }
+  }
+  void MoveTextFrom(DataItem& other) noexcept {
+    mSize = other.mSize;
+    mInline = other.mInline;
+    if (mInline) {
+      __builtin_memcpy(mChars, other.mChars, kInlineSize);
+    } else {
+      MoveSharedFrom(other);
+    }
+  }
+  void CopySharedFrom(const DataItem& other);
+  void MoveSharedFrom(DataItem& other) noexcept;
+
   DataItemType mType = DataItemType::Word;
   char mQuote = '"';
-  long long mSigned = 0;
-  unsigned long long mUnsigned = 0;
-  double mDouble = 0.0;
-  std::string mText;
-  std::string_view mBlock;
-  std::shared_ptr<const std::string> mOwner;
+  bool mInline = true;
+  std::uint32_t mSize = 0;
+  union {
+    long long mSigned = 0;
+    unsigned long long mUnsigned;
+    double mDouble;
+  };
+  union {
+    char mChars[kInlineSize] = {};
+    Shared mShared;
+  };
 };

@@ -20,13 +20,41 @@ void Write(const LispList& node, Dstring& out) {
 
 }  // namespace
 
+LispList LispList::OfElements(std::vector<LispList> elements) {
+  LispList list;
+  std::get<kList>(list.mNode) = std::move(elements);
+  return list;
+}
+
+const DataItem& LispList::GetItem() const {
+  static const DataItem kNoItem;
+  const DataItem* item = std::get_if<kItem>(&mNode);
+  return item ? *item : kNoItem;
+}
+
+const std::vector<LispList>& LispList::Children() const {
+  static const std::vector<LispList> kNoChildren;
+  const std::vector<LispList>* children = std::get_if<kList>(&mNode);
+  return children ? *children : kNoChildren;
+}
+
+std::vector<LispList>& LispList::MutableChildren() {
+  if (IsItem()) mNode.emplace<kList>();
+  return std::get<kList>(mNode);
+}
+
 void LispList::Insert(std::size_t at, LispList child) {
-  mChildren.insert(mChildren.begin() + static_cast<std::ptrdiff_t>(std::min(at, mChildren.size())),
-                   std::move(child));
+  std::vector<LispList>& children = MutableChildren();
+  children.insert(children.begin() + static_cast<std::ptrdiff_t>(std::min(at, children.size())), std::move(child));
 }
 
 void LispList::Erase(std::size_t at) {
-  if (at < mChildren.size()) mChildren.erase(mChildren.begin() + static_cast<std::ptrdiff_t>(at));
+  std::vector<LispList>* children = std::get_if<kList>(&mNode);
+  if (children && at < children->size()) children->erase(children->begin() + static_cast<std::ptrdiff_t>(at));
+}
+
+void LispList::Clear() {
+  if (std::vector<LispList>* children = std::get_if<kList>(&mNode)) children->clear();
 }
 
 Dstring LispList::AsExpression() const {
@@ -36,6 +64,5 @@ Dstring LispList::AsExpression() const {
 }
 
 bool LispList::operator==(const LispList& other) const {
-  if (mIsList != other.mIsList) return false;
-  return mIsList ? mChildren == other.mChildren : mItem == other.mItem;
+  return mNode == other.mNode;
 }

@@ -1,35 +1,39 @@
 #pragma once
 
 #include <cstddef>
+#include <variant>
 #include <vector>
 
 #include "support/DataItem.h"
 
 // The parsed list form of a reply or expression: a tree whose leaves are items
-// and whose inner nodes are parenthesised lists.
+// and whose inner nodes are parenthesised lists. A node is either, never both, so it
+// is no larger than an item.
 class LispList {
  public:
-  LispList() : mIsList(true) {}
-  explicit LispList(DataItem item) : mIsList(false), mItem(std::move(item)) {}
+  LispList() : mNode(std::in_place_index<kList>) {}
+  explicit LispList(DataItem item) : mNode(std::in_place_index<kItem>, std::move(item)) {}
+  // A list that takes over the given elements.
+  static LispList OfElements(std::vector<LispList> elements);
 
-  bool IsList() const { return mIsList; }
-  bool IsItem() const { return !mIsList; }
+  bool IsList() const { return mNode.index() == kList; }
+  bool IsItem() const { return mNode.index() == kItem; }
 
-  // Valid only for an item.
-  const DataItem& GetItem() const { return mItem; }
+  // Valid only for an item; a list answers an empty word.
+  const DataItem& GetItem() const;
 
-  // Valid only for a list.
-  std::size_t Size() const { return mChildren.size(); }
-  const LispList& operator[](std::size_t i) const { return mChildren[i]; }
-  LispList& operator[](std::size_t i) { return mChildren[i]; }
-  void Append(LispList child) { mChildren.push_back(std::move(child)); }
-  void Append(DataItem item) { mChildren.emplace_back(std::move(item)); }
+  // Valid only for a list; an item has no elements.
+  std::size_t Size() const { return Children().size(); }
+  const LispList& operator[](std::size_t i) const { return Children()[i]; }
+  LispList& operator[](std::size_t i) { return MutableChildren()[i]; }
+  void Append(LispList child) { MutableChildren().push_back(std::move(child)); }
+  void Append(DataItem item) { MutableChildren().emplace_back(std::move(item)); }
   void Insert(std::size_t at, LispList child);
   void Erase(std::size_t at);
-  void Clear() { mChildren.clear(); }
-  void Reserve(std::size_t n) { mChildren.reserve(n); }
-  auto begin() const { return mChildren.begin(); }
-  auto end() const { return mChildren.end(); }
+  void Clear();
+  void Reserve(std::size_t n) { MutableChildren().reserve(n); }
+  auto begin() const { return Children().begin(); }
+  auto end() const { return Children().end(); }
 
   // Written back as parsed: a list as "(a,b,(c))", an item as DataItem::AsExpression.
   Dstring AsExpression() const;
@@ -37,7 +41,12 @@ class LispList {
   bool operator==(const LispList& other) const;
 
  private:
-  bool mIsList;
-  DataItem mItem;
-  std::vector<LispList> mChildren;
+  static constexpr std::size_t kItem = 0;
+  static constexpr std::size_t kList = 1;
+
+  const std::vector<LispList>& Children() const;
+  // An item that is asked to hold elements becomes a list.
+  std::vector<LispList>& MutableChildren();
+
+  std::variant<DataItem, std::vector<LispList>> mNode;
 };

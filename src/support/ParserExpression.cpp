@@ -1,6 +1,8 @@
 #include "support/ParserExpression.h"
 
 #include <algorithm>
+#include <array>
+#include <cstdint>
 #include <memory>
 #include <string>
 #include <utility>
@@ -25,6 +27,20 @@ bool IsDelimiter(char c) {
 }
 bool IsDigit(char c) {
   return c >= '0' && c <= '9';
+}
+// Bytes that neither end a bare token nor start anything: the bulk of every text.
+constexpr std::array<bool, 256> kPlain = [] {
+  std::array<bool, 256> plain{};
+  plain.fill(true);
+  for (unsigned char c : std::string_view(" \t\r\n,()\"'#")) plain[c] = false;
+  return plain;
+}();
+bool IsPlain(char c) {
+  return kPlain[static_cast<unsigned char>(c)];
+}
+std::size_t SkipPlain(std::string_view text, std::size_t pos) {
+  while (pos < text.size() && IsPlain(text[pos])) ++pos;
+  return pos;
 }
 bool IsUtf8Continuation(char c) {
   return (static_cast<unsigned char>(c) & 0xC0) == 0x80;
@@ -82,8 +98,59 @@ BlockSpan ReadBlock(std::string_view text, std::size_t at) {
   return span;
 }
 
-// Reads a whole text into a tree. The elements of all open lists wait on one stack and each
-// list is built at its ')' with its exact size, so a large text costs no regrowing of lists.
+// How many elements the top level and each list (in the order of its '(') will get, read
+// ahead so that every list is built in place at its final size. Only a hint: a malformed
+// text just ends the count, and the reader checks everything itself.
+std::vector<std::uint32_t> CountElements(std::string_view text) {
+  std::vector<std::uint32_t> counts(1, 0);
+  std::vector<std::size_t> open(1, 0);
+  bool tokenStart = true;
+  for (std::size_t pos = 0; pos < text.size();) {
+    const char c = text[pos];
+    if (IsPlain(c)) {
+      counts[open.back()] |= counts[open.back()] == 0;
+      pos = SkipPlain(text, pos);
+      tokenStart = false;
+      continue;
+    }
+    if (IsBlank(c)) {
+      tokenStart = true;
+      ++pos;
+      continue;
+    }
+    if (c == ')') {
+      if (open.size() == 1) break;
+      open.pop_back();
+      tokenStart = true;
+      ++pos;
+      continue;
+    }
+    std::uint32_t& count = counts[open.back()];
+    count += (count == 0) + (c == ',');
+    if (c == '(') {
+      open.push_back(counts.size());
+      counts.push_back(0);
+    } else if (IsQuote(c)) {
+      const std::size_t close = text.find(c, pos + 1);
+      if (close == kNone) break;
+      pos = close + 1;
+      tokenStart = false;
+      continue;
+    } else if (c == '#' && tokenStart) {
+      BlockSpan span = ReadBlock(text, pos);
+      if (span.error != nullptr) break;
+      pos = span.data + span.length;
+      tokenStart = false;
+      continue;
+    }
+    tokenStart = IsDelimiter(c);
+    ++pos;
+  }
+  return counts;
+}
+
+// Reads a whole text into a tree. Each open list gathers its elements in a vector of the
+// size counted ahead, which becomes the list at its ')', so no element is moved twice.
 class Reader {
  public:
   Reader(std::string_view text, ConditionList& list) : mText(text), mList(list) {}
@@ -93,14 +160,20 @@ class Reader {
   std::size_t NestedListAt() const { return mUnwrapped ? mFirstInnerOpen : mFirstOpen; }
 
  private:
+  // An open list: where its '(' stands, and its elements so far.
   struct Open {
-    std::size_t first = 0;  // where its elements start on mPending
     std::size_t at = 0;
+    std::vector<LispList> elements;
   };
 
-  void Append(DataItem item) { mPending.emplace_back(std::move(item)); }
-  bool CurrentIsEmpty() const { return mPending.size() == mStack.back().first; }
-  LispList TakeCurrent();
+  void Append(DataItem item) { mStack.back().elements.emplace_back(std::move(item)); }
+  // The shared copy of the text that long texts and blocks refer into, made when first needed.
+  const std::shared_ptr<const std::string>& Owner();
+  // The bytes at [at, at + size) of the text; inside the shared copy when they are too long
+  // to be held in place by an item.
+  std::string_view Shared(std::size_t at, std::size_t size);
+  bool CurrentIsEmpty() const { return mStack.back().elements.empty(); }
+  std::size_t NextCount();
   bool At(char c) const { return mPos < mText.size() && mText[mPos] == c; }
   void SkipBlanks();
   int Element();
@@ -117,7 +190,8 @@ class Reader {
   ConditionList& mList;
   std::size_t mPos = 0;
   std::vector<Open> mStack;
-  std::vector<LispList> mPending;
+  std::vector<std::uint32_t> mCounts;
+  std::size_t mNextCount = 0;
   std::shared_ptr<const std::string> mOwner;
   std::size_t mFirstOpen = kNone;
   std::size_t mFirstInnerOpen = kNone;
@@ -126,7 +200,9 @@ class Reader {
 };
 
 int Reader::Read(LispList& out) {
+  mCounts = CountElements(mText);
   mStack.assign(1, Open{});
+  mStack.back().elements.reserve(NextCount());
   bool expectElement = true;
   for (;;) {
     SkipBlanks();
@@ -178,32 +254,38 @@ int Reader::OpenList() {
   if (mStack.size() == kMaxDepth && mDeepestOpen == kNone) mDeepestOpen = mPos;
   if (mFirstOpen == kNone) mFirstOpen = mPos;
   if (mStack.size() > 1 && mFirstInnerOpen == kNone) mFirstInnerOpen = mPos;
-  mStack.push_back(Open{mPending.size(), mPos});
+  mStack.push_back(Open{mPos, {}});
+  mStack.back().elements.reserve(NextCount());
   ++mPos;
   return 0;
+}
+
+std::size_t Reader::NextCount() {
+  return mNextCount < mCounts.size() ? mCounts[mNextCount++] : 0;
 }
 
 int Reader::CloseList() {
   if (mStack.size() == 1) return Fail(mPos, "')' without a matching '('");
-  LispList closed = TakeCurrent();
+  LispList closed = LispList::OfElements(std::move(mStack.back().elements));
   mStack.pop_back();
-  mPending.push_back(std::move(closed));
+  mStack.back().elements.push_back(std::move(closed));
   ++mPos;
   return 0;
 }
 
-LispList Reader::TakeCurrent() {
-  std::size_t first = mStack.back().first;
-  LispList list;
-  list.Reserve(mPending.size() - first);
-  for (std::size_t i = first; i < mPending.size(); ++i) list.Append(std::move(mPending[i]));
-  mPending.erase(mPending.begin() + static_cast<std::ptrdiff_t>(first), mPending.end());
-  return list;
+const std::shared_ptr<const std::string>& Reader::Owner() {
+  if (!mOwner) mOwner = std::make_shared<const std::string>(mText);
+  return mOwner;
+}
+
+std::string_view Reader::Shared(std::size_t at, std::size_t size) {
+  if (size <= DataItem::kInlineSize) return mText.substr(at, size);
+  return std::string_view(*Owner()).substr(at, size);
 }
 
 int Reader::Finish(LispList& out) {
   if (mStack.size() > 1) return Fail(mStack.back().at, "'(' without a matching ')'");
-  LispList top = TakeCurrent();
+  LispList top = LispList::OfElements(std::move(mStack.back().elements));
   mUnwrapped = top.Size() == 1 && top[0].IsList();
   if (!mUnwrapped && mDeepestOpen != kNone)
     return Fail(mDeepestOpen, "lists are nested deeper than 256 levels");
@@ -216,18 +298,26 @@ int Reader::Finish(LispList& out) {
   return 0;
 }
 
+// A string without doubled quotes is taken as it stands in the text; only one with them is
+// copied to undo the doubling.
 int Reader::ReadString() {
   std::size_t start = mPos;
   char quote = mText[mPos++];
+  std::size_t close = mText.find(quote, mPos);
+  if (close == kNone) return Fail(start, "the string has no closing quote");
+  if (close + 1 >= mText.size() || mText[close + 1] != quote) {
+    Append(DataItem::MakeShared(DataItemType::String, Shared(mPos, close - mPos), quote, mOwner));
+    mPos = close + 1;
+    return 0;
+  }
   std::string value;
   for (;;) {
-    std::size_t close = mText.find(quote, mPos);
-    if (close == kNone) return Fail(start, "the string has no closing quote");
     value.append(mText.substr(mPos, close - mPos));
     mPos = close + 1;
     if (!At(quote)) break;
     value += quote;
-    ++mPos;
+    close = mText.find(quote, ++mPos);
+    if (close == kNone) return Fail(start, "the string has no closing quote");
   }
   Append(DataItem::MakeString(value, quote));
   return 0;
@@ -237,21 +327,21 @@ int Reader::ReadString() {
 int Reader::ReadBlockItem() {
   BlockSpan span = ReadBlock(mText, mPos);
   if (span.error != nullptr) return Fail(span.errorAt, span.error);
-  if (!mOwner) mOwner = std::make_shared<const std::string>(mText);
-  Append(DataItem::MakeBlock(std::string_view(*mOwner).substr(span.data, span.length), mOwner));
+  const std::shared_ptr<const std::string>& owner = Owner();
+  Append(DataItem::MakeBlock(std::string_view(*owner).substr(span.data, span.length), owner));
   mPos = span.data + span.length;
   return 0;
 }
 
 int Reader::ReadBare() {
   std::size_t start = mPos;
-  std::size_t end = mText.find_first_of(",()\"'", mPos);
-  if (end == kNone) end = mText.size();
+  std::size_t end = mPos;
+  while (end < mText.size() && !IsDelimiter(mText[end]) && !IsQuote(mText[end])) end = SkipPlain(mText, end + 1);
   if (end < mText.size() && IsQuote(mText[end])) return Fail(end, "a quote inside a bare word");
   std::size_t last = end;
   while (IsBlank(mText[last - 1])) --last;
   DataItem item;
-  if (!DataItem::FromToken(mText.substr(start, last - start), item)) {
+  if (!DataItem::FromToken(Shared(start, last - start), item, mOwner)) {
     return Fail(start, "the number does not fit its type");
   }
   Append(std::move(item));

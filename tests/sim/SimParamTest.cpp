@@ -115,6 +115,11 @@ TEST_F(SimParamTest, AttributeWritesAreCheckedAndReadBackExactly) {
       {"(\"s\",0,-12,-9,0.1d)", kBadValue, kSet},
       {"(\"s\",-12,0,-9,0d)", kBadValue, kSet},
       {"(\"V\",-3,0,-3,0.1d)", kBadValue, kSet},
+      // Found by fuzzing: what the reply form cannot carry is refused, not answered broken.
+      {"(\"s\",-12,0,-9,0.0000004d)", kBadValue, kSet},
+      {"(\"s\"\"\",-12,0,-9,0.1d)", kBadValue, kSet},
+      {"(\"s\n\",-12,0,-9,0.1d)", kBadValue, kSet},
+      {"(\"s\",-12,0,-9,0.0000006d)", nullptr, "(\"s\",-12,0,-9,0.000001d)"},
   };
   for (const Case& c : cases) {
     SimReply r = Reply(std::string(":_H:CGR1:PER:ATTR ") + c.attr);

@@ -6,6 +6,7 @@
 #include <string>
 
 #include "support/DataItem.h"
+#include "support/LispList.h"
 
 namespace {
 
@@ -106,6 +107,24 @@ TEST(DataItem, EqualityComparesTypeQuoteAndValue) {
     EXPECT_FALSE(DataItem::FromToken(token, refused)) << token;
   }
   EXPECT_EQ(refused, DataItem::MakeWord("kept"));
+}
+
+// A parsed reply holds one node per value: a node larger than this makes big replies slow.
+TEST(DataItem, NodesStaySmallAndCopiesOwnTheirText) {
+  EXPECT_LE(sizeof(DataItem), 40u);
+  EXPECT_LE(sizeof(LispList), 48u);
+  DataItem a = DataItem::MakeString(std::string(100, 'x'));
+  DataItem b = DataItem::MakeWord("short");
+  DataItem c = a;
+  a = b;
+  b = std::move(c);
+  const DataItem& same = b;
+  b = same;
+  c = b;
+  EXPECT_EQ(a.GetText(), "short");
+  EXPECT_EQ(b.GetText(), std::string(100, 'x'));
+  EXPECT_EQ(c, b);
+  EXPECT_EQ(b.GetType(), DataItemType::String);
 }
 
 }  // namespace

@@ -84,7 +84,11 @@ INSTANTIATE_TEST_SUITE_P(
         ParseCase{"((1,2))", "((i1 i2))"}, ParseCase{"(1,2),3", "((i1 i2) i3)"}, ParseCase{"()", "()"},
         ParseCase{"(())", "(())"}, ParseCase{"(,)", "(w: w:)"}, ParseCase{",", "(w: w:)"},
         ParseCase{" a b , c#1 ", "(w:a b w:c#1)"},
-        ParseCase{"\"a\"\"b\",'it''s',\"a'b\",  \"x\"  ", "(\"a\"b 'it's \"a'b \"x)"}));
+        ParseCase{"\"a\"\"b\",'it''s',\"a'b\",  \"x\"  ", "(\"a\"b 'it's \"a'b \"x)"},
+        // Texts longer than an item holds in place, with and without doubled quotes.
+        ParseCase{"(\"a string of exactly 25 b\",WORD_LONGER_THAN_24_BYTES_,\"x\"\"quoted\"\" in a long text\")",
+                  "(\"a string of exactly 25 b w:WORD_LONGER_THAN_24_BYTES_ \"x\"quoted\" in a long text)"},
+        ParseCase{"1.0000000000000000000000000E3,000000000000000000000000042i", "(d1000 i42)"}));
 
 struct FailCase {
   std::string text;
@@ -143,6 +147,27 @@ TEST(ParserExpression, BlocksShareOneCopyOfTheText) {
   std::string_view second = tree[2].GetItem().GetText();
   EXPECT_EQ(second.data() - first.data(), 9);
   EXPECT_EQ(std::string(first) + std::string(second), "abcde");
+}
+
+// Items copied out of a tree keep their text when the tree and the parsed text are gone.
+TEST(ParserExpression, ItemsOutliveTheTreeAndTheText) {
+  ConditionList list;
+  std::vector<DataItem> kept;
+  {
+    std::string text = "(\"short\",\"a segment name of forty bytes, quoted.\",#230abcdefghijklmnopqrstuvwxyz0123)";
+    LispList tree;
+    ASSERT_EQ(ParserExpression::Parse(text, tree, list), 0);
+    for (const LispList& child : tree) kept.push_back(child.GetItem());
+    text.assign(text.size(), '?');
+  }
+  ASSERT_EQ(kept.size(), 3u);
+  EXPECT_EQ(kept[0].GetText(), "short");
+  EXPECT_EQ(kept[1].GetText(), "a segment name of forty bytes, quoted.");
+  EXPECT_EQ(kept[2].GetText(), "abcdefghijklmnopqrstuvwxyz0123");
+  DataItem moved = std::move(kept[1]);
+  kept[1] = kept[0];
+  EXPECT_EQ(moved.AsExpression(), "\"a segment name of forty bytes, quoted.\"");
+  EXPECT_EQ(kept[1], kept[0]);
 }
 
 TEST(ParserExpression, WritesNumbersAsReadAndBlocksCanonically) {

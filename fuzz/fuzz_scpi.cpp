@@ -1,0 +1,94 @@
+// Arbitrary bytes into qensim's raw SCPI socket, without the socket: the line and block
+// reader, fed in pieces whose sizes the first byte chooses, and every message it cuts run by
+// a SCPI session on a fresh instrument.
+//  - The messages do not depend on how the bytes were cut into pieces.
+//  - A message never holds a line feed outside a block, never exceeds the limit, and the
+//    messages with their terminators never add up to more than the input.
+//  - A session answers every message without crashing, hanging or growing without bound.
+// The instrument is made anew every kRenew inputs and the session at every input (segments
+// stay in memory while qensim runs, so memory must not pile up over many inputs).
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "SimClock.h"
+#include "SimCommandProcessor.h"
+#include "SimConfigLoader.h"
+#include "SimScpiReader.h"
+#include "SimScpiSession.h"
+
+extern const char* const kSimDefaultConfigText;
+
+namespace {
+
+constexpr int kRenew = 64;
+
+void Check(bool ok) {
+  if (!ok) __builtin_trap();
+}
+
+class FixedClock : public SimClock {
+ public:
+  long long NowMs() const override { return 1000; }
+};
+
+const SimParamTable& Configured() {
+  static const SimParamTable table = [] {
+    SimParamTable t;
+    ConditionList list;
+    Check(SimConfigLoader::Load(kSimDefaultConfigText, t, list) == 0);
+    return t;
+  }();
+  return table;
+}
+
+// The messages ("\x01" marks an overrun) of the bytes fed `piece` at a time.
+std::vector<std::string> Cut(const std::string& bytes, std::size_t piece) {
+  SimScpiReader reader;
+  std::vector<std::string> out;
+  std::string message;
+  for (std::size_t at = 0; at < bytes.size(); at += piece) {
+    reader.Feed(bytes.data() + at, std::min(piece, bytes.size() - at));
+    for (SimScpiReader::Result r; (r = reader.Next(message)) != SimScpiReader::Result::None;) {
+      out.push_back(r == SimScpiReader::Result::Overrun ? std::string("\x01") : message);
+    }
+  }
+  return out;
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+  if (size == 0) return 0;
+  const std::string bytes(reinterpret_cast<const char*>(data) + 1, size - 1);
+  const std::vector<std::string> whole = Cut(bytes, bytes.size() + 1);
+  Check(Cut(bytes, 1 + data[0] % 16) == whole);
+  std::size_t total = 0;
+  for (const std::string& m : whole) {
+    Check(m.size() <= SimScpiReader::kMaxMessage);
+    total += m.size() + 1;
+  }
+  Check(total <= bytes.size() + whole.size());
+
+  static const FixedClock clock;
+  static std::unique_ptr<SimCommandProcessor> sim;
+  static int runs = 0;
+  if (runs++ % kRenew == 0) sim = std::make_unique<SimCommandProcessor>(Configured(), clock, false);
+  sim->Disconnect(1);
+  SimScpiSession session(*sim, 1);
+  for (const std::string& m : whole) {
+    Dstring reply;
+    if (m == "\x01") {
+      session.Overrun();
+    } else {
+      session.Execute(m, reply);
+    }
+  }
+  // Whatever ran, the queue reads out oldest first and ends in "No error".
+  Dstring reply;
+  for (std::size_t i = 0; i <= SimErrorQueue::kCapacity; ++i) session.Execute("SYST:ERR?", reply);
+  Check(session.Execute("SYST:ERR?", reply) && reply == "0,\"No error\"");
+  return 0;
+}
