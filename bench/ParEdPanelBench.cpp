@@ -28,15 +28,16 @@ QApplication& App() {
   return app;
 }
 
+// `count` widgets in a grid of kColumns, shown offscreen.
 template <class T>
-std::unique_ptr<QWidget> Panel(std::vector<T*>& widgets) {
+std::unique_ptr<QWidget> Panel(std::vector<T*>& widgets, int count = ManyParamsRig::kManyParams) {
   auto panel = std::make_unique<QWidget>();
   auto* grid = new QGridLayout(panel.get());
-  for (int i = 0; i < ManyParamsRig::kManyParams; ++i) {
+  for (int i = 0; i < count; ++i) {
     widgets.push_back(new T(panel.get()));
     grid->addWidget(widgets.back(), i / kColumns, i % kColumns);
   }
-  panel->resize(kColumns * 140, ManyParamsRig::kManyParams / kColumns * 26);
+  panel->resize(kColumns * 140, (count + kColumns - 1) / kColumns * 26);
   panel->show();
   return panel;
 }
@@ -98,15 +99,12 @@ void BM_PanelSwitchBetweenPortsVsOneJoinedRead(benchmark::State& state) {
   App();
   ManyParamsRig& rig = ManyParamsRig::Get();
   if (!rig.Ok()) return state.SkipWithError("qensim did not start");
-  auto panel = std::make_unique<QWidget>();
-  auto* grid = new QGridLayout(panel.get());
-  for (int i = 0; i < ManyParamsRig::kGroupSize; ++i) {
-    auto* field = new QenParEd(panel.get());
-    field->setProperty("DsCmdName", QStringLiteral(":P%1").arg(i));
-    grid->addWidget(field, i / 5, i % 5);
-    field->NfyInit();
+  std::vector<QenParEd*> fields;
+  auto panel = Panel(fields, ManyParamsRig::kGroupSize);
+  for (std::size_t i = 0; i < fields.size(); ++i) {
+    fields[i]->setProperty("DsCmdName", QStringLiteral(":P%1").arg(i));
+    fields[i]->NfyInit();
   }
-  panel->show();
   const Dstring base = ":" + QenGuiInst::GetAppHandle() + ":BENCH:G";
   Dstring joined;
   for (int i = 0; i < ManyParamsRig::kGroupSize; ++i) {

@@ -9,7 +9,10 @@
 #include <unistd.h>
 
 #include "common/SimProcess.h"
+#include <algorithm>
+
 #include "instrument/AppHandle.h"
+#include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
 #include "instrument/QenTcpInstrument.h"
 
@@ -219,4 +222,17 @@ TEST_F(QenTcpInstrumentSim, BlockOfAnyBytesTravelsUnchanged) {
   int status = mClient.Call(Dstring(":TEST:ECHO #599999" + bytes), reply);
   ASSERT_EQ(status, 0);
   EXPECT_EQ(reply, "#599999" + bytes);
+}
+
+TEST(ServerDiscovery, FindsTheServersThatAnswerInTheOrderAsked) {
+  SimProcess sim;
+  ASSERT_NE(sim.Port(), 0);
+  DstringList found;
+  // 127.0.0.2 is loopback too, and nothing listens there.
+  QenGuiInst::ListServerHostsAtPort(found, sim.Port(), 300, {"127.0.0.2", "127.0.0.1", "localhost"});
+  EXPECT_EQ(found, DstringList({"127.0.0.1", "localhost"}));
+  const DstringList candidates = QenGuiInst::CandidateHosts({"lab-pg", "127.0.0.1", " "});
+  EXPECT_EQ(candidates.front(), "127.0.0.1");
+  EXPECT_TRUE(candidates.Contains("lab-pg"));
+  EXPECT_EQ(std::count(candidates.begin(), candidates.end(), "127.0.0.1"), 1);
 }
