@@ -18,6 +18,7 @@
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/QtToolkit.h"
 #include "windows/ConnectDialog.h"
+#include "windows/GridClasses.h"
 #include "windows/MainWin.h"
 
 namespace {
@@ -88,6 +89,7 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
     toolkit.SetAlertSink([](const Dstring& text, ToolkitPort::Icon) { std::cerr << "qengui: " << text << "\n"; });
   }
   BoundControlClasses::AddFactories();
+  GridClasses::AddFactories();
   ConditionList list;
   uiapp::LoadDatLib(list);
   uiapp::RegisterClasses(list);

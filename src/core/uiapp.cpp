@@ -142,8 +142,9 @@ int uiapp::End(ConditionList& list) {
 int uiapp::LoadDatLib(ConditionList& list) { return Toolkit::Get().LoadResourceLibrary("uiapp", list); }
 
 const std::vector<Dstring>& uiapp::ClassNames() {
-  static const std::vector<Dstring> kClasses = {"UnitEd",   "LbUnitEd",   "QenDsCBut", "QenDsRBut", "QenDsCBox",
-                                                "QenDsSlidr", "QenDsSTEd", "QenParEd",  "QenParLb"};
+  static const std::vector<Dstring> kClasses = {"UnitEd",      "LbUnitEd",  "QenDsCBut", "QenDsRBut", "QenDsCBox",
+                                                "QenDsSlidr",  "QenDsSTEd", "QenParEd",  "QenParLb",  "GridManager",
+                                                "AddrDisp",    "DigitDisp", "NameDisp"};
   return kClasses;
 }
 

@@ -25,3 +25,10 @@ enum class MirrorMode : int { kTrace = 0, kVector = 1 };
 enum class Direction : int { kLsbFirst = 0, kMsbFirst = 1 };
 // Deleting: the states go and the rest closes up, or they are set to the first state.
 enum class DeleteMode : int { kNormal = 0, kClear = 1 };
+
+// How a grid writes vector addresses.
+enum class AddrFormat : int { kDecimal = 0, kHex = 1 };
+// How a grid shows a row's data: digits of the row's data format, or one state per trace.
+enum class DigitDispMode : int { kDigits = 0, kStates = 1 };
+// Where an error search goes from the cursor.
+enum class ERR_DIR : int { kPrevious = 0, kNext = 1, kFirst = 2 };

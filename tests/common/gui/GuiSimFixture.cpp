@@ -8,6 +8,7 @@
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "params/ui/BoundControlClasses.h"
+#include "windows/GridClasses.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
@@ -37,6 +38,7 @@ void GuiSimFixture::SetUp() {
   Toolkit::Install(&mToolkit);
   mToolkit.SetAlertSink([this](const Dstring& text, ToolkitPort::Icon) { mAlerts.push_back(text); });
   BoundControlClasses::AddFactories();
+  GridClasses::AddFactories();
   ASSERT_EQ(uiapp::LoadDatLib(mList), 0) << mList.ToText();
   ASSERT_EQ(uiapp::RegisterClasses(mList), 0) << mList.ToText();
   ASSERT_EQ(uiapp::Init(mList), 0);

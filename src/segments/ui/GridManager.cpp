@@ -1,0 +1,308 @@
+#include "segments/ui/GridManager.h"
+
+#include <algorithm>
+#include <limits>
+
+#include <QChildEvent>
+#include <QPainter>
+#include <QScrollBar>
+#include <QStyle>
+#include <QWheelEvent>
+
+#include "segments/ui/AddrDisp.h"
+#include "segments/ui/DigitDisp.h"
+#include "segments/ui/NameDisp.h"
+#include "toolkit/qt/ResourceLibrary.h"
+#include "toolkit/qt/WidgetClassTable.h"
+
+namespace {
+
+std::int16_t Field(int value) {
+  return static_cast<std::int16_t>(std::clamp<int>(value, std::numeric_limits<std::int16_t>::min(),
+                                                   std::numeric_limits<std::int16_t>::max()));
+}
+
+const char* const kDispClasses[] = {"AddrDisp", "DigitDisp", "NameDisp"};
+
+}  // namespace
+
+GridManager::GridManager(QWidget* parent) : QWidget(parent), mScroll(new QScrollBar(Qt::Vertical, this)) {
+  setFocusPolicy(Qt::StrongFocus);
+  setAutoFillBackground(true);
+  connect(mScroll, &QScrollBar::valueChanged, this, [this](int value) {
+    if (value != DispFirstLine()) {
+      DispScrollTo(value);
+      for (GridDisp* disp : Disps()) disp->update();
+    }
+  });
+}
+
+GridManager::GridManager(const ConstructionRecord& record) : GridManager(record.parent) {
+  setObjectName(QString::fromStdString(record.className));
+}
+
+GridManager::GridManager(const Dstring& resource, const Dstring& library, ConditionList& list, QWidget* parent)
+    : GridManager(parent) {
+  if (ResourceLibrary::Check(library, list) != 0) return;
+  QWidget* form = ResourceLibrary::Load(resource, this, list);
+  if (form == nullptr) return;
+  for (const Dstring& name : GetOiFields()) {
+    const QVariant value = form->property(name.c_str());
+    if (value.isValid()) setProperty(name.c_str(), value);
+  }
+  for (GridDisp* disp : form->findChildren<GridDisp*>()) disp->setParent(this);
+  delete form;
+  Refresh();
+}
+
+GridManager::~GridManager() = default;
+
+void GridManager::CppRegister() {
+  WidgetClassTable::AddFactory(Class(), [](QWidget* parent) { return OiNew({Class(), parent}); });
+  WidgetClassTable::AddFactory("AddrDisp", [](QWidget* parent) -> QWidget* { return new AddrDisp(parent); });
+  WidgetClassTable::AddFactory("DigitDisp", [](QWidget* parent) -> QWidget* { return new DigitDisp(parent); });
+  WidgetClassTable::AddFactory("NameDisp", [](QWidget* parent) -> QWidget* { return new NameDisp(parent); });
+}
+
+int GridManager::Register(ConditionList& list) {
+  CppRegister();
+  int status = WidgetClassTable::Register(Class(), list);
+  for (const char* name : kDispClasses) {
+    if (int rc = WidgetClassTable::Register(name, list); rc != 0 && status == 0) status = rc;
+  }
+  return status;
+}
+
+QWidget* GridManager::OiNew(const ConstructionRecord& record) { return new GridManager(record); }
+
+void GridManager::OiDelete(QWidget* object) { delete object; }
+
+const std::vector<Dstring>& GridManager::GetOiFields() {
+  static const std::vector<Dstring> kFields = {"dx", "dy", "offx", "offy"};
+  return kFields;
+}
+
+void GridManager::SetDX(int value) {
+  mFields.dx = Field(value);
+  Refresh();
+}
+void GridManager::SetDY(int value) {
+  mFields.dy = Field(value);
+  Refresh();
+}
+void GridManager::SetOffX(int value) {
+  mFields.offx = Field(value);
+  Refresh();
+}
+void GridManager::SetOffY(int value) {
+  mFields.offy = Field(value);
+  Refresh();
+}
+
+void GridManager::SetFields(const GridFields& fields) {
+  mFields = fields;
+  Refresh();
+}
+
+std::vector<GridDisp*> GridManager::Disps() const {
+  std::vector<GridDisp*> disps;
+  for (QObject* child : children()) {
+    if (auto* disp = qobject_cast<GridDisp*>(child)) disps.push_back(disp);
+  }
+  return disps;
+}
+
+long GridManager::VisibleLines() const {
+  if (mFields.dy <= 0) return 0;
+  return std::max(0, (height() - mFields.offy) / mFields.dy);
+}
+
+void GridManager::Refresh() {
+  LayoutDisps();
+  SyncScrollBar();
+  for (GridDisp* disp : Disps()) disp->update();
+}
+
+void GridManager::ShowLine(long line) {
+  const long first = DispFirstLine();
+  const long shown = std::max(1L, VisibleLines());
+  if (line < first) {
+    DispScrollTo(line);
+  } else if (line >= first + shown) {
+    DispScrollTo(line - shown + 1);
+  } else {
+    return;
+  }
+  Refresh();
+}
+
+void GridManager::LayoutDisps() {
+  const std::vector<GridDisp*> disps = Disps();
+  const int barWidth = mScroll->sizeHint().width();
+  const int right = width() - barWidth;
+  int fixed = 0;
+  int stretching = 0;
+  for (const GridDisp* disp : disps) {
+    if (disp->Cells() > 0) {
+      fixed += disp->Cells() * mFields.dx;
+    } else {
+      ++stretching;
+    }
+  }
+  const int share = stretching > 0 ? std::max(0, right - mFields.offx - fixed) / stretching : 0;
+  int x = mFields.offx;
+  for (GridDisp* disp : disps) {
+    const int w = disp->Cells() > 0 ? disp->Cells() * mFields.dx : share;
+    disp->setGeometry(x, 0, std::max(0, std::min(w, right - x)), height());
+    x += w;
+  }
+  mScroll->setGeometry(right, mFields.offy, barWidth, std::max(0, height() - mFields.offy));
+}
+
+void GridManager::SyncScrollBar() {
+  const long shown = VisibleLines();
+  const long last = std::max(0L, DispLineCount() - shown);
+  const QSignalBlocker block(mScroll);
+  mScroll->setRange(0, static_cast<int>(std::min<long>(last, std::numeric_limits<int>::max())));
+  mScroll->setPageStep(static_cast<int>(std::max(1L, shown)));
+  mScroll->setValue(static_cast<int>(std::min<long>(DispFirstLine(), std::numeric_limits<int>::max())));
+}
+
+void GridManager::resizeEvent(QResizeEvent* event) {
+  QWidget::resizeEvent(event);
+  Refresh();
+}
+
+void GridManager::wheelEvent(QWheelEvent* event) {
+  const int steps = event->angleDelta().y() / 120;
+  if (steps == 0) return;
+  const long last = std::max(0L, DispLineCount() - VisibleLines());
+  DispScrollTo(std::clamp(DispFirstLine() - 3L * steps, 0L, last));
+  Refresh();
+  event->accept();
+}
+
+void GridManager::childEvent(QChildEvent* event) {
+  QWidget::childEvent(event);
+  // A column is known as one only once it is polished; one that leaves frees its width.
+  if (event->type() == QEvent::ChildPolished || event->type() == QEvent::ChildRemoved) LayoutDisps();
+}
+
+void GridManager::paintEvent(QPaintEvent*) {
+  QPainter painter(this);
+  painter.fillRect(rect(), palette().window());
+}
+
+void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const {
+  const QPalette& pal = disp.palette();
+  const int dx = mFields.dx;
+  const int dy = mFields.dy;
+  painter.fillRect(area, pal.base());
+  if (dx <= 0 || dy <= 0) return;
+  const int cells = disp.CellsShown();
+  const int top = mFields.offy;
+  if (area.top() < top) {
+    painter.fillRect(QRect(0, 0, disp.width(), top), pal.window());
+    painter.setPen(pal.windowText().color());
+    for (int c = 0; c < cells; ++c) {
+      painter.drawText(QRect(c * dx, 0, dx, top), Qt::AlignCenter, DispHeader(disp, c));
+    }
+  }
+  const long first = DispFirstLine();
+  const long count = DispLineCount();
+  const int from = std::max(0, (area.top() - top) / dy);
+  const int to = std::max(0, (area.bottom() - top) / dy);
+  const QColor text = pal.text().color();
+  const QColor dimText = pal.color(QPalette::Disabled, QPalette::Text);
+  const QColor alert(0xc0, 0x10, 0x10);
+  for (int i = from; i <= to; ++i) {
+    const long line = first + i;
+    if (line >= count) break;
+    const int y = top + i * dy;
+    for (int c = 0; c < cells; ++c) {
+      const GridCell cell = DispCell(disp, line, c);
+      const QRect box(c * dx, y, dx, dy);
+      if (cell.cursor) {
+        painter.fillRect(box, pal.highlight());
+      } else if (cell.selected) {
+        painter.fillRect(box, pal.highlight().color().lighter(170));
+      }
+      if (cell.text.isEmpty()) continue;
+      painter.setPen(cell.cursor ? pal.highlightedText().color() : cell.marked ? alert : cell.dim ? dimText : text);
+      painter.drawText(box, Qt::AlignCenter, cell.text);
+    }
+  }
+}
+
+unsigned GridManager::NfyGetMenuItemState(std::uint16_t) { return 0; }
+int GridManager::NfyItemHit(std::uint16_t) { return 0; }
+bool GridManager::AutoMoveCursor() { return true; }
+int GridManager::GetDYMultiplier(long) { return 1; }
+void GridManager::GetPortMux(long, double& mux) { mux = 1.0; }
+void GridManager::GetNumDigits(long, long& count) { count = 0; }
+void GridManager::GetNumVectors(long, long& count) { count = 0; }
+long GridManager::GetNumDispDigits(long) { return 0; }
+long GridManager::GetNumDispVectors(long) { return 0; }
+int GridManager::GetAddrFormat() { return -1; }
+int GridManager::GetDataFormat(long) { return -1; }
+int GridManager::GetDispMode() { return -1; }
+int GridManager::SetDataFormat(long, DataFormat, ConditionList&) { return 0; }
+int GridManager::SetAddrFormat(AddrFormat, ConditionList&) { return 0; }
+int GridManager::SetDispMode(DigitDispMode, ConditionList&) { return 0; }
+int GridManager::GetSegmentProperties(long, long, SegmentProperties&, ConditionList&) { return 0; }
+int GridManager::HookOn(long, long, const Dstring&, ConditionList&) { return 0; }
+int GridManager::NfyWidthChanged(long, long, ConditionList&) { return 0; }
+int GridManager::NfyLengthChanged(long, long, ConditionList&) { return 0; }
+int GridManager::NfySetSegmentName(long, long, const Dstring&, ConditionList&) { return 0; }
+int GridManager::GetSegmentName(long, long, Dstring& name, ConditionList&) {
+  name = "";
+  return 0;
+}
+int GridManager::SaveSegment(long, long, ConditionList&) { return 0; }
+int GridManager::SaveSegmentAs(long, long, const Dstring&, ConditionList&) { return 0; }
+bool GridManager::IsOk(long, long) { return true; }
+int GridManager::SetLabelsEnabled(bool) { return 0; }
+bool GridManager::AreLabelsEnabled() { return false; }
+int GridManager::SetVectorOffset(long, long, ConditionList&) { return 0; }
+int GridManager::SetDigitOffset(long, long, ConditionList&) { return 0; }
+void GridManager::GetVectorOffset(long, long& value) { value = 0; }
+void GridManager::GetDigitOffset(long, long& value) { value = 0; }
+void GridManager::GetPrevVectorOffset(long, long& value) { value = 0; }
+void GridManager::GetPrevDigitOffset(long, long& value) { value = 0; }
+int GridManager::ResetSelection(ConditionList&) { return 0; }
+int GridManager::SetSelection(long, long, long, long, long, long, ConditionList&) { return 0; }
+int GridManager::SetVectorSelection(long, long, long, ConditionList&) { return 0; }
+int GridManager::SetDigitSelection(long, long, long, ConditionList&) { return 0; }
+int GridManager::SetSegmentSelection(long, long, ConditionList&) { return 0; }
+int GridManager::FindPattern(FindDirection, VectorTrace, ConditionList&) { return 0; }
+int GridManager::ModifyFill(ConditionList&) { return 0; }
+int GridManager::ModifyInvert(ConditionList&) { return 0; }
+int GridManager::ModifyMirror(MirrorMode, ConditionList&) { return 0; }
+int GridManager::ModifyCopy(ConditionList&) { return 0; }
+int GridManager::ModifyPaste(ConditionList&) { return 0; }
+int GridManager::ModifyInsert(VectorTrace, InsertMode, long, ConditionList&) { return 0; }
+int GridManager::ModifyDelete(ConditionList&) { return 0; }
+int GridManager::ModifySerialize(Direction, ConditionList&) { return 0; }
+int GridManager::ModifyDeserialize(long, long, ConditionList&) { return 0; }
+bool GridManager::IsFillPossible() { return false; }
+bool GridManager::IsInvertPossible() { return false; }
+bool GridManager::IsSerializePossible() { return false; }
+bool GridManager::IsDeserializePossible() { return false; }
+bool GridManager::IsCodingPossible() { return false; }
+bool GridManager::IsMirrorPossible() { return false; }
+bool GridManager::IsCopyPossible() { return false; }
+bool GridManager::IsPastePossible() { return false; }
+bool GridManager::IsInsertPossible() { return false; }
+bool GridManager::IsDeletePossible() { return false; }
+bool GridManager::IsFindPossible() { return false; }
+bool GridManager::IsDirty() { return false; }
+int GridManager::GetIsErrorInVector(long) { return 0; }
+int GridManager::ModifyCoding(ConditionList&) { return 0; }
+
+long GridManager::DispLineCount() const { return 0; }
+long GridManager::DispFirstLine() const { return 0; }
+void GridManager::DispScrollTo(long) {}
+QString GridManager::DispHeader(const GridDisp&, int) const { return {}; }
+GridCell GridManager::DispCell(const GridDisp&, long, int) const { return {}; }
+void GridManager::DispPress(const GridDisp&, long, int, Qt::KeyboardModifiers) {}
+void GridManager::DispMove(const GridDisp&, long, int) {}

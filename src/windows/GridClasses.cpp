@@ -1,0 +1,5 @@
+#include "windows/GridClasses.h"
+
+#include "segments/ui/GridManager.h"
+
+void GridClasses::AddFactories() { GridManager::CppRegister(); }
