@@ -49,9 +49,9 @@ class DteRefresher {
  public:
   static void ReadValues(const std::vector<QenParamDs*>& sources) {
     for (std::size_t start = 0, end = 0; start < sources.size(); start = end) {
-      Dstring cmd = sources[start]->GetReadWithClashCmdStr();
+      Dstring cmd = sources[start]->GetRefreshCmdStr();
       for (end = start + 1; end < sources.size(); ++end) {
-        const Dstring read = sources[end]->GetReadWithClashCmdStr();
+        const Dstring read = sources[end]->GetRefreshCmdStr();
         if (cmd.size() + 1 + read.size() > Dte::kRefreshBatchBytes) break;
         cmd += ';' + read;
       }
@@ -66,10 +66,12 @@ class DteRefresher {
     ConditionList ignored;
     if (QenGuiInst::Call(cmd, reply, ignored) != QenStatus::kOk) return;
     std::vector<std::string_view> parts;
-    if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != 2 * (end - start)) return;
-    for (std::size_t i = start; i < end; ++i) {
-      const std::size_t at = 2 * (i - start);
-      sources[i]->TakeReadValue(Dstring(parts[at]), Dstring(parts[at + 1]).Trimmed() == "1");
+    std::size_t expected = 0;
+    for (std::size_t i = start; i < end; ++i) expected += sources[i]->GetRefreshParts();
+    if (ParserExpression::SplitJoined(reply, parts, ignored) != 0 || parts.size() != expected) return;
+    for (std::size_t i = start, at = 0; i < end; at += sources[i]->GetRefreshParts(), ++i) {
+      const bool clashing = sources[i]->GetRefreshParts() == 2 && Dstring(parts[at + 1]).Trimmed() == "1";
+      sources[i]->TakeReadValue(Dstring(parts[at]), clashing);
     }
   }
 

@@ -43,16 +43,21 @@ bool QenParamDs::TakeReadReply(const Dstring& reply) {
 
 // The value and its clash state in one round trip. A server that refuses or garbles the clash
 // form still gets asked the value alone; the clash state is then unknown, and the refusal,
-// which is no fault of the user's, stays out of the list.
+// which is no fault of the user's, stays out of the list. Once the value alone was read where
+// the joined form failed, this parameter is asked the value alone from then on.
 int QenParamDs::ReadValue(ConditionList& list) {
   Dstring reply;
-  ConditionList joined;
-  int status = QenGuiInst::Call(GetReadWithClashCmdStr(), reply, joined);
-  if (status == QenStatus::kOk && TakeReadReply(reply)) return status;
-  if (status == QenStatus::kLocked || status == QenStatus::kServerTerminated) return status;
+  int status = QenStatus::kOk;
+  if (!mClashUnknown) {
+    ConditionList joined;
+    status = QenGuiInst::Call(GetReadWithClashCmdStr(), reply, joined);
+    if (status == QenStatus::kOk && TakeReadReply(reply)) return status;
+    if (status == QenStatus::kLocked || status == QenStatus::kServerTerminated) return status;
+  }
   status = QenGuiInst::Call(GetReadCmdStr(), reply, list);
   if (status == QenStatus::kOk) {
     TakeReadValue(reply, false);
+    mClashUnknown = true;
   } else if (status != QenStatus::kLocked) {
     mFailed = 1;
   }

@@ -48,6 +48,11 @@ class QenParamDs : public QenDs, public QenDsView {
   Dstring GetReadCmdStr() const { return mProgramHeader + "?"; }
   // The value and the clash state in one joined query.
   Dstring GetReadWithClashCmdStr() const { return GetReadCmdStr() + ";" + mProgramHeader + "? CLAS"; }
+  // What a read sends: the joined query, or the value alone once the server refused the clash
+  // form for this parameter.
+  Dstring GetRefreshCmdStr() const { return mClashUnknown ? GetReadCmdStr() : GetReadWithClashCmdStr(); }
+  // The reply parts of GetRefreshCmdStr.
+  std::size_t GetRefreshParts() const { return mClashUnknown ? 1 : 2; }
   Dstring GetWriteCmdStr() const { return mProgramHeader + " " + mValue; }
   unsigned GetFailed() const { return mFailed; }
   void SetFailed(unsigned failed) { mFailed = failed; }
@@ -78,6 +83,7 @@ class QenParamDs : public QenDs, public QenDsView {
   Dstring mValue;
   bool mValid = false;
   bool mClashing = false;
+  bool mClashUnknown = false;
   unsigned mFailed = 0;
   unsigned mReleasePending = 0;
   unsigned mInTransaction = 0;

@@ -279,6 +279,39 @@ TEST_F(DteTest, ReadOfAServerWithoutTheClashFormTakesTheValueAlone) {
   Dte::FreeDs(name);
 }
 
+// After one refusal, a parameter is asked its value alone, so a server without the clash form
+// costs one round trip per refresh again, joined with the parameters that do know it.
+TEST_F(DteTest, AParameterWithoutTheClashFormIsRefreshedAloneInTheJoinedRead) {
+  QenParamDs* name = Dte::AllocDsByName(":_H:NAME", 0);
+  QenParamDs* level = Dte::AllocDsByName(":_H:LEV", 0);
+  ValueView vn, vl;
+  Dte::RegisterView(name, &vn, mList, 0);
+  Dte::RegisterView(level, &vl, mList, 0);
+  Inst().Expect(":_H:NAME?;:_H:NAME? CLAS;:_H:LEV?;:_H:LEV? CLAS", "", 1);
+  Inst().Expect(":_H:SYST:ERR?", "-224,\"Illegal parameter value\"");
+  Inst().Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  Inst().Expect(":_H:NAME?;:_H:NAME? CLAS", "", 1);
+  Inst().Expect(":_H:SYST:ERR?", "-224,\"Illegal parameter value\"");
+  Inst().Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  Inst().Expect(":_H:NAME?", "\"abc\"");
+  ExpectRead(":_H:LEV", "1.5", true);
+  EXPECT_EQ(Dte::Update(mList), 0);
+  EXPECT_EQ(vn.mShown, "\"abc\"");
+  EXPECT_TRUE(level->IsClashing());
+
+  Inst().Expect(":_H:NAME?;:_H:LEV?;:_H:LEV? CLAS", "\"def\";2.5;0");
+  EXPECT_EQ(Dte::Update(mList), 0);
+  EXPECT_EQ(vn.mShown, "\"def\"");
+  EXPECT_EQ(vl.mShown, "2.5");
+  EXPECT_FALSE(level->IsClashing());
+  EXPECT_FALSE(name->IsClashing());
+  EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
+  name->UnregisterView(&vn, mList);
+  level->UnregisterView(&vl, mList);
+  Dte::FreeDs(name);
+  Dte::FreeDs(level);
+}
+
 TEST_F(DteTest, ReadThatFailsAloneTooReportsTheReadsOwnStatus) {
   QenParamDs* name = Dte::AllocDsByName(":_H:NAME", 0);
   Inst().Expect(":_H:NAME?;:_H:NAME? CLAS", "", 1);
