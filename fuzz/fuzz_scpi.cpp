@@ -5,44 +5,18 @@
 //  - A message never holds a line feed outside a block, never exceeds the limit, and the
 //    messages with their terminators never add up to more than the input.
 //  - A session answers every message without crashing, hanging or growing without bound.
-// The instrument is made anew every kRenew inputs and the session at every input (segments
-// stay in memory while qensim runs, so memory must not pile up over many inputs).
 #include <cstddef>
 #include <cstdint>
-#include <memory>
 #include <string>
 #include <vector>
 
-#include "SimClock.h"
-#include "SimCommandProcessor.h"
-#include "SimConfigLoader.h"
+#include "FuzzInstrument.h"
 #include "SimScpiReader.h"
 #include "SimScpiSession.h"
 
-extern const char* const kSimDefaultConfigText;
+using fuzzinstrument::Check;
 
 namespace {
-
-constexpr int kRenew = 64;
-
-void Check(bool ok) {
-  if (!ok) __builtin_trap();
-}
-
-class FixedClock : public SimClock {
- public:
-  long long NowMs() const override { return 1000; }
-};
-
-const SimParamTable& Configured() {
-  static const SimParamTable table = [] {
-    SimParamTable t;
-    ConditionList list;
-    Check(SimConfigLoader::Load(kSimDefaultConfigText, t, list) == 0);
-    return t;
-  }();
-  return table;
-}
 
 // The messages ("\x01" marks an overrun) of the bytes fed `piece` at a time.
 std::vector<std::string> Cut(const std::string& bytes, std::size_t piece) {
@@ -72,12 +46,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   }
   Check(total <= bytes.size() + whole.size());
 
-  static const FixedClock clock;
-  static std::unique_ptr<SimCommandProcessor> sim;
-  static int runs = 0;
-  if (runs++ % kRenew == 0) sim = std::make_unique<SimCommandProcessor>(Configured(), clock, false);
-  sim->Disconnect(1);
-  SimScpiSession session(*sim, 1);
+  SimScpiSession session(fuzzinstrument::Instrument(), 1);
   for (const std::string& m : whole) {
     Dstring reply;
     if (m == "\x01") {
