@@ -24,7 +24,8 @@ std::size_t CountDigits(std::string_view t, std::size_t from) {
 // mantissa digit; i and u only on integers. On success `body` is the token without its suffix.
 bool ScanNumber(std::string_view token, std::string_view& body, char& suffix, bool& integral) {
   suffix = 0;
-  if (!token.empty() && std::string_view("iufd").find(token.back()) != std::string_view::npos) {
+  const char last = token.empty() ? '\0' : token.back();
+  if (last == 'i' || last == 'u' || last == 'f' || last == 'd') {
     suffix = token.back();
     token.remove_suffix(1);
   }
@@ -271,12 +272,16 @@ DataItem DataItem::MakeShared(DataItemType type, std::string_view text, char quo
   DataItem item;
   item.mType = type;
   item.mQuote = quote == '\'' ? '\'' : '"';
-  if (text.size() > kInlineSize && owner) {
-    item.SetShared(text, owner);
-  } else {
-    item.SetText(text);
-  }
+  item.SetTokenText(text, owner);
   return item;
+}
+
+void DataItem::SetTokenText(std::string_view text, const std::shared_ptr<const std::string>& owner) {
+  if (text.size() > kInlineSize && owner) {
+    SetShared(text, owner);
+  } else {
+    SetText(text);
+  }
 }
 
 bool DataItem::FromToken(std::string_view token, DataItem& out) {
@@ -287,27 +292,23 @@ bool DataItem::FromToken(std::string_view token, DataItem& out, const std::share
   std::string_view body;
   char suffix = 0;
   bool integral = true;
-  if (!ScanNumber(token, body, suffix, integral)) {
-    out = MakeShared(DataItemType::Word, token, '"', owner);
-    return true;
-  }
   Number number;
-  if (!ReadNumber(body, suffix, integral, number)) return false;
-  DataItem item;
-  item.mType = number.type;
-  if (number.type == DataItemType::Signed) {
-    item.mSigned = number.s;
-  } else if (number.type == DataItemType::Unsigned) {
-    item.mUnsigned = number.u;
-  } else {
-    item.mDouble = number.d;
+  if (!ScanNumber(token, body, suffix, integral)) {
+    number.type = DataItemType::Word;
+  } else if (!ReadNumber(body, suffix, integral, number)) {
+    return false;
   }
-  if (token.size() > kInlineSize && owner) {
-    item.SetShared(token, owner);
+  // Written into `out` field by field: the parser builds every item in place this way.
+  out.mType = number.type;
+  out.mQuote = '"';
+  if (number.type == DataItemType::Unsigned) {
+    out.mUnsigned = number.u;
+  } else if (number.type == DataItemType::Float || number.type == DataItemType::Double) {
+    out.mDouble = number.d;
   } else {
-    item.SetText(token);
+    out.mSigned = number.s;
   }
-  out = std::move(item);
+  out.SetTokenText(token, owner);
   return true;
 }
 

@@ -77,6 +77,8 @@ class DataItem {
 
   void SetText(std::string_view text);
   void SetShared(std::string_view text, std::shared_ptr<const std::string> owner);
+  // In place when it fits, else a view into `owner` (when there is one) or a shared copy.
+  void SetTokenText(std::string_view text, const std::shared_ptr<const std::string>& owner);
   void ReleaseText();
   // Both are only called on an item whose text is released (in place and empty).
   void CopyTextFrom(const DataItem& other) {

@@ -20,41 +20,55 @@ void Write(const LispList& node, Dstring& out) {
 
 }  // namespace
 
-LispList LispList::OfElements(std::vector<LispList> elements) {
-  LispList list;
-  std::get<kList>(list.mNode) = std::move(elements);
-  return list;
+LispList& LispList::operator=(const LispList& other) {
+  if (this != &other) {
+    LispList copy(other);
+    *this = std::move(copy);
+  }
+  return *this;
+}
+
+LispList& LispList::operator=(LispList&& other) noexcept {
+  if (this != &other) {
+    // `other` may live inside this node's elements: take it out before they go.
+    LispList taken(static_cast<LispList&&>(other));
+    Destroy();
+    mIsList = taken.mIsList;
+    MoveFrom(taken);
+  }
+  return *this;
 }
 
 const DataItem& LispList::GetItem() const {
   static const DataItem kNoItem;
-  const DataItem* item = std::get_if<kItem>(&mNode);
-  return item ? *item : kNoItem;
+  return mIsList ? kNoItem : mItem;
 }
 
-const std::vector<LispList>& LispList::Children() const {
-  static const std::vector<LispList> kNoChildren;
-  const std::vector<LispList>* children = std::get_if<kList>(&mNode);
-  return children ? *children : kNoChildren;
+const LispList::Elements& LispList::Children() const {
+  static const Elements kNoChildren;
+  return mIsList ? mChildren : kNoChildren;
 }
 
-std::vector<LispList>& LispList::MutableChildren() {
-  if (IsItem()) mNode.emplace<kList>();
-  return std::get<kList>(mNode);
+LispList::Elements& LispList::MutableChildren() {
+  if (!mIsList) {
+    mItem.~DataItem();
+    mIsList = true;
+    new (&mChildren) Elements();
+  }
+  return mChildren;
 }
 
 void LispList::Insert(std::size_t at, LispList child) {
-  std::vector<LispList>& children = MutableChildren();
+  Elements& children = MutableChildren();
   children.insert(children.begin() + static_cast<std::ptrdiff_t>(std::min(at, children.size())), std::move(child));
 }
 
 void LispList::Erase(std::size_t at) {
-  std::vector<LispList>* children = std::get_if<kList>(&mNode);
-  if (children && at < children->size()) children->erase(children->begin() + static_cast<std::ptrdiff_t>(at));
+  if (mIsList && at < mChildren.size()) mChildren.erase(mChildren.begin() + static_cast<std::ptrdiff_t>(at));
 }
 
 void LispList::Clear() {
-  if (std::vector<LispList>* children = std::get_if<kList>(&mNode)) children->clear();
+  if (mIsList) mChildren.clear();
 }
 
 Dstring LispList::AsExpression() const {
@@ -64,5 +78,6 @@ Dstring LispList::AsExpression() const {
 }
 
 bool LispList::operator==(const LispList& other) const {
-  return mNode == other.mNode;
+  if (mIsList != other.mIsList) return false;
+  return mIsList ? mChildren == other.mChildren : mItem == other.mItem;
 }

@@ -1,26 +1,40 @@
 #pragma once
 
 #include <cstddef>
-#include <variant>
+#include <new>
+#include <utility>
 #include <vector>
 
 #include "support/DataItem.h"
+#include "support/NodeAllocator.h"
 
 // The parsed list form of a reply or expression: a tree whose leaves are items
 // and whose inner nodes are parenthesised lists. A node is either, never both, so it
-// is no larger than an item.
+// is no larger than an item: 48 bytes.
 class LispList {
  public:
-  LispList() : mNode(std::in_place_index<kList>) {}
-  explicit LispList(DataItem item) : mNode(std::in_place_index<kItem>, std::move(item)) {}
-  // A list that takes over the given elements.
-  static LispList OfElements(std::vector<LispList> elements);
+  using Elements = std::vector<LispList, NodeAllocator<LispList>>;
 
-  bool IsList() const { return mNode.index() == kList; }
-  bool IsItem() const { return mNode.index() == kItem; }
+  LispList() noexcept : mIsList(true) { new (&mChildren) Elements(); }
+  explicit LispList(DataItem item) noexcept : mIsList(false) { new (&mItem) DataItem(std::move(item)); }
+  // An empty word, to be written in place.
+  explicit LispList(std::in_place_t) noexcept : mIsList(false) { new (&mItem) DataItem(); }
+  LispList(const LispList& other) : mIsList(other.mIsList) { CopyFrom(other); }
+  LispList(LispList&& other) noexcept : mIsList(other.mIsList) { MoveFrom(other); }
+  LispList& operator=(const LispList& other);
+  LispList& operator=(LispList&& other) noexcept;
+  ~LispList() { Destroy(); }
+
+  // A list that takes over the given elements.
+  static LispList OfElements(Elements elements) { return LispList(std::move(elements)); }
+
+  bool IsList() const { return mIsList; }
+  bool IsItem() const { return !mIsList; }
 
   // Valid only for an item; a list answers an empty word.
   const DataItem& GetItem() const;
+  // The item to write in place; null for a list.
+  DataItem* GetMutableItem() { return mIsList ? nullptr : &mItem; }
 
   // Valid only for a list; an item has no elements.
   std::size_t Size() const { return Children().size(); }
@@ -41,12 +55,38 @@ class LispList {
   bool operator==(const LispList& other) const;
 
  private:
-  static constexpr std::size_t kItem = 0;
-  static constexpr std::size_t kList = 1;
+  explicit LispList(Elements&& elements) noexcept : mIsList(true) { new (&mChildren) Elements(std::move(elements)); }
 
-  const std::vector<LispList>& Children() const;
+  const Elements& Children() const;
   // An item that is asked to hold elements becomes a list.
-  std::vector<LispList>& MutableChildren();
+  Elements& MutableChildren();
 
-  std::variant<DataItem, std::vector<LispList>> mNode;
+  // Each is called on a node whose own content is destroyed (or not yet built).
+  void CopyFrom(const LispList& other) {
+    if (mIsList) {
+      new (&mChildren) Elements(other.mChildren);
+    } else {
+      new (&mItem) DataItem(other.mItem);
+    }
+  }
+  void MoveFrom(LispList& other) noexcept {
+    if (mIsList) {
+      new (&mChildren) Elements(std::move(other.mChildren));
+    } else {
+      new (&mItem) DataItem(std::move(other.mItem));
+    }
+  }
+  void Destroy() noexcept {
+    if (mIsList) {
+      mChildren.~Elements();
+    } else {
+      mItem.~DataItem();
+    }
+  }
+
+  bool mIsList;
+  union {
+    DataItem mItem;
+    Elements mChildren;
+  };
 };

@@ -15,6 +15,7 @@ constexpr int kSyntaxError = 1;
 constexpr std::size_t kMaxDepth = 256;
 constexpr std::size_t kExcerptHalf = 30;
 constexpr std::size_t kNone = std::string_view::npos;
+constexpr std::size_t kKeptElements = std::size_t{1} << 16;
 
 bool IsBlank(char c) {
   return c == ' ' || c == '\t' || c == '\r' || c == '\n';
@@ -41,6 +42,15 @@ bool IsPlain(char c) {
 std::size_t SkipPlain(std::string_view text, std::size_t pos) {
   while (pos < text.size() && IsPlain(text[pos])) ++pos;
   return pos;
+}
+// Where `quote` next stands at or after `from`. Most strings of a reply are a few bytes long,
+// shorter than what a library search needs to pay off, so those are looked at byte by byte.
+std::size_t FindQuote(std::string_view text, char quote, std::size_t from) {
+  const std::size_t near = std::min(text.size(), from + 32);
+  for (std::size_t pos = from; pos < near; ++pos) {
+    if (text[pos] == quote) return pos;
+  }
+  return near < text.size() ? text.find(quote, near) : kNone;
 }
 bool IsUtf8Continuation(char c) {
   return (static_cast<unsigned char>(c) & 0xC0) == 0x80;
@@ -98,82 +108,36 @@ BlockSpan ReadBlock(std::string_view text, std::size_t at) {
   return span;
 }
 
-// How many elements the top level and each list (in the order of its '(') will get, read
-// ahead so that every list is built in place at its final size. Only a hint: a malformed
-// text just ends the count, and the reader checks everything itself.
-std::vector<std::uint32_t> CountElements(std::string_view text) {
-  std::vector<std::uint32_t> counts(1, 0);
-  std::vector<std::size_t> open(1, 0);
-  bool tokenStart = true;
-  for (std::size_t pos = 0; pos < text.size();) {
-    const char c = text[pos];
-    if (IsPlain(c)) {
-      counts[open.back()] |= counts[open.back()] == 0;
-      pos = SkipPlain(text, pos);
-      tokenStart = false;
-      continue;
-    }
-    if (IsBlank(c)) {
-      tokenStart = true;
-      ++pos;
-      continue;
-    }
-    if (c == ')') {
-      if (open.size() == 1) break;
-      open.pop_back();
-      tokenStart = true;
-      ++pos;
-      continue;
-    }
-    std::uint32_t& count = counts[open.back()];
-    count += (count == 0) + (c == ',');
-    if (c == '(') {
-      open.push_back(counts.size());
-      counts.push_back(0);
-    } else if (IsQuote(c)) {
-      const std::size_t close = text.find(c, pos + 1);
-      if (close == kNone) break;
-      pos = close + 1;
-      tokenStart = false;
-      continue;
-    } else if (c == '#' && tokenStart) {
-      BlockSpan span = ReadBlock(text, pos);
-      if (span.error != nullptr) break;
-      pos = span.data + span.length;
-      tokenStart = false;
-      continue;
-    }
-    tokenStart = IsDelimiter(c);
-    ++pos;
-  }
-  return counts;
-}
-
-// Reads a whole text into a tree. Each open list gathers its elements in a vector of the
-// size counted ahead, which becomes the list at its ')', so no element is moved twice.
+// Reads a whole text into a tree. The elements of every open list are gathered on one stack;
+// at its ')' a list takes its own off the top, into an array of exactly their number.
 class Reader {
  public:
-  Reader(std::string_view text, ConditionList& list) : mText(text), mList(list) {}
+  Reader(std::string_view text, ConditionList& list) : mText(text), mList(list), mElements(ThreadElements()) {}
+  Reader(const Reader&) = delete;
+  Reader& operator=(const Reader&) = delete;
+  ~Reader();
 
   int Read(LispList& out);
   // Where the first list inside the result starts, or kNone when the result is flat.
   std::size_t NestedListAt() const { return mUnwrapped ? mFirstInnerOpen : mFirstOpen; }
 
  private:
-  // An open list: where its '(' stands, and its elements so far.
+  // An open list: where its '(' stands, and where its elements begin on the stack.
   struct Open {
     std::size_t at = 0;
-    std::vector<LispList> elements;
+    std::size_t first = 0;
   };
 
-  void Append(DataItem item) { mStack.back().elements.emplace_back(std::move(item)); }
+  // A new empty item at the end of the open list, to be written in place.
+  DataItem& AppendItem() { return *mElements.emplace_back(std::in_place).GetMutableItem(); }
+  // Takes the innermost open list's elements off the stack.
+  LispList TakeOpenList();
   // The shared copy of the text that long texts and blocks refer into, made when first needed.
   const std::shared_ptr<const std::string>& Owner();
   // The bytes at [at, at + size) of the text; inside the shared copy when they are too long
   // to be held in place by an item.
   std::string_view Shared(std::size_t at, std::size_t size);
-  bool CurrentIsEmpty() const { return mStack.back().elements.empty(); }
-  std::size_t NextCount();
+  bool CurrentIsEmpty() const { return mElements.size() == mStack.back().first; }
   bool At(char c) const { return mPos < mText.size() && mText[mPos] == c; }
   void SkipBlanks();
   int Element();
@@ -190,8 +154,9 @@ class Reader {
   ConditionList& mList;
   std::size_t mPos = 0;
   std::vector<Open> mStack;
-  std::vector<std::uint32_t> mCounts;
-  std::size_t mNextCount = 0;
+  // The stack is the thread's, kept from parse to parse so that it need not grow each time.
+  static std::vector<LispList>& ThreadElements();
+  std::vector<LispList>& mElements;
   std::shared_ptr<const std::string> mOwner;
   std::size_t mFirstOpen = kNone;
   std::size_t mFirstInnerOpen = kNone;
@@ -199,10 +164,19 @@ class Reader {
   bool mUnwrapped = false;
 };
 
+std::vector<LispList>& Reader::ThreadElements() {
+  thread_local std::vector<LispList> elements;
+  return elements;
+}
+
+// Left empty for the next parse, and small again after a very long list.
+Reader::~Reader() {
+  mElements.clear();
+  if (mElements.capacity() > kKeptElements) std::vector<LispList>().swap(mElements);
+}
+
 int Reader::Read(LispList& out) {
-  mCounts = CountElements(mText);
   mStack.assign(1, Open{});
-  mStack.back().elements.reserve(NextCount());
   bool expectElement = true;
   for (;;) {
     SkipBlanks();
@@ -229,7 +203,7 @@ void Reader::SkipBlanks() {
 // and an empty word otherwise ("(a,)", "(,)").
 int Reader::Element() {
   if (mPos == mText.size() || At(')') || At(',')) {
-    if (!CurrentIsEmpty() || At(',')) Append(DataItem());
+    if (!CurrentIsEmpty() || At(',')) AppendItem();
     return 0;
   }
   if (IsQuote(mText[mPos])) return ReadString();
@@ -254,21 +228,22 @@ int Reader::OpenList() {
   if (mStack.size() == kMaxDepth && mDeepestOpen == kNone) mDeepestOpen = mPos;
   if (mFirstOpen == kNone) mFirstOpen = mPos;
   if (mStack.size() > 1 && mFirstInnerOpen == kNone) mFirstInnerOpen = mPos;
-  mStack.push_back(Open{mPos, {}});
-  mStack.back().elements.reserve(NextCount());
+  mStack.push_back(Open{mPos, mElements.size()});
   ++mPos;
   return 0;
 }
 
-std::size_t Reader::NextCount() {
-  return mNextCount < mCounts.size() ? mCounts[mNextCount++] : 0;
+LispList Reader::TakeOpenList() {
+  const auto first = mElements.begin() + static_cast<std::ptrdiff_t>(mStack.back().first);
+  LispList::Elements elements(std::make_move_iterator(first), std::make_move_iterator(mElements.end()));
+  mElements.erase(first, mElements.end());
+  mStack.pop_back();
+  return LispList::OfElements(std::move(elements));
 }
 
 int Reader::CloseList() {
   if (mStack.size() == 1) return Fail(mPos, "')' without a matching '('");
-  LispList closed = LispList::OfElements(std::move(mStack.back().elements));
-  mStack.pop_back();
-  mStack.back().elements.push_back(std::move(closed));
+  mElements.push_back(TakeOpenList());
   ++mPos;
   return 0;
 }
@@ -285,7 +260,7 @@ std::string_view Reader::Shared(std::size_t at, std::size_t size) {
 
 int Reader::Finish(LispList& out) {
   if (mStack.size() > 1) return Fail(mStack.back().at, "'(' without a matching ')'");
-  LispList top = LispList::OfElements(std::move(mStack.back().elements));
+  LispList top = TakeOpenList();
   mUnwrapped = top.Size() == 1 && top[0].IsList();
   if (!mUnwrapped && mDeepestOpen != kNone)
     return Fail(mDeepestOpen, "lists are nested deeper than 256 levels");
@@ -303,10 +278,10 @@ int Reader::Finish(LispList& out) {
 int Reader::ReadString() {
   std::size_t start = mPos;
   char quote = mText[mPos++];
-  std::size_t close = mText.find(quote, mPos);
+  std::size_t close = FindQuote(mText, quote, mPos);
   if (close == kNone) return Fail(start, "the string has no closing quote");
   if (close + 1 >= mText.size() || mText[close + 1] != quote) {
-    Append(DataItem::MakeShared(DataItemType::String, Shared(mPos, close - mPos), quote, mOwner));
+    AppendItem() = DataItem::MakeShared(DataItemType::String, Shared(mPos, close - mPos), quote, mOwner);
     mPos = close + 1;
     return 0;
   }
@@ -316,10 +291,10 @@ int Reader::ReadString() {
     mPos = close + 1;
     if (!At(quote)) break;
     value += quote;
-    close = mText.find(quote, ++mPos);
+    close = FindQuote(mText, quote, ++mPos);
     if (close == kNone) return Fail(start, "the string has no closing quote");
   }
-  Append(DataItem::MakeString(value, quote));
+  AppendItem() = DataItem::MakeString(value, quote);
   return 0;
 }
 
@@ -328,7 +303,7 @@ int Reader::ReadBlockItem() {
   BlockSpan span = ReadBlock(mText, mPos);
   if (span.error != nullptr) return Fail(span.errorAt, span.error);
   const std::shared_ptr<const std::string>& owner = Owner();
-  Append(DataItem::MakeBlock(std::string_view(*owner).substr(span.data, span.length), owner));
+  AppendItem() = DataItem::MakeBlock(std::string_view(*owner).substr(span.data, span.length), owner);
   mPos = span.data + span.length;
   return 0;
 }
@@ -340,11 +315,9 @@ int Reader::ReadBare() {
   if (end < mText.size() && IsQuote(mText[end])) return Fail(end, "a quote inside a bare word");
   std::size_t last = end;
   while (IsBlank(mText[last - 1])) --last;
-  DataItem item;
-  if (!DataItem::FromToken(Shared(start, last - start), item, mOwner)) {
+  if (!DataItem::FromToken(Shared(start, last - start), AppendItem(), mOwner)) {
     return Fail(start, "the number does not fit its type");
   }
-  Append(std::move(item));
   mPos = end;
   return 0;
 }
@@ -381,7 +354,7 @@ int ParserExpression::SplitJoined(std::string_view text, std::vector<std::string
       start = ++pos;
       tokenStart = true;
     } else if (IsQuote(c)) {
-      std::size_t close = text.find(c, pos + 1);
+      std::size_t close = FindQuote(text, c, pos + 1);
       if (close == kNone) return Fail(text, pos, "the string has no closing quote", list);
       pos = close + 1;
       tokenStart = false;
