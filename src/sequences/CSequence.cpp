@@ -779,7 +779,8 @@ int CSequence::Parse(const Dstring& text, ConditionList& cond) {
   ConditionList parse;
   LispList top;
   double version = 0.0;
-  if (ParserExpression::Parse(text, top, parse) != 0 || top.Size() < 3 || !top[0].IsItem() ||
+  CSequenceReader::Stream stream(this, mContent);
+  if (ParserExpression::Parse(text, top, parse, stream) != 0 || top.Size() < 3 || !top[0].IsItem() ||
       !top[0].GetItem().GetDouble(version) || std::isnan(version)) {
     return Refuse(cond, "GUI_SEQUENCE_SYNTAX", {Shown(text)});
   }
@@ -792,10 +793,10 @@ int CSequence::Parse(const Dstring& text, ConditionList& cond) {
     return Refuse(cond, "GUI_SEQUENCE_SYNTAX", {Shown(text)});
   }
   if (!empty) {
-    const auto generation =
-        version <= 1.0 ? CSequenceReader::Generation::First : CSequenceReader::Generation::Second;
-    if (!CSequenceReader::Read(body, generation, this, mContent))
-      return Refuse(cond, "GUI_SEQUENCE_SYNTAX", {Shown(text)});
+    const bool read = stream.Streamed()
+                          ? stream.Ok()
+                          : CSequenceReader::Read(body, CSequenceReader::GenerationOf(version), this, mContent);
+    if (!read) return Refuse(cond, "GUI_SEQUENCE_SYNTAX", {Shown(text)});
   }
   if (!label.empty() && !mContent.blocks.empty()) mContent.blocks.front()->SetLabel(label);
   // Never empty once read; the block added here is the same as AddBlockAfter(0) adds.

@@ -2,8 +2,6 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <map>
-#include <set>
 #include <tuple>
 #include <utility>
 
@@ -146,23 +144,29 @@ int CSequenceAnalyzer::ReportLoops(const CSequence::Content& old, const CSequenc
   for (const Op& op : ops) {
     if (op.kind == Op::Same || op.kind == Op::Changed) newOf[op.oldIndex + 1] = op.newIndex + 1;
   }
-  using Key = std::tuple<unsigned long, unsigned long, unsigned long>;  // level, start, length
-  std::map<Key, const Loop*> fresh;
-  for (const auto& loop : now.loops)
-    fresh[{loop->GetLevel(), loop->GetStart(), loop->GetLength()}] = loop.get();
+  // The new loops by (level, start, length), each marked once an old loop is found in it.
+  using Key = std::tuple<unsigned long, unsigned long, unsigned long>;
+  std::vector<std::pair<Key, std::size_t>> fresh;
+  fresh.reserve(now.loops.size());
+  for (std::size_t i = 0; i < now.loops.size(); ++i) {
+    const Loop& loop = *now.loops[i];
+    fresh.push_back({{loop.GetLevel(), loop.GetStart(), loop.GetLength()}, i});
+  }
+  std::sort(fresh.begin(), fresh.end());
+  std::vector<char> kept(now.loops.size(), 0);
 
   std::vector<std::pair<const Loop*, const Loop*>> stayed;
   std::vector<const Loop*> deleted;
   for (const auto& loop : old.loops) {
     const unsigned long start = newOf[loop->GetStart()], end = newOf[loop->GetEnd()];
-    auto it = start && end && end - start + 1 == loop->GetLength()
-                  ? fresh.find({loop->GetLevel(), start, loop->GetLength()})
-                  : fresh.end();
-    if (it == fresh.end()) {
-      deleted.push_back(loop.get());
+    const Key key{loop->GetLevel(), start, loop->GetLength()};
+    auto it = std::lower_bound(fresh.begin(), fresh.end(), std::pair<Key, std::size_t>{key, 0});
+    while (it != fresh.end() && it->first == key && kept[it->second]) ++it;
+    if (start && end && end - start + 1 == loop->GetLength() && it != fresh.end() && it->first == key) {
+      kept[it->second] = 1;
+      stayed.emplace_back(loop.get(), now.loops[it->second].get());
     } else {
-      stayed.emplace_back(loop.get(), it->second);
-      fresh.erase(it);
+      deleted.push_back(loop.get());
     }
   }
   using LoopReport = int (CSequenceObserver::*)(long, long, long, long, ConditionList&);
@@ -175,11 +179,9 @@ int CSequenceAnalyzer::ReportLoops(const CSequence::Content& old, const CSequenc
   for (const Loop* loop : deleted) {
     if (int status = report(&CSequenceObserver::NfyLoopDeleted, loop)) return status;
   }
-  std::set<const Loop*> kept;
-  for (const auto& s : stayed) kept.insert(s.second);
-  for (const auto& loop : now.loops) {
-    if (kept.contains(loop.get())) continue;
-    if (int status = report(&CSequenceObserver::NfyLoopInserted, loop.get())) return status;
+  for (std::size_t i = 0; i < now.loops.size(); ++i) {
+    if (kept[i]) continue;
+    if (int status = report(&CSequenceObserver::NfyLoopInserted, now.loops[i].get())) return status;
   }
   for (const auto& [was, is] : stayed) {
     const std::pair<bool, LoopReport> changes[] = {

@@ -1,6 +1,7 @@
 #include "sequences/CSequenceReader.h"
 
 #include <algorithm>
+#include <cmath>
 
 #include "sequences/CLoop.h"
 #include "sequences/CSequenceBlock.h"
@@ -75,6 +76,8 @@ class Reader {
 
   // Reads one element; `level` becomes the highest loop level within it.
   bool Element(const LispList& e, unsigned long& level);
+  // One item of a SEQ list, with the label before it (none for the first).
+  bool SequentialItem(const LispList* labelElement, const LispList& item, unsigned long& level);
 
  private:
   bool BlockElement(const LispList& e);
@@ -159,14 +162,19 @@ bool Reader::Sequential(const LispList& e, unsigned long& level) {
   // (SEQ,item,"label",item,...): an item, then pairs of a label and an item.
   if (e.Size() < 2 || e.Size() % 2 != 0) return false;
   for (std::size_t i = 1; i < e.Size(); i += 2) {
-    Dstring label;
-    if (i > 1 && !CSequenceReader::Label(e[i - 1], label)) return false;
-    const std::size_t firstBlock = mOut.blocks.size();
-    unsigned long inner = 0;
-    if (!Element(e[i], inner)) return false;
-    if (i > 1) mOut.blocks[firstBlock]->SetLabel(label);
-    level = std::max(level, inner);
+    if (!SequentialItem(i > 1 ? &e[i - 1] : nullptr, e[i], level)) return false;
   }
+  return true;
+}
+
+bool Reader::SequentialItem(const LispList* labelElement, const LispList& item, unsigned long& level) {
+  Dstring label;
+  if (labelElement != nullptr && !CSequenceReader::Label(*labelElement, label)) return false;
+  const std::size_t firstBlock = mOut.blocks.size();
+  unsigned long inner = 0;
+  if (!Element(item, inner)) return false;
+  if (labelElement != nullptr) mOut.blocks[firstBlock]->SetLabel(label);
+  level = std::max(level, inner);
   return true;
 }
 
@@ -215,4 +223,33 @@ bool CSequenceReader::Read(const LispList& element, Generation generation, CSequ
   Reader reader(generation, owner, out);
   unsigned long level = 0;
   return reader.Element(element, level);
+}
+
+// The version and the label are the outer list's first two elements; while the third is open,
+// the elements at depth 2 are those of the block expression.
+bool CSequenceReader::Stream::Take(std::size_t depth, std::size_t index, LispList& element) {
+  if (depth == 1) {
+    mTopCount = index + 1;
+    double version = 0.0;
+    if (index == 0) {
+      mVersionOk = element.IsItem() && element.GetItem().GetDouble(version) && !std::isnan(version) && version <= 3.0;
+      mGeneration = GenerationOf(version);
+    }
+    return false;
+  }
+  if (mTopCount != 2 || !mVersionOk) return false;
+  if (index == 0) {
+    mStreamed = IsWord(element, "SEQ");
+    mCount = 1;
+    return false;
+  }
+  if (!mStreamed) return false;
+  ++mCount;
+  if (mFailed) return true;
+  if (index % 2 == 0) {
+    mLabel = std::move(element);
+    return true;
+  }
+  mFailed = !Reader(mGeneration, mOwner, mOut).SequentialItem(index > 1 ? &mLabel : nullptr, element, mLevel);
+  return true;
 }

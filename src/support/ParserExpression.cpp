@@ -112,7 +112,8 @@ BlockSpan ReadBlock(std::string_view text, std::size_t at) {
 // at its ')' a list takes its own off the top, into an array of exactly their number.
 class Reader {
  public:
-  Reader(std::string_view text, ConditionList& list) : mText(text), mList(list), mElements(ThreadElements()) {}
+  Reader(std::string_view text, ConditionList& list, ParserExpression::Sink* sink = nullptr)
+      : mText(text), mList(list), mSink(sink), mElements(ThreadElements()) {}
   Reader(const Reader&) = delete;
   Reader& operator=(const Reader&) = delete;
   ~Reader();
@@ -126,7 +127,11 @@ class Reader {
   struct Open {
     std::size_t at = 0;
     std::size_t first = 0;
+    std::size_t seen = 0;  // elements completed, those a sink took included
   };
+
+  // Shows the element just completed to the sink, which may take it off the stack.
+  void Offer();
 
   // A new empty item at the end of the open list, to be written in place.
   DataItem& AppendItem() { return *mElements.emplace_back(std::in_place).GetMutableItem(); }
@@ -153,6 +158,7 @@ class Reader {
   std::string_view mText;
   ConditionList& mList;
   std::size_t mPos = 0;
+  ParserExpression::Sink* mSink;
   std::vector<Open> mStack;
   // The stack is the thread's, kept from parse to parse so that it need not grow each time.
   static std::vector<LispList>& ThreadElements();
@@ -184,7 +190,9 @@ int Reader::Read(LispList& out) {
     if (expectElement && At('(')) {
       rc = OpenList();
     } else if (expectElement) {
+      const std::size_t before = mElements.size();
       rc = Element();
+      if (rc == 0 && mElements.size() > before) Offer();
       expectElement = false;
     } else if (mPos == mText.size()) {
       return Finish(out);
@@ -244,8 +252,15 @@ LispList Reader::TakeOpenList() {
 int Reader::CloseList() {
   if (mStack.size() == 1) return Fail(mPos, "')' without a matching '('");
   mElements.push_back(TakeOpenList());
+  Offer();
   ++mPos;
   return 0;
+}
+
+void Reader::Offer() {
+  const std::size_t depth = mStack.size() - 1;
+  if (mSink == nullptr || depth == 0 || depth > mSink->Depth()) return;
+  if (mSink->Take(depth, mStack.back().seen++, mElements.back())) mElements.pop_back();
 }
 
 const std::shared_ptr<const std::string>& Reader::Owner() {
@@ -326,6 +341,10 @@ int Reader::ReadBare() {
 
 int ParserExpression::Parse(std::string_view text, LispList& out, ConditionList& list) {
   return Reader(text, list).Read(out);
+}
+
+int ParserExpression::Parse(std::string_view text, LispList& out, ConditionList& list, Sink& sink) {
+  return Reader(text, list, &sink).Read(out);
 }
 
 int ParserExpression::Parse(std::string_view text, DataParcel& out, ConditionList& list) {

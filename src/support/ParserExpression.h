@@ -27,7 +27,21 @@
 // the byte offset (from 0) and returns a nonzero status, leaving `out` unchanged.
 class ParserExpression {
  public:
+  // Is shown each element of the text's outer list, and of the lists nested in it down to
+  // Depth(), as soon as the element is complete (its own elements first). An element it takes
+  // is left out of the tree, so a long list is read without ever standing whole.
+  class Sink {
+   public:
+    virtual ~Sink() = default;
+    virtual std::size_t Depth() const = 0;
+    // `depth` is 1 inside the outer parentheses; `index` counts the list's elements so far,
+    // taken ones included. True takes the element; the sink may move it away.
+    virtual bool Take(std::size_t depth, std::size_t index, LispList& element) = 0;
+  };
+
   static int Parse(std::string_view text, LispList& out, ConditionList& list);
+  // As above, showing the elements to `sink` as they are read.
+  static int Parse(std::string_view text, LispList& out, ConditionList& list, Sink& sink);
   // The top-level elements as a flat parcel; a nested list is refused.
   static int Parse(std::string_view text, DataParcel& out, ConditionList& list);
 

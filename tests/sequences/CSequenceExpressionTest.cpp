@@ -35,6 +35,11 @@ class RoundTrip : public SequenceFixture, public testing::WithParamInterface<con
 TEST_P(RoundTrip, WritesBackWhatItRead) {
   ASSERT_EQ(mSeq.fromExpression(GetParam(), mList), 0) << mList.ToText();
   EXPECT_EQ(Written(), GetParam());
+  // Without its outer parentheses the text is the same expression, read from one whole tree
+  // instead of an item at a time.
+  const std::string bare(GetParam() + 1, std::char_traits<char>::length(GetParam()) - 2);
+  ASSERT_EQ(mSeq.fromExpression(bare, mList), 0) << mList.ToText();
+  EXPECT_EQ(Written(), GetParam());
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -146,7 +151,11 @@ INSTANTIATE_TEST_SUITE_P(
         "(3.0,\"\",(LOOP1,0,2,\"\",(LOOP1,0,2,\"\"," + Blk(1) + ")))",
         "(3.0,\"\",(LOOP1,0,2,\"\",(LOOP2,0,2,\"\"," + Blk(1) + ")))",
         "(3.0,\"\",(LOOP0,0,2,\"\"," + Blk(1) + "))", "(3.0,\"\",(LOOP17,0,2,\"\"," + Blk(1) + "))",
-        "(3.0,\"\",(LOOP1,0,ALL,\"\"," + Blk(1) + "))", "(3.0,\"\",(LOOP1,0,2," + Blk(1) + "))"));
+        "(3.0,\"\",(LOOP1,0,ALL,\"\"," + Blk(1) + "))", "(3.0,\"\",(LOOP1,0,2," + Blk(1) + "))",
+        // Faults after the first items were already read.
+        "(3.0,\"\",(SEQ," + Blk(1) + ",\"\"," + Blk(2) + "),\"open)",
+        "(3.0,\"\",(SEQ," + Blk(1) + ",\"\",(BLOCK,0,1 1)))", "(3.0,\"\",(SEQ," + Blk(1) + ")),(x)",
+        "(3.0,\"\",(SEQ," + Blk(1) + ",\"\"," + Blk(2) + ",\"\",(LOOP1,0,0,\"\",(LOOP2,0,1,\"\"," + Blk(3) + "))))"));
 
 TEST_F(ExpressionTest, TheWriterRefusesOverlappingLoops) {
   ASSERT_EQ(mSeq.fromExpression(Seq("(SEQ," + Blk(1) + ",\"\"," + Blk(2) + ",\"\"," + Blk(3) + ")"), mList),

@@ -119,6 +119,35 @@ INSTANTIATE_TEST_SUITE_P(
                     FailCase{"1,1e400", 2}, FailCase{"1e-400", 0}, FailCase{"9223372036854775808i", 0},
                     FailCase{"-1u", 0}, FailCase{"1e39f", 0}, FailCase{std::string(100, 'x') + ")", 100}));
 
+// Takes the elements at depth 2 with an odd index, and notes every element it is shown.
+class OddTaker : public ParserExpression::Sink {
+ public:
+  std::size_t Depth() const override { return 2; }
+  bool Take(std::size_t depth, std::size_t index, LispList& element) override {
+    shown += std::to_string(depth) + "." + std::to_string(index) + "=" + element.AsExpression().c_str() + " ";
+    if (depth != 2 || index % 2 == 0) return false;
+    taken.push_back(std::move(element));
+    return true;
+  }
+  std::string shown;
+  std::vector<LispList> taken;
+};
+
+TEST(ParserExpression, ASinkSeesElementsAsTheyCompleteAndTakesThemOutOfTheTree) {
+  ConditionList list;
+  LispList tree;
+  OddTaker sink;
+  ASSERT_EQ(ParserExpression::Parse("(1,(a,(b,(c)),d,e),())", tree, list, sink), 0) << list.ToText();
+  EXPECT_EQ(tree.AsExpression(), "(1,(a,d),())");
+  EXPECT_EQ(sink.shown, "1.0=1 2.0=a 2.1=(b,(c)) 2.2=d 2.3=e 1.1=(a,d) 1.2=() ");
+  ASSERT_EQ(sink.taken.size(), 2u);
+  EXPECT_EQ(sink.taken[0].AsExpression(), "(b,(c))");
+  // A failure later in the text still fails the parse, whatever was taken before it.
+  LispList kept = tree;
+  EXPECT_NE(ParserExpression::Parse("(1,(a,b,c),\"open)", tree, list, sink), 0);
+  EXPECT_EQ(tree, kept);
+}
+
 TEST(ParserExpression, NestingIsCappedCountingTheOuterList) {
   auto nested = [](std::string head, std::size_t depth) {
     return head + std::string(depth, '(') + std::string(depth, ')');
