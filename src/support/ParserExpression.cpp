@@ -113,7 +113,7 @@ BlockSpan ReadBlock(std::string_view text, std::size_t at) {
 class Reader {
  public:
   Reader(std::string_view text, ConditionList& list, ParserExpression::Sink* sink = nullptr)
-      : mText(text), mList(list), mSink(sink), mElements(ThreadElements()) {}
+      : mText(text), mList(list), mSink(sink), mSinkDepth(sink ? sink->Depth() : 0), mElements(ThreadElements()) {}
   Reader(const Reader&) = delete;
   Reader& operator=(const Reader&) = delete;
   ~Reader();
@@ -159,6 +159,7 @@ class Reader {
   ConditionList& mList;
   std::size_t mPos = 0;
   ParserExpression::Sink* mSink;
+  std::size_t mSinkDepth;
   std::vector<Open> mStack;
   // The stack is the thread's, kept from parse to parse so that it need not grow each time.
   static std::vector<LispList>& ThreadElements();
@@ -259,7 +260,7 @@ int Reader::CloseList() {
 
 void Reader::Offer() {
   const std::size_t depth = mStack.size() - 1;
-  if (mSink == nullptr || depth == 0 || depth > mSink->Depth()) return;
+  if (depth == 0 || depth > mSinkDepth) return;
   if (mSink->Take(depth, mStack.back().seen++, mElements.back())) mElements.pop_back();
 }
 
