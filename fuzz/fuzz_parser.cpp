@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "support/ParserExpression.h"
@@ -44,6 +45,40 @@ void CheckParcel(std::string_view text) {
   Check(again == parcel);
 }
 
+// Takes every other element at depth 2 and puts it back where it was: a parse with the sink
+// fails exactly when one without it does, and ends with the same tree.
+class PutBack : public ParserExpression::Sink {
+ public:
+  std::size_t Depth() const override { return 2; }
+  bool Take(std::size_t depth, std::size_t index, LispList& element) override {
+    Check(depth >= 1 && depth <= 2);
+    if (depth == 1) {
+      // The list just completed lost the elements taken from it; they go back in order.
+      if (element.IsList()) {
+        for (auto& [at, taken] : mTaken) element.Insert(at, std::move(taken));
+      }
+      mTaken.clear();
+      return false;
+    }
+    if (index % 2 == 0) return false;
+    mTaken.emplace_back(index, std::move(element));
+    return true;
+  }
+
+ private:
+  std::vector<std::pair<std::size_t, LispList>> mTaken;
+};
+
+void CheckSink(std::string_view text) {
+  ConditionList list;
+  LispList plain;
+  LispList streamed;
+  PutBack sink;
+  const int rc = ParserExpression::Parse(text, plain, list);
+  Check((ParserExpression::Parse(text, streamed, list, sink) == 0) == (rc == 0));
+  Check(rc != 0 || streamed == plain);
+}
+
 void CheckSplit(std::string_view text) {
   ConditionList list;
   std::vector<std::string_view> parts;
@@ -66,5 +101,6 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   CheckTree(text);
   CheckParcel(text);
   CheckSplit(text);
+  CheckSink(text);
   return 0;
 }
