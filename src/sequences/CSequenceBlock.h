@@ -1,11 +1,13 @@
 #pragma once
 
+#include <cstddef>
 #include <memory>
 #include <set>
 #include <vector>
 
 #include "sequences/CSequence.h"
 #include "support/DataParcel.h"
+#include "support/NodePool.h"
 #include "support/Dstring.h"
 
 // One block of the sequence: one segment item per port and the block's attributes, its
@@ -22,6 +24,11 @@ class CSequence::CSequenceBlock {
   };
 
   CSequenceBlock() = default;
+
+  // A long sequence is tens of thousands of blocks, made and dropped at every read: they are
+  // kept for the next read instead of being given back to the system.
+  static void* operator new(std::size_t size) { return NodePool::Allocate(size); }
+  static void operator delete(void* block, std::size_t size) noexcept { NodePool::Free(block, size); }
 
   // A copy of everything but the loops.
   std::unique_ptr<CSequenceBlock> CloneContent() const;

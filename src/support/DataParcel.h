@@ -3,11 +3,13 @@
 #include <vector>
 
 #include "support/DataItem.h"
+#include "support/NodeAllocator.h"
 
-// An ordered, flat list of typed values.
-class DataParcel : public std::vector<DataItem> {
+// An ordered, flat list of typed values. Its array comes from the node pool, like a parsed
+// list's: replies and sequence blocks make and drop them by the thousand.
+class DataParcel : public std::vector<DataItem, NodeAllocator<DataItem>> {
  public:
-  using std::vector<DataItem>::vector;
+  using std::vector<DataItem, NodeAllocator<DataItem>>::vector;
 
   // The items joined by "," in expression form.
   Dstring AsExpression() const;
