@@ -193,7 +193,7 @@ int Reader::Read(LispList& out) {
     } else if (expectElement) {
       const std::size_t before = mElements.size();
       rc = Element();
-      if (rc == 0 && mElements.size() > before) Offer();
+      if (mSinkDepth != 0 && rc == 0 && mElements.size() > before) Offer();
       expectElement = false;
     } else if (mPos == mText.size()) {
       return Finish(out);
@@ -253,7 +253,7 @@ LispList Reader::TakeOpenList() {
 int Reader::CloseList() {
   if (mStack.size() == 1) return Fail(mPos, "')' without a matching '('");
   mElements.push_back(TakeOpenList());
-  Offer();
+  if (mSinkDepth != 0) Offer();
   ++mPos;
   return 0;
 }
