@@ -11,6 +11,7 @@
 #include "HostOptions.h"
 #include "core/ErrorJournal.h"
 #include "core/uiapp.h"
+#include "data/BerSvr.h"
 #include "data/DirtyFlagDs.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
@@ -105,6 +106,10 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
   if (ChooseServer(options, sim)) {
     if (HostConnection::Open(options.host, options.port, options.resource, list) == 0) {
       uiapp::RegistrationFinished();
+      // The status bar shows the error counts while running: the service is set up at once. A
+      // server without analyser ports just has none to show.
+      ConditionList ber;
+      uiapp::GetBerSvr()->Init(ber);
       auto window = std::make_unique<MainWin>();
       window->Attach();
       if (!options.screenshot.empty()) {

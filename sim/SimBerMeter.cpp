@@ -7,6 +7,8 @@
 namespace {
 
 constexpr std::string_view kSuffix = ":BER";
+constexpr std::string_view kReset = ":BER:RES";
+constexpr std::string_view kInject = ":BER:INJ";
 
 // The number after `word` in the header (":CGR2:MOD3:CONN1:BER", "MOD" gives 3).
 long NumberAfter(const Dstring& header, const char* word) {
@@ -37,29 +39,54 @@ void SimBerMeter::Advance(SimContext& context) {
     }
   }
   if (running && !mWasRunning) {
-    for (auto& [header, count] : mCounts) count = Count{};
+    for (auto& [header, count] : mCounts) count = Count{0, 0, count.injected};
   }
   if (running && mWasRunning && mLastMs >= 0) {
     const double seconds = static_cast<double>(now - mLastMs) / 1000.0;
     for (auto& [header, count] : mCounts) {
       const double bits = ClockOf(header, context) * seconds;
       count.compared += bits;
-      count.errors += bits * RatioOf(header);
+      count.errors += bits * (count.injected > 0 ? count.injected : RatioOf(header));
     }
   }
   mWasRunning = running;
   mLastMs = now;
 }
 
-bool SimBerMeter::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) {
-  if (!rest.EndsWith(kSuffix)) return false;
+bool SimBerMeter::PortOf(const Dstring& rest, std::string_view suffix, SimContext& context, Dstring& header) {
+  if (!rest.EndsWith(suffix)) return false;
   std::size_t index = 0;
-  if (!context.Params().Find(rest, index)) return false;
+  if (!context.Params().Find(Dstring(rest.substr(0, rest.size() - suffix.size() + kSuffix.size())), index)) return false;
+  header = context.Params().At(index).GetHeader();
+  return true;
+}
+
+bool SimBerMeter::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) {
+  Dstring header;
+  if (PortOf(rest, kReset, context, header)) {
+    if (cmd.IsQuery()) {
+      context.Error(-113);
+    } else {
+      mCounts[header] = Count{0, 0, mCounts[header].injected};
+    }
+    return true;
+  }
+  if (context.TestControl() && PortOf(rest, kInject, context, header)) {
+    char* end = nullptr;
+    const double ratio = std::strtod(cmd.GetArgs().c_str(), &end);
+    if (cmd.IsQuery() || end == cmd.GetArgs().c_str() || *end != '\0' || !(ratio >= 0 && ratio <= 0.5)) {
+      context.Error(cmd.IsQuery() ? -113 : -222);
+    } else {
+      mCounts[header].injected = ratio;
+    }
+    return true;
+  }
+  if (!PortOf(rest, kSuffix, context, header)) return false;
   if (!cmd.IsQuery()) {
     context.Error(-200);
     return true;
   }
-  const Count& count = mCounts[context.Params().At(index).GetHeader()];
+  const Count& count = mCounts[header];
   const double compared = std::floor(count.compared);
   const double errors = std::floor(count.errors);
   context.Reply(Dstring::Format("%.0f,%.0f,%.12E", compared, errors, compared > 0 ? errors / compared : 0.0));

@@ -8,6 +8,8 @@
 // as "compared,errors,ratio"). Counting starts afresh with every start of the instrument and
 // stops with it; each port compares one bit per clock of its group and sees errors at a ratio
 // of its own, so that the figures differ between ports and grow believably while it runs.
+// "<port>:BER:RES" starts a port's counts afresh; with test control, "<port>:BER:INJ RATIO"
+// sets the ratio its errors come at (0 goes back to the port's own).
 class SimBerMeter : public SimCommandModule {
  public:
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
@@ -17,7 +19,10 @@ class SimBerMeter : public SimCommandModule {
   struct Count {
     double compared = 0;
     double errors = 0;
+    double injected = 0;  // a ratio set by test control, 0 when none
   };
+  // The port's ":BER" parameter, or false when `rest` names none.
+  static bool PortOf(const Dstring& rest, std::string_view suffix, SimContext& context, Dstring& header);
   // The error ratio of a port: 1E-7 on connector 1, ten times lower on each further one, and
   // a little different per module.
   static double RatioOf(const Dstring& header);

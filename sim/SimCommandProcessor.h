@@ -45,6 +45,7 @@ class SimCommandProcessor : public SimContext {
   void NoteParamChanges() override { NoteParamChanges(mHandle); }
   // Every handle is told that everything changed (after a whole setting is replaced).
   void MarkAllDirty() override;
+  bool TestControl() const override { return mTestControl; }
 
  private:
   using Handler = void (SimCommandProcessor::*)(const SimCommand&);

@@ -24,4 +24,6 @@ class SimContext {
   virtual void NoteParamChanges() = 0;
   // Every handle hears that everything changed.
   virtual void MarkAllDirty() = 0;
+  // Whether the fault injection commands are on (--test-control).
+  virtual bool TestControl() const = 0;
 };

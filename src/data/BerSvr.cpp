@@ -60,9 +60,7 @@ int BerSvr::UpdateFromFW(unsigned what, ConditionList& list) {
   if (what != kReadResults || !mInitialized || mResults.empty()) return 0;
   FWBlocker guard("BerSvr::UpdateFromFW", list);
   if (int status = guard.Block()) return status;
-  const Dstring handle = QenGuiInst::GetAppHandle();
-  Dstring cmd;
-  for (const auto& r : mResults) cmd += (cmd.empty() ? ":" : ";:") + handle + r.port + "?";
+  const Dstring cmd = Joined("?");
   Dstring reply;
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
   std::vector<std::string_view> parts;
@@ -80,4 +78,22 @@ int BerSvr::UpdateFromFW(unsigned what, ConditionList& list) {
   if (next == mResults) return 0;
   mResults = std::move(next);
   return Update(list, 0);
+}
+
+int BerSvr::Reset(ConditionList& list) {
+  if (!mInitialized || mResults.empty()) return 0;
+  {
+    FWBlocker guard("BerSvr::Reset", list);
+    if (int status = guard.Block()) return status;
+    Dstring reply;
+    if (int status = QenGuiInst::Call(Joined(":RES"), reply, list)) return status;
+  }
+  return UpdateFromFW(kReadResults, list);
+}
+
+Dstring BerSvr::Joined(const char* suffix) const {
+  const Dstring handle = QenGuiInst::GetAppHandle();
+  Dstring cmd;
+  for (const auto& r : mResults) cmd += (cmd.empty() ? ":" : ";:") + handle + r.port + suffix;
+  return cmd;
 }

@@ -27,9 +27,14 @@ class BerSvr : public QenDs {
   void End();
   bool IsInitialized() const { return mInitialized; }
   int UpdateFromFW(unsigned what, ConditionList& list);
+  // Starts the counts of every port afresh ("<port>:RES", one frame), then reads them.
+  int Reset(ConditionList& list);
   const std::vector<PortResult>& GetResults() const { return mResults; }
 
  private:
+  // One command per port, the port's setting followed by `suffix`, joined into one frame.
+  Dstring Joined(const char* suffix) const;
+
   bool mInitialized = false;
   std::vector<PortResult> mResults;
 };

@@ -1,5 +1,6 @@
 #include "windows/WindowFactory.h"
 
+#include "windows/ber/BerBerWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
@@ -23,6 +24,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>()},
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
+      {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
   };
   return kEntries;
 }

@@ -1,0 +1,218 @@
+#include "windows/ber/BerBerWin.h"
+
+#include <QChartView>
+#include <QFileDialog>
+#include <QHeaderView>
+#include <QLabel>
+#include <QLineSeries>
+#include <QLogValueAxis>
+#include <QPushButton>
+#include <QTableWidget>
+#include <QValueAxis>
+#include <QVBoxLayout>
+#include <algorithm>
+#include <cmath>
+#include <cstring>
+#include <utility>
+
+#include "core/uiapp.h"
+#include "data/QenDsView.h"
+#include "data/RunStopDs.h"
+#include "params/ui/BoundControl.h"
+#include "toolkit/qt/ResourceLibrary.h"
+
+namespace {
+
+// A ratio of 0 has no place on a logarithmic axis: it is drawn at the axis floor.
+constexpr double kFloor = 1e-15;
+
+QString Grouped(unsigned long long value) {
+  QString digits = QString::number(value);
+  for (int at = digits.size() - 3; at > 0; at -= 3) digits.insert(at, QChar(0x2009));
+  return digits;
+}
+
+QTableWidgetItem* Cell(const QString& text, bool number) {
+  auto* item = new QTableWidgetItem(text);
+  if (number) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
+  return item;
+}
+
+// ":CGR1:MOD3:CONN1:BER" as the table and the chart name it: "Group 1 › Module 3 › Port 1",
+// the words of the parameter editor's tree.
+QString PortName(const Dstring& port) {
+  static const std::pair<const char*, const char*> kWords[] = {{"CGR", "Group "}, {"MOD", "Module "}, {"CONN", "Port "}};
+  QStringList parts;
+  for (const QString& part : QString::fromStdString(port).split(QLatin1Char(':'), Qt::SkipEmptyParts)) {
+    QString shown = part;
+    for (const auto& [word, text] : kWords) {
+      if (part.startsWith(QLatin1String(word))) shown = QLatin1String(text) + part.mid(static_cast<int>(std::strlen(word)));
+    }
+    if (part != QLatin1String("BER")) parts << shown;
+  }
+  return parts.join(QStringLiteral(" \u203A "));
+}
+
+}  // namespace
+
+class BerBerWin::View : public QenDsView {
+ public:
+  explicit View(BerBerWin& win) : mWin(win) {}
+  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
+    mWin.ShowResults();
+    return 0;
+  }
+
+ private:
+  BerBerWin& mWin;
+};
+
+BerBerWin::BerBerWin(QWidget* parent) : QWidget(parent), mView(std::make_unique<View>(*this)) {
+  setObjectName(QStringLiteral("BerBerWin"));
+  mClock.start();
+}
+
+BerBerWin::~BerBerWin() {
+  ConditionList list;
+  if (uiapp::GetBerSvr() != nullptr) uiapp::GetBerSvr()->UnregisterView(mView.get(), list);
+  if (uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->UnregisterView(mView.get(), list);
+}
+
+int BerBerWin::Load(ConditionList& list) {
+  if (int status = ResourceLibrary::LoadInto("ber.BerWin", this, list)) return status;
+  mTable = findChild<QTableWidget*>(QStringLiteral("TableBer"));
+  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
+  auto* area = findChild<QWidget*>(QStringLiteral("ChartArea"));
+  if (mTable == nullptr || mState == nullptr || area == nullptr || area->layout() == nullptr) {
+    list.Add(1, "The window resource \"ber.BerWin\" lacks its table, chart area or state line.");
+    return 1;
+  }
+  mTable->verticalHeader()->setVisible(false);
+  mTable->horizontalHeader()->setSectionResizeMode(0, QHeaderView::Stretch);
+  for (int c = 1; c < 4; ++c) mTable->horizontalHeader()->setSectionResizeMode(c, QHeaderView::ResizeToContents);
+
+  mChart = new QChart();
+  mChart->setTitle(QStringLiteral("Bit error rate over time"));
+  mChart->legend()->setAlignment(Qt::AlignRight);
+  mTimeAxis = new QValueAxis(mChart);
+  mTimeAxis->setTitleText(QStringLiteral("Time (s)"));
+  mTimeAxis->setLabelFormat(QStringLiteral("%.0f"));
+  mTimeAxis->setRange(0, 60);
+  mRatioAxis = new QLogValueAxis(mChart);
+  mRatioAxis->setTitleText(QStringLiteral("BER"));
+  mRatioAxis->setLabelFormat(QStringLiteral("%.0e"));
+  mRatioAxis->setBase(10);
+  mRatioAxis->setRange(1e-12, 1e-3);
+  mChart->addAxis(mTimeAxis, Qt::AlignBottom);
+  mChart->addAxis(mRatioAxis, Qt::AlignLeft);
+  auto* view = new QChartView(mChart, area);
+  view->setObjectName(QStringLiteral("ChartBer"));
+  view->setRenderHint(QPainter::Antialiasing);
+  area->layout()->addWidget(view);
+
+  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButReset"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
+  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportTable"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportTable);
+  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportHistory"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportHistory);
+  if (BerSvr* svr = uiapp::GetBerSvr()) {
+    // The service is set up by the first window that shows it; a failure shows as an empty table.
+    if (!svr->IsInitialized()) svr->Init(list);
+    svr->RegisterView(mView.get(), list);
+  }
+  if (uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->RegisterView(mView.get(), list);
+  ShowResults();
+  return 0;
+}
+
+void BerBerWin::ShowResults() {
+  const BerSvr* svr = uiapp::GetBerSvr();
+  const std::vector<BerSvr::PortResult> results = svr != nullptr ? svr->GetResults() : std::vector<BerSvr::PortResult>{};
+  const bool running = uiapp::GetRunStopDs() != nullptr && uiapp::GetRunStopDs()->IsRunning();
+  if (results.empty()) {
+    mState->setText(QStringLiteral("This configuration has no analyser ports."));
+  } else {
+    mState->setText(running ? QStringLiteral("Running: the counts follow the instrument.")
+                            : QStringLiteral("Stopped: the counts change only while the instrument runs."));
+  }
+  if (results == mShown && mTable->rowCount() == static_cast<int>(results.size())) return;
+  mTable->setRowCount(static_cast<int>(results.size()));
+  for (int row = 0; row < static_cast<int>(results.size()); ++row) {
+    const BerSvr::PortResult& r = results[static_cast<std::size_t>(row)];
+    mTable->setItem(row, 0, Cell(PortName(r.port), false));
+    mTable->setItem(row, 1, Cell(Grouped(r.compared), true));
+    mTable->setItem(row, 2, Cell(Grouped(r.errors), true));
+    mTable->setItem(row, 3, Cell(r.compared == 0 ? QStringLiteral("–") : QString::number(r.ratio, 'E', 2), true));
+    mTable->item(row, 2)->setForeground(r.errors > 0 ? QColor(0xb3, 0x26, 0x1e) : palette().color(QPalette::Text));
+  }
+  mShown = results;
+  if (!results.empty()) mHistory.Add(static_cast<double>(mClock.elapsed()) / 1000.0, results);
+  ShowChart();
+}
+
+void BerBerWin::ShowChart() {
+  const auto& samples = mHistory.Samples();
+  const auto& ports = mHistory.Ports();
+  while (mChart->series().size() > static_cast<int>(ports.size())) {
+    QAbstractSeries* last = mChart->series().back();
+    mChart->removeSeries(last);
+    delete last;
+  }
+  while (mChart->series().size() < static_cast<int>(ports.size())) {
+    auto* series = new QLineSeries(mChart);
+    mChart->addSeries(series);
+    series->attachAxis(mTimeAxis);
+    series->attachAxis(mRatioAxis);
+  }
+  double lowest = 1e-3;
+  double highest = 1e-12;
+  for (std::size_t p = 0; p < ports.size(); ++p) {
+    auto* series = static_cast<QLineSeries*>(mChart->series()[static_cast<int>(p)]);
+    series->setName(PortName(ports[p]));
+    QList<QPointF> points;
+    points.reserve(static_cast<int>(samples.size()));
+    for (const BerHistory::Sample& s : samples) {
+      const double ratio = std::max(s.ratios[p], kFloor);
+      points.append(QPointF(s.seconds, ratio));
+      if (s.ratios[p] > 0) {
+        lowest = std::min(lowest, ratio);
+        highest = std::max(highest, ratio);
+      }
+    }
+    series->replace(points);
+  }
+  const double last = samples.empty() ? 0.0 : samples.back().seconds;
+  mTimeAxis->setRange(std::max(0.0, last - 600.0), std::max(60.0, last));
+  if (highest >= lowest) {
+    mRatioAxis->setRange(std::pow(10.0, std::floor(std::log10(lowest)) - 1), std::pow(10.0, std::ceil(std::log10(highest)) + 1));
+  }
+}
+
+int BerBerWin::ExportTable(const Dstring& path, ConditionList& list) const {
+  return BerHistory::WriteFile(path, BerHistory::TableCsv(mShown), list);
+}
+
+int BerBerWin::ExportHistory(const Dstring& path, ConditionList& list) const {
+  return BerHistory::WriteFile(path, mHistory.HistoryCsv(), list);
+}
+
+void BerBerWin::HitPButReset() {
+  ConditionList list;
+  if (uiapp::GetBerSvr() != nullptr && uiapp::GetBerSvr()->Reset(list) == 0) mHistory.Clear();
+  ShowResults();
+  BoundControl::Report(list);
+}
+
+void BerBerWin::HitPButExportTable() {
+  ExportTo(QStringLiteral("Export Table"), QStringLiteral("ber.csv"), &BerBerWin::ExportTable);
+}
+
+void BerBerWin::HitPButExportHistory() {
+  ExportTo(QStringLiteral("Export History"), QStringLiteral("ber-history.csv"), &BerBerWin::ExportHistory);
+}
+
+void BerBerWin::ExportTo(const QString& title, const QString& name, Export write) {
+  const QString path = QFileDialog::getSaveFileName(this, title, name, QStringLiteral("CSV (*.csv);;All files (*)"));
+  if (path.isEmpty()) return;
+  ConditionList list;
+  (this->*write)(path.toStdString(), list);
+  BoundControl::Report(list);
+}

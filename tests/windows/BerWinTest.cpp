@@ -1,0 +1,106 @@
+#include <gtest/gtest.h>
+
+#include <QChart>
+#include <QLineSeries>
+#include <QPushButton>
+#include <QTableWidget>
+#include <QTest>
+#include <cstdio>
+#include <fstream>
+#include <memory>
+#include <sstream>
+
+#include "common/gui/GuiSimFixture.h"
+#include "core/uiapp.h"
+#include "data/BerSvr.h"
+#include "windows/ber/BerBerWin.h"
+
+namespace {
+
+// The bit error rate window against qensim running with errors injected on one port.
+class BerWinTest : public GuiSimFixture {
+ protected:
+  void SetUp() override {
+    GuiSimFixture::SetUp();
+    Poll();
+    mWin = std::make_unique<BerBerWin>();
+    ASSERT_EQ(mWin->Load(mList), 0) << mList.ToText();
+    mWin->show();
+    ASSERT_FALSE(uiapp::GetBerSvr()->GetResults().empty());
+    mPort = uiapp::GetBerSvr()->GetResults()[0].port;
+  }
+  void TearDown() override {
+    Other(":SGEN:GLOB:INIT:CONT OFF");
+    if (!mPort.empty()) Other(mPort + ":INJ 0");
+    mWin.reset();
+    GuiSimFixture::TearDown();
+  }
+  // Polls until the first port has counted errors; the server's clock is real, so this takes
+  // as many polls as a few milliseconds need.
+  void PollUntilErrors() {
+    for (int i = 0; i < 2000 && ErrorsOfFirst() == 0; ++i) Poll();
+    ASSERT_GT(ErrorsOfFirst(), 0u);
+  }
+  unsigned long long ErrorsOfFirst() const { return uiapp::GetBerSvr()->GetResults()[0].errors; }
+  std::string Cell(int row, int column) const { return mWin->Table()->item(row, column)->text().toStdString(); }
+  static std::string FileText(const std::string& path) {
+    std::ifstream in(path);
+    std::stringstream text;
+    text << in.rdbuf();
+    return text.str();
+  }
+
+  std::unique_ptr<BerBerWin> mWin;
+  Dstring mPort;
+};
+
+}  // namespace
+
+TEST_F(BerWinTest, TableAndChartFollowTheRunAndResetStartsAfresh) {
+  const int ports = static_cast<int>(uiapp::GetBerSvr()->GetResults().size());
+  EXPECT_EQ(mWin->Table()->rowCount(), ports);
+  EXPECT_EQ(Cell(0, 3), "–");  // nothing compared yet
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  PollUntilErrors();
+  // The injected port's ratio is shown as the server counts it; the chart has a line per port.
+  EXPECT_NEAR(std::stod(Cell(0, 3)), 1e-2, 2e-3) << Cell(0, 3);
+  ASSERT_EQ(mWin->Chart()->series().size(), ports);
+  auto* line = static_cast<QLineSeries*>(mWin->Chart()->series()[0]);
+  ASSERT_GE(line->count(), 1);
+  EXPECT_NEAR(line->at(line->count() - 1).y(), 1e-2, 2e-3);
+
+  // Stopped, the counts stand still; reset starts them at nothing.
+  Other(":SGEN:GLOB:INIT:CONT OFF");
+  Poll();
+  ASSERT_GT(uiapp::GetBerSvr()->GetResults()[0].compared, 0u);
+  QTest::mouseClick(mWin->findChild<QPushButton*>(QStringLiteral("PButReset")), Qt::LeftButton);
+  EXPECT_EQ(uiapp::GetBerSvr()->GetResults()[0].compared, 0u);
+  EXPECT_EQ(Cell(0, 1), "0");
+  EXPECT_EQ(Cell(0, 3), "–");
+  EXPECT_LE(mWin->History().Samples().size(), 1u);
+}
+
+TEST_F(BerWinTest, ExportsTheTableAndTheHistoryAndNamesAPathItCannotWrite) {
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  PollUntilErrors();
+  const std::string table = testing::TempDir() + "ber-table.csv";
+  const std::string history = testing::TempDir() + "ber-history.csv";
+  ASSERT_EQ(mWin->ExportTable(table, mList), 0) << mList.ToText();
+  ASSERT_EQ(mWin->ExportHistory(history, mList), 0) << mList.ToText();
+  const std::string tableText = FileText(table);
+  EXPECT_EQ(tableText.rfind("port,compared,errors,ratio\n" + mPort + ",", 0), 0u) << tableText;
+  EXPECT_EQ(static_cast<std::size_t>(std::count(tableText.begin(), tableText.end(), '\n')),
+            uiapp::GetBerSvr()->GetResults().size() + 1);
+  const std::string historyText = FileText(history);
+  EXPECT_EQ(historyText.rfind("seconds," + mPort, 0), 0u) << historyText;
+  EXPECT_EQ(static_cast<std::size_t>(std::count(historyText.begin(), historyText.end(), '\n')),
+            mWin->History().Samples().size() + 1);
+  std::remove(table.c_str());
+  std::remove(history.c_str());
+
+  ConditionList refused;
+  EXPECT_NE(mWin->ExportTable("/nonexistent-dir/ber.csv", refused), 0);
+  EXPECT_NE(refused.ToText().find("/nonexistent-dir/ber.csv"), std::string::npos) << refused.ToText();
+}
