@@ -62,43 +62,56 @@ bool ReadNumber(const Dstring& text, unsigned long& out) {
   return text.ToULong(out) && out > 0 && out < 1000;
 }
 
-bool SetReadOnly(const Dstring&, SimParam& param, Dstring&) {
+// What a param line's options give besides the parameter itself.
+struct ParamExtras {
+  Dstring unit;
+  int exponent = SimUnitAttr::kNotSet;  // "exp=": the prefix it is shown with, else the unit's
+};
+
+bool SetReadOnly(const Dstring&, SimParam& param, ParamExtras&) {
   param.SetReadOnly(true);
   return true;
 }
 
-bool SetRelock(const Dstring&, SimParam& param, Dstring&) {
+bool SetRelock(const Dstring&, SimParam& param, ParamExtras&) {
   param.SetRelock(true);
   return true;
 }
 
-bool SetMin(const Dstring& value, SimParam& param, Dstring&) {
+bool SetMin(const Dstring& value, SimParam& param, ParamExtras&) {
   double v = 0.0;
   if (!value.ToDouble(v)) return false;
   param.SetRange(v, param.GetHmax());
   return true;
 }
 
-bool SetMax(const Dstring& value, SimParam& param, Dstring&) {
+bool SetMax(const Dstring& value, SimParam& param, ParamExtras&) {
   double v = 0.0;
   if (!value.ToDouble(v)) return false;
   param.SetRange(param.GetLmax(), v);
   return true;
 }
 
-bool SetResolution(const Dstring& value, SimParam& param, Dstring&) {
+bool SetResolution(const Dstring& value, SimParam& param, ParamExtras&) {
   double v = 0.0;
   if (!value.ToDouble(v) || v <= 0.0) return false;
   param.SetResolution(v);
   return true;
 }
 
-bool SetUnit(const Dstring& value, SimParam&, Dstring& unit) {
-  unit = value;
+bool SetUnit(const Dstring& value, SimParam&, ParamExtras& extras) {
+  extras.unit = value;
   return !value.empty();
 }
 
-bool SetValues(const Dstring& value, SimParam& param, Dstring&) {
+bool SetExponent(const Dstring& value, SimParam&, ParamExtras& extras) {
+  long exp = 0;
+  if (!value.ToLong(exp) || exp % 3 != 0 || exp < -12 || exp > 9) return false;
+  extras.exponent = static_cast<int>(exp);
+  return true;
+}
+
+bool SetValues(const Dstring& value, SimParam& param, ParamExtras&) {
   param.SetWords(DstringList::Split(value, '|'));
   return !value.empty();
 }
@@ -106,7 +119,7 @@ bool SetValues(const Dstring& value, SimParam& param, Dstring&) {
 struct ParamOption {
   const char* key;
   bool takesValue;
-  bool (*set)(const Dstring& value, SimParam& param, Dstring& unit);
+  bool (*set)(const Dstring& value, SimParam& param, ParamExtras& extras);
 };
 
 constexpr ParamOption kParamOptions[] = {
@@ -116,6 +129,7 @@ constexpr ParamOption kParamOptions[] = {
     {"max", true, SetMax},
     {"res", true, SetResolution},
     {"unit", true, SetUnit},
+    {"exp", true, SetExponent},
     {"values", true, SetValues},
 };
 
@@ -151,8 +165,8 @@ class Reader {
   bool ReadSelector(const Dstring& word, Template& t);
 
   bool AddParam(const Line& line, const Placeholders& names);
-  bool ReadOption(const Line& line, const Dstring& option, SimParam& param, Dstring& unit);
-  void SetDefaultAttr(SimParam& param, const Dstring& unit);
+  bool ReadOption(const Line& line, const Dstring& option, SimParam& param, ParamExtras& extras);
+  void SetDefaultAttr(SimParam& param, const ParamExtras& extras);
   bool ExpandGroup(const Group& g);
   bool ExpandModule(const Module& m, Placeholders names);
   bool Expand(Scope scope, const Placeholders& names, const Dstring& kind, const Dstring& model,
@@ -324,9 +338,9 @@ bool Reader::AddParam(const Line& raw, const Placeholders& names) {
     return Fail(line, Dstring::Format("bad header %s", w[1].c_str()));
   }
   SimParam param(w[1].ToUpper(), type);
-  Dstring unit;
+  ParamExtras extras;
   for (std::size_t i = 4; i < w.size(); ++i) {
-    if (!ReadOption(line, w[i], param, unit)) return false;
+    if (!ReadOption(line, w[i], param, extras)) return false;
   }
   double number = 0.0;
   Dstring text;
@@ -334,25 +348,27 @@ bool Reader::AddParam(const Line& raw, const Placeholders& names) {
     return Fail(line, Dstring::Format("bad value %s", w[3].c_str()));
   if (param.IsNumeric() && !param.IsWithinLimits(number)) return Fail(line, "value outside min..max");
   param.SetValue(number, text);
-  if (param.GetAttr().GetUnit().empty()) SetDefaultAttr(param, unit);
+  if (param.GetAttr().GetUnit().empty()) SetDefaultAttr(param, extras);
+  if (param.GetAttr().Check() != 0) return Fail(line, "exp outside the exponents of its unit");
   if (!mTable.Add(param))
     return Fail(line, Dstring::Format("%s is defined twice", param.GetHeader().c_str()));
   return true;
 }
 
-bool Reader::ReadOption(const Line& line, const Dstring& option, SimParam& param, Dstring& unit) {
+bool Reader::ReadOption(const Line& line, const Dstring& option, SimParam& param, ParamExtras& extras) {
   std::size_t eq = option.find('=');
   Dstring key = option.substr(0, eq);
   Dstring value = eq == Dstring::npos ? Dstring() : Dstring(option.substr(eq + 1));
   for (const ParamOption& o : kParamOptions) {
-    if (key == o.key && o.takesValue == (eq != Dstring::npos) && o.set(value, param, unit)) return true;
+    if (key == o.key && o.takesValue == (eq != Dstring::npos) && o.set(value, param, extras)) return true;
   }
   return Fail(line, Dstring::Format("bad option %s", option.c_str()));
 }
 
-void Reader::SetDefaultAttr(SimParam& param, const Dstring& unit) {
-  auto known = mUnits.find(unit);
-  param.SetAttr(known != mUnits.end() ? known->second : SimUnitAttr(unit, 0, 0, SimUnitAttr::kNotSet, 1.0));
+void Reader::SetDefaultAttr(SimParam& param, const ParamExtras& extras) {
+  auto known = mUnits.find(extras.unit);
+  SimUnitAttr attr = known != mUnits.end() ? known->second : SimUnitAttr(extras.unit, 0, 0, SimUnitAttr::kNotSet, 1.0);
+  param.SetAttr(extras.exponent == SimUnitAttr::kNotSet ? attr : attr.WithCurExp(extras.exponent));
 }
 
 bool Reader::Expand(Scope scope, const Placeholders& names, const Dstring& kind, const Dstring& model,

@@ -25,6 +25,12 @@ class SimUnitAttr {
   int Check() const;
 
   const Dstring& GetUnit() const { return mUnit; }
+  // The same with another current exponent (the prefix a value is shown with).
+  SimUnitAttr WithCurExp(int exp) const {
+    SimUnitAttr out = *this;
+    out.mCurExp = exp;
+    return out;
+  }
   bool operator==(const SimUnitAttr&) const = default;
 
  private:

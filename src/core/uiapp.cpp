@@ -1,5 +1,6 @@
 #include "core/uiapp.h"
 
+#include "core/MeasconfMeasMode.h"
 #include "data/BerSvr.h"
 #include "data/ConnectDs.h"
 #include "data/DataPortOneLockDs.h"
@@ -204,6 +205,7 @@ int uiapp::Run(ConditionList& list) {
   FWBlocker guard("uiapp::Run", list);
   if (int status = guard.Block()) return status;
   if (int status = CPortInfo::GetSequence()->SyncSegments(list)) return status;
+  if (int status = MeasconfMeasMode::UpdateBeforeRun(list)) return status;
   return mRunStopDs->Run(list);
 }
 

@@ -3,6 +3,7 @@
 #include "windows/ber/BerBerWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
+#include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 
 namespace {
@@ -25,6 +26,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
+      {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
   };
   return kEntries;
 }
