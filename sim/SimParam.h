@@ -30,6 +30,7 @@ class SimParam {
   Dstring FormatNumber(double v) const;
 
   double GetNumber() const { return mNumber; }
+  const Dstring& GetText() const { return mText; }
   void SetValue(double number, const Dstring& text) {
     mNumber = number;
     mText = text;

@@ -1,6 +1,7 @@
 #include "core/uiapp.h"
 
 #include "core/MeasconfMeasMode.h"
+#include "core/SelfTest.h"
 #include "data/BerSvr.h"
 #include "data/ConnectDs.h"
 #include "data/DataPortOneLockDs.h"
@@ -20,6 +21,7 @@
 #include "sequences/SegmentPoolSync.h"
 #include "settings/QENSettingProfile.h"
 #include "settings/SettingStartUp.h"
+#include "support/ConditionListLoader.h"
 #include "support/ErrorMgr.h"
 #include "support/FWBlocker.h"
 #include "support/MessageCatalogue.h"
@@ -210,6 +212,14 @@ int uiapp::Run(ConditionList& list) {
 }
 
 int uiapp::Stop(ConditionList& list) { return mRunStopDs->Stop(list); }
+
+int uiapp::DoSelfTest(ConditionList& list) {
+  if (SelfTest::GetTool() == nullptr) {
+    ConditionListLoader::ConditionToken(list, "GUI_SELFTEST_NO_WINDOW", {}, 1);
+    return 1;
+  }
+  return SelfTest::GetTool()->Run(list);
+}
 
 void uiapp::NfyDelayedStop(void*) {
   ConditionList dropped;

@@ -60,6 +60,9 @@ class uiapp {
   static int Stop(ConditionList& list);
   static void NfyDelayedStop(void*);
   static int SequenceForce(ConditionList& list);
+  // Runs the instrument's self test in the self test window (the tool the window layer
+  // registers); without one, GUI_SELFTEST_NO_WINDOW.
+  static int DoSelfTest(ConditionList& list);
   static int CheckTriggerMode(ConditionList& list);
 
   static void StartPolling();

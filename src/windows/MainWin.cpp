@@ -13,6 +13,7 @@
 #include <QToolBar>
 #include <QVBoxLayout>
 
+#include "core/SelfTest.h"
 #include "core/uiapp.h"
 #include "data/GuiLockDs.h"
 #include "data/QenDsView.h"
@@ -22,6 +23,7 @@
 #include "toolkit/WaitCursor.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
+#include "windows/selftest/SelftestResultWin.h"
 
 namespace {
 
@@ -68,7 +70,21 @@ MainWin::MainWin(QWidget* parent)
   UpdateTitle();
 }
 
+// uiapp::DoSelfTest opens the self test window and starts the test there.
+class MainWin::SelfTestTool : public SelfTest::Tool {
+ public:
+  explicit SelfTestTool(MainWin& win) : mWin(win) {}
+  int Run(ConditionList& list) override {
+    auto* window = qobject_cast<SelftestResultWin*>(mWin.OpenWindow(QStringLiteral("selftest.Result")));
+    return window != nullptr ? window->StartTest(list) : 1;
+  }
+
+ private:
+  MainWin& mWin;
+};
+
 MainWin::~MainWin() {
+  if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
   if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
     ConditionList list;
     uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
@@ -77,6 +93,8 @@ MainWin::~MainWin() {
 
 void MainWin::Attach() {
   mStatus->Attach();
+  mSelfTest = std::make_unique<SelfTestTool>(*this);
+  SelfTest::SetTool(mSelfTest.get());
   mLockView = std::make_unique<LockView>(*this);
   ConditionList list;
   uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
@@ -123,6 +141,7 @@ void MainWin::BuildInstrumentMenu() {
   add(QStringLiteral("Outputs O&ff"), QKeySequence(), &uiapp::Disconnect, false);
   menu->addSeparator();
   add(QStringLiteral("Check &Trigger Mode"), QKeySequence(), &uiapp::CheckTriggerMode, false);
+  add(QStringLiteral("Self &Test..."), QKeySequence(), &uiapp::DoSelfTest, false);
 }
 
 void MainWin::BuildWindowsMenu() {

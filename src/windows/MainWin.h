@@ -38,6 +38,7 @@ class MainWin : public QMainWindow {
 
  private:
   class LockView;
+  class SelfTestTool;
 
   void BuildMenus();
   void BuildFileMenu();
@@ -58,4 +59,5 @@ class MainWin : public QMainWindow {
   StateStatusBar* mStatus;
   QMenu* mRecent = nullptr;
   std::unique_ptr<LockView> mLockView;
+  std::unique_ptr<SelfTestTool> mSelfTest;
 };

@@ -5,6 +5,7 @@
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
+#include "windows/selftest/SelftestResultWin.h"
 
 namespace {
 
@@ -27,6 +28,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
       {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
+      {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
   };
   return kEntries;
 }

@@ -12,14 +12,13 @@
 #include <QVBoxLayout>
 #include <algorithm>
 #include <cmath>
-#include <cstring>
-#include <utility>
 
 #include "core/uiapp.h"
 #include "data/QenDsView.h"
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/PlaceName.h"
 
 namespace {
 
@@ -36,21 +35,6 @@ QTableWidgetItem* Cell(const QString& text, bool number) {
   auto* item = new QTableWidgetItem(text);
   if (number) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
   return item;
-}
-
-// ":CGR1:MOD3:CONN1:BER" as the table and the chart name it: "Group 1 › Module 3 › Port 1",
-// the words of the parameter editor's tree.
-QString PortName(const Dstring& port) {
-  static const std::pair<const char*, const char*> kWords[] = {{"CGR", "Group "}, {"MOD", "Module "}, {"CONN", "Port "}};
-  QStringList parts;
-  for (const QString& part : QString::fromStdString(port).split(QLatin1Char(':'), Qt::SkipEmptyParts)) {
-    QString shown = part;
-    for (const auto& [word, text] : kWords) {
-      if (part.startsWith(QLatin1String(word))) shown = QLatin1String(text) + part.mid(static_cast<int>(std::strlen(word)));
-    }
-    if (part != QLatin1String("BER")) parts << shown;
-  }
-  return parts.join(QStringLiteral(" \u203A "));
 }
 
 }  // namespace
@@ -137,7 +121,7 @@ void BerBerWin::ShowResults() {
   mTable->setRowCount(static_cast<int>(results.size()));
   for (int row = 0; row < static_cast<int>(results.size()); ++row) {
     const BerSvr::PortResult& r = results[static_cast<std::size_t>(row)];
-    mTable->setItem(row, 0, Cell(PortName(r.port), false));
+    mTable->setItem(row, 0, Cell(PlaceName(r.port), false));
     mTable->setItem(row, 1, Cell(Grouped(r.compared), true));
     mTable->setItem(row, 2, Cell(Grouped(r.errors), true));
     mTable->setItem(row, 3, Cell(r.compared == 0 ? QStringLiteral("–") : QString::number(r.ratio, 'E', 2), true));
@@ -166,7 +150,7 @@ void BerBerWin::ShowChart() {
   double highest = 1e-12;
   for (std::size_t p = 0; p < ports.size(); ++p) {
     auto* series = static_cast<QLineSeries*>(mChart->series()[static_cast<int>(p)]);
-    series->setName(PortName(ports[p]));
+    series->setName(PlaceName(ports[p]));
     QList<QPointF> points;
     points.reserve(static_cast<int>(samples.size()));
     for (const BerHistory::Sample& s : samples) {
