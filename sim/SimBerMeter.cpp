@@ -1,20 +1,14 @@
 #include "SimBerMeter.h"
 
 #include <cmath>
-#include <cstdlib>
-#include <cstring>
+
+#include "SimPlace.h"
 
 namespace {
 
 constexpr std::string_view kSuffix = ":BER";
 constexpr std::string_view kReset = ":BER:RES";
 constexpr std::string_view kInject = ":BER:INJ";
-
-// The number after `word` in the header (":CGR2:MOD3:CONN1:BER", "MOD" gives 3).
-long NumberAfter(const Dstring& header, const char* word) {
-  auto at = header.find(word);
-  return at == Dstring::npos ? 0 : std::strtol(header.c_str() + at + std::strlen(word), nullptr, 10);
-}
 
 }  // namespace
 

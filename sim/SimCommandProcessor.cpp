@@ -1,6 +1,7 @@
 #include "SimCommandProcessor.h"
 
 #include "SimBerMeter.h"
+#include "SimDeskew.h"
 #include "SimSelfTest.h"
 #include "SimSegmentStore.h"
 #include "SimSequence.h"
@@ -130,6 +131,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
   mModules.push_back(std::make_shared<SimSequence>(mParams));
   mModules.push_back(std::make_shared<SimSegmentStore>(dataDir));
   mModules.push_back(std::make_shared<SimSelfTest>());
+  mModules.push_back(std::make_shared<SimDeskew>());
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {

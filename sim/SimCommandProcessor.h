@@ -43,6 +43,7 @@ class SimCommandProcessor : public SimContext {
   const SimGlobalState& Global() const override { return mGlobal; }
   void MarkChanged(const Dstring& header) override { MarkDirty(header, mHandle); }
   void NoteParamChanges() override { NoteParamChanges(mHandle); }
+  void NoteInstrumentChanges() override { NoteParamChanges(""); }
   // Every handle is told that everything changed (after a whole setting is replaced).
   void MarkAllDirty() override;
   bool TestControl() const override { return mTestControl; }

@@ -22,6 +22,9 @@ class SimContext {
   // After parameters were written: their value and limit changes reach the other handles
   // and the coupled queries.
   virtual void NoteParamChanges() = 0;
+  // The same for changes the instrument made itself: every handle hears them, the one
+  // running the command too.
+  virtual void NoteInstrumentChanges() = 0;
   // Every handle hears that everything changed.
   virtual void MarkAllDirty() = 0;
   // Whether the fault injection commands are on (--test-control).

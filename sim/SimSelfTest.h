@@ -2,25 +2,23 @@
 
 #include <vector>
 
-#include "SimCommandModule.h"
+#include "SimTimedTask.h"
 
-// The instrument's self test: every module is tested in turn, kSecondsPerModule each, while
-// the client asks how far it is. Commands under the handle:
-//   ":SYST:TEST:STAR"   starts it (-200 while the instrument runs or a test is going on)
-//   ":SYST:TEST:STAT?"  "IDLE|RUNN|DONE|ABOR",<modules done>,<modules>
-//   ":SYST:TEST:RES?"   ("<module>","<model>","PASS|FAIL|NRUN","<detail>"),... of the last test
-//   ":SYST:TEST:ABOR"   stops it; modules not yet tested are "NRUN"
+// The instrument's self test (":SYST:TEST", see SimTimedTask): every module is tested in turn,
+// 0.6 s each. Besides the task's commands:
+//   ":SYST:TEST:RES?"  ("<module>","<model>",PASS|FAIL|NRUN,"<detail>"),... of the last test
 //   ":SYST:TEST:FAIL \"<module>\"" (test control) makes that module fail from then on; "" clears.
-//   ":SYST:TEST:PACE MS" (test control) the time one module takes, kSecondsPerModule at start.
-class SimSelfTest : public SimCommandModule {
+class SimSelfTest : public SimTimedTask {
  public:
-  static constexpr double kSecondsPerModule = 0.6;
+  SimSelfTest() : SimTimedTask(":SYST:TEST", 0.6) {}
 
-  bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
-  void Advance(SimContext& context) override;
+ protected:
+  std::size_t Begin(SimContext& context) override;
+  void ItemDone(std::size_t item, SimContext& context) override;
+  void Aborted(std::size_t, SimContext&) override {}
+  bool RunTaskCommand(const Dstring& what, const SimCommand& cmd, SimContext& context) override;
 
  private:
-  enum class State { Idle, Running, Done, Aborted };
   struct Module {
     Dstring path;  // ":CGR1:MOD2"
     Dstring model;
@@ -28,14 +26,6 @@ class SimSelfTest : public SimCommandModule {
     Dstring detail;
   };
 
-  void Start(SimContext& context);
-  void Finish(std::size_t upTo);
-  static const char* Word(State state);
-
-  State mState = State::Idle;
   std::vector<Module> mModules;
-  long long mStartMs = 0;
-  std::size_t mDone = 0;
   Dstring mFailing;
-  double mSecondsPerModule = kSecondsPerModule;
 };

@@ -2,21 +2,15 @@
 
 #include <vector>
 
+#include "core/InstrumentTask.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
 
-// The instrument's self test, as the self test tool drives it: start, ask how far it is,
-// read the outcome per module, cancel. A test runs on the instrument for some seconds; the
-// tool asks its progress while the program goes on. The window that shows it is the Tool,
-// which the Qt layer registers; uiapp::DoSelfTest hands over to it.
+// The instrument's self test (":SYST:TEST", an InstrumentTask) and the outcome per module. The
+// window that runs it is the Tool, which the window layer registers; uiapp::DoSelfTest hands
+// over to it.
 class SelfTest {
  public:
-  enum class State { Idle, Running, Done, Aborted };
-  struct Progress {
-    State state = State::Idle;
-    unsigned long done = 0;
-    unsigned long total = 0;
-  };
   struct ModuleResult {
     Dstring module;  // ":CGR1:MOD2"
     Dstring model;
@@ -34,10 +28,8 @@ class SelfTest {
   static void SetTool(Tool* tool) { sTool = tool; }
   static Tool* GetTool() { return sTool; }
 
-  static int Start(ConditionList& list);
-  static int Ask(Progress& out, ConditionList& list);
+  static InstrumentTask Task() { return InstrumentTask(":SYST:TEST"); }
   static int Results(std::vector<ModuleResult>& out, ConditionList& list);
-  static int Cancel(ConditionList& list);
 
  private:
   static inline Tool* sTool = nullptr;

@@ -1,6 +1,7 @@
 #include "windows/WindowFactory.h"
 
 #include "windows/ber/BerBerWin.h"
+#include "windows/deskew/DeskewDeskewWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/measconf/MeasconfMeasModeDlg.h"
@@ -28,6 +29,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
       {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
+      {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
   };
   return kEntries;

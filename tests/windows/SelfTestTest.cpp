@@ -10,6 +10,7 @@
 #include "core/SelfTest.h"
 #include "core/uiapp.h"
 #include "windows/MainWin.h"
+#include "windows/TaskFollower.h"
 #include "windows/selftest/SelftestResultWin.h"
 
 namespace {
@@ -50,7 +51,7 @@ TEST_F(SelfTestTest, AModuleMadeToFailIsShownFailedWithWhatItReported) {
   Other(":SYST:TEST:FAIL \"CGR1:MOD2\"");
   SelftestResultWin* w = Run();
   ASSERT_NE(w, nullptr);
-  EXPECT_FALSE(w->IsTesting());
+  EXPECT_FALSE(w->Follower()->IsActive());
   ASSERT_EQ(w->Table()->rowCount(), 5);
   EXPECT_EQ(Cell(w, 0, 2), "Passed");
   EXPECT_EQ(Cell(w, 1, 0), "Group 1 › Module 2");
@@ -63,16 +64,16 @@ TEST_F(SelfTestTest, CancelStopsItOnTheInstrumentAndLeavesTheRestNotRun) {
   Other(":SYST:TEST:PACE 60000");
   SelftestResultWin* w = Run();
   ASSERT_NE(w, nullptr);
-  EXPECT_TRUE(w->IsTesting());
+  EXPECT_TRUE(w->Follower()->IsActive());
   EXPECT_EQ(w->StateText().toStdString(), "Testing module 1 of 5…");
   // Held by another client meanwhile: still followed, and said so.
   Control(":TEST:LOCK ON");
   ConditionList locked;
-  EXPECT_NE(w->PollProgress(locked), 0);
-  EXPECT_TRUE(w->IsTesting());
+  EXPECT_NE(w->Follower()->Poll(locked), 0);
+  EXPECT_TRUE(w->Follower()->IsActive());
   Control(":TEST:LOCK OFF");
   QTest::mouseClick(w->findChild<QPushButton*>(QStringLiteral("PButCancel")), Qt::LeftButton);
-  EXPECT_FALSE(w->IsTesting());
+  EXPECT_FALSE(w->Follower()->IsActive());
   EXPECT_EQ(Other(":SYST:TEST:STAT?"), "ABOR,0,5");
   EXPECT_EQ(Cell(w, 4, 2), "Not run");
   EXPECT_EQ(w->StateText().toStdString(), "Cancelled after 0 of 5 modules.");

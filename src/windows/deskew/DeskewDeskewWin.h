@@ -1,0 +1,30 @@
+#pragma once
+
+#include <QWidget>
+
+#include "support/ConditionList.h"
+
+class QLabel;
+class TaskFollower;
+
+// The deskew tool ("deskew.DeskewWin"): the delay of every data port as a bound parameter
+// field with its unit, and the automatic deskew (":SYST:DESK", an InstrumentTask), which the
+// instrument carries out port by port with a progress bar and cancel. The fields follow the
+// delays the instrument sets as it goes, through the poll like any other change.
+class DeskewDeskewWin : public QWidget {
+  Q_OBJECT
+
+ public:
+  explicit DeskewDeskewWin(QWidget* parent = nullptr);
+  ~DeskewDeskewWin() override;
+
+  int Load(ConditionList& list);
+  TaskFollower* Follower() const { return mFollower; }
+  QString StateText() const;
+
+ private:
+  int AddPortFields(QWidget* area, ConditionList& list);
+
+  QLabel* mState = nullptr;
+  TaskFollower* mFollower = nullptr;
+};
