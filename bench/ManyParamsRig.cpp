@@ -20,8 +20,19 @@ ManyParamsRig::ManyParamsRig() {
   for (int i = 0; i < kManyParams; ++i) {
     out << "param :BENCH:G" << i / kGroupSize << ":P" << i % kGroupSize << " double " << i << " unit=V min=-1E9 max=1E9\n";
   }
+  // A rack of kAnalyserPorts analyser ports (16 clock groups of two modules of two), for the
+  // error rate service.
+  out << "model K2270A analyser\n"
+         "template group\nparam {group}:FREQ double 1E9 min=1E6 max=1E10\nend\n"
+         "template module\nparam {module}:TYPE string \"{model}\" readonly\nend\n"
+         "template port type=PDAT kind=analyser\nparam {port}:VOLT:THR double 0.5 min=-2 max=3\n"
+         "param {port}:BER string \"0,0,0\" readonly\nend\n";
+  for (int g = 1; g <= kAnalyserPorts / 4; ++g) {
+    out << "group " << g << "\n";
+    for (int m = 1; m <= 2; ++m) out << "module " << m << " K2270A\nport 1 PDAT\nport 2 PDAT\n";
+  }
   out.close();
-  mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--config", config.string()});
+  mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--test-control", "--config", config.string()});
   ConditionList list;
   uiapp::Init(list);
   auto tcp = std::make_unique<QenTcpInstrument>();

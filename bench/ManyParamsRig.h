@@ -28,12 +28,14 @@ class CountingInstrument : public QenInstrument {
 };
 
 // qensim with a configuration of kManyParams numeric parameters in volts, in groups of
-// kGroupSize as the parameters of a port are (":BENCH:G<g>:P<i>"),
+// kGroupSize as the parameters of a port are (":BENCH:G<g>:P<i>"), and a rack of
+// kAnalyserPorts analyser ports,
 // and the application started against it through a counting connection. One per program.
 class ManyParamsRig {
  public:
   static constexpr int kManyParams = 1000;
   static constexpr int kGroupSize = 50;
+  static constexpr int kAnalyserPorts = 64;
 
   static ManyParamsRig& Get();
   bool Ok() const;

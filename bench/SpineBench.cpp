@@ -9,6 +9,8 @@
 #include <vector>
 
 #include "core/uiapp.h"
+#include "data/BerSvr.h"
+#include "data/DirtyFlagDs.h"
 #include "data/Dte.h"
 #include "data/QenDs.h"
 #include "data/QenDsView.h"
@@ -77,6 +79,48 @@ void BM_IdlePollTickVsOneRawCall(benchmark::State& state) {
   state.counters["ratio"] = tick / raw;
 }
 
+// Poll ticks of a running instrument with 64 analyser ports, with the error rate service set
+// up (as the bit error rate window and the status bar have it) and without: the round trips
+// each tick costs, and the difference (at most one: all ports are read in one joined query).
+void BM_BerPollTick64PortsVsWithout(benchmark::State& state) {
+  ManyParamsRig& rig = ManyParamsRig::Get();
+  if (!rig.Ok()) return state.SkipWithError("qensim did not start");
+  ConditionList list;
+  Dstring reply;
+  QenGuiInst::Call(":TEST:STAT SYST,RUNN", reply, list);
+  uiapp::GetDirtyFlagDs()->ForceUpdate();
+  uiapp::AsyncAlarmProc(nullptr);
+  uiapp::SyncTimeOut();
+  if (uiapp::GetBerSvr()->Init(list) != 0 || uiapp::GetBerSvr()->GetResults().size() != ManyParamsRig::kAnalyserPorts) {
+    return state.SkipWithError("the error rate service did not find the 64 ports");
+  }
+  long with = 0, without = 0;
+  double withSeconds = 0, withoutSeconds = 0;
+  for (auto _ : state) {
+    long before = rig.Calls();
+    auto t0 = std::chrono::steady_clock::now();
+    uiapp::AsyncAlarmProc(nullptr);
+    withSeconds += Seconds(t0);
+    with += rig.Calls() - before;
+    uiapp::GetBerSvr()->End();
+    before = rig.Calls();
+    t0 = std::chrono::steady_clock::now();
+    uiapp::AsyncAlarmProc(nullptr);
+    withoutSeconds += Seconds(t0);
+    without += rig.Calls() - before;
+    uiapp::GetBerSvr()->Init(list);
+  }
+  uiapp::GetBerSvr()->End();
+  uiapp::EndPolling();
+  QenGuiInst::Call(":TEST:STAT SYST,PROG", reply, list);
+  const double n = static_cast<double>(state.iterations());
+  state.counters["ports"] = ManyParamsRig::kAnalyserPorts;
+  state.counters["round_trips_with"] = static_cast<double>(with) / n;
+  state.counters["round_trips_without"] = static_cast<double>(without) / n;
+  state.counters["added_round_trips"] = static_cast<double>(with - without) / n;
+  state.counters["ratio"] = withSeconds / withoutSeconds;
+}
+
 // Lookups by name among `state.range(0)` live sources; per-lookup time should not grow with it.
 void BM_RepositoryLookup(benchmark::State& state) {
   const int count = static_cast<int>(state.range(0));
@@ -127,5 +171,6 @@ void BM_NotifyManyViews(benchmark::State& state) {
 
 BENCHMARK(BM_RefreshManySourcesVsOneQueryEach)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(2.0);
 BENCHMARK(BM_IdlePollTickVsOneRawCall)->UseRealTime()->MinTime(1.0);
+BENCHMARK(BM_BerPollTick64PortsVsWithout)->UseRealTime()->MinTime(1.0);
 BENCHMARK(BM_RepositoryLookup)->Arg(1000)->Arg(10000);
 BENCHMARK(BM_NotifyManyViews)->Arg(1000)->Arg(10000);
