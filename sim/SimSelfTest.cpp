@@ -9,7 +9,7 @@ constexpr std::string_view kTypeSuffix = ":TYPE";
 
 // What a failing module reports: the check a real module's test would stop at.
 Dstring FailureOf(const Dstring& model) {
-  return "Output stage of " + model + ": amplitude 0.82 V where 1.00 V is expected";
+  return "Front end of " + model + ": level check read 0.82 V where 1.00 V is expected";
 }
 
 }  // namespace

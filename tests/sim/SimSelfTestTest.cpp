@@ -20,7 +20,7 @@ TEST_F(SimSelfTestTest, ModulesAreTestedInTurnAndAFailingOneIsReported) {
   EXPECT_EQ(Text(":_H:SYST:TEST:STAT?"), "DONE,5,5");
   const std::string results = Text(":_H:SYST:TEST:RES?");
   EXPECT_EQ(results.substr(0, 54), "(\":CGR1:MOD1\",\"K2268A\",PASS,\"\"),(\":CGR1:MOD2\",\"K2269B\"") << results;
-  EXPECT_NE(results.find("\"K2269B\",FAIL,\"Output stage of K2269B"), std::string::npos) << results;
+  EXPECT_NE(results.find("\"K2269B\",FAIL,\"Front end of K2269B"), std::string::npos) << results;
 }
 
 TEST_F(SimSelfTestTest, CancelLeavesTheRestUntested) {
