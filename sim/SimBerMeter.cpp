@@ -24,6 +24,12 @@ double SimBerMeter::ClockOf(const Dstring& header, SimContext& context) {
   return context.Params().Find(freq, index) ? context.Params().At(index).GetNumber() : 0.0;
 }
 
+double SimBerMeter::RatioFor(const Dstring& port) const {
+  const Dstring header = port + Dstring(kSuffix);
+  auto it = mCounts.find(header);
+  return it != mCounts.end() && it->second.injected > 0 ? it->second.injected : RatioOf(header);
+}
+
 void SimBerMeter::Advance(SimContext& context) {
   const long long now = context.NowMs();
   const bool running = context.Global().IsRunning();

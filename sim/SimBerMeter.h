@@ -14,6 +14,8 @@ class SimBerMeter : public SimCommandModule {
  public:
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
   void Advance(SimContext& context) override;
+  // The ratio a data port (":CGR1:MOD3:CONN1") sees errors at now: the injected one, else its own.
+  double RatioFor(const Dstring& port) const;
 
  private:
   struct Count {

@@ -1,6 +1,7 @@
 #include "SimCommandProcessor.h"
 
 #include "SimBerMeter.h"
+#include "SimCapture.h"
 #include "SimDeskew.h"
 #include "SimSelfTest.h"
 #include "SimSegmentStore.h"
@@ -22,7 +23,8 @@ struct ErrorText {
 
 constexpr ErrorText kErrorTexts[] = {
     {-100, "Command error"},           {-104, "Data type error"}, {-109, "Missing parameter"},
-    {-113, "Undefined header"},        {-200, "Execution error"}, {-222, "Data out of range"},
+    {-113, "Undefined header"},        {-200, "Execution error"}, {-221, "Settings conflict"},
+    {-222, "Data out of range"},
     {-224, "Illegal parameter value"}, {-250, "Mass storage error"}, {-256, "File name not found"},
     {-257, "File name error"},
 };
@@ -127,11 +129,15 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
     : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
   mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir));
-  mModules.push_back(std::make_shared<SimBerMeter>());
-  mModules.push_back(std::make_shared<SimSequence>(mParams));
-  mModules.push_back(std::make_shared<SimSegmentStore>(dataDir));
+  auto ber = std::make_shared<SimBerMeter>();
+  auto sequence = std::make_shared<SimSequence>(mParams);
+  auto segments = std::make_shared<SimSegmentStore>(dataDir);
+  mModules.push_back(ber);
+  mModules.push_back(sequence);
+  mModules.push_back(segments);
   mModules.push_back(std::make_shared<SimSelfTest>());
   mModules.push_back(std::make_shared<SimDeskew>());
+  mModules.push_back(std::make_shared<SimCapture>(sequence, segments, ber));
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {

@@ -13,3 +13,10 @@ struct SimReply {
   SimReplyAction action = SimReplyAction::Send;
   int delayMs = 0;
 };
+
+// The header of an IEEE 488.2 definite-length block: "#", the count of length digits (at
+// least 5), the length.
+inline Dstring SimBlockHeader(std::size_t bytes) {
+  Dstring digits = Dstring::Format("%05zu", bytes);
+  return Dstring::Format("#%zu", digits.size()) + digits;
+}

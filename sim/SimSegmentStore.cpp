@@ -4,6 +4,7 @@
 #include <climits>
 #include <ctime>
 
+#include "SimReply.h"
 #include "SimSegmentFile.h"
 #include "SimSegmentSearch.h"
 #include "support/LispList.h"
@@ -16,12 +17,6 @@ constexpr const char* kExtension = ".qseg";
 constexpr std::size_t kMaxNameLength = 200;
 // Characters a segment name may not hold: it becomes a file name and travels in quotes.
 constexpr std::string_view kForbidden = "\"*?<>|:;";
-
-// The block header of IEEE 488.2: "#", the count of length digits (at least 5), the length.
-Dstring BlockHeader(std::size_t bytes) {
-  Dstring digits = Dstring::Format("%05zu", bytes);
-  return Dstring::Format("#%zu", digits.size()) + digits;
-}
 
 Dstring Quote(const Dstring& text) {
   Dstring out = "\"";
@@ -199,6 +194,14 @@ int SimSegmentStore::Open(const SimCommand& cmd, SimContext& context) {
   return 0;
 }
 
+std::shared_ptr<const SimSegment> SimSegmentStore::Find(const Dstring& name) const {
+  if (unsigned number = NumberOf(name)) return mOpen.at(number).segment;
+  std::filesystem::path path;
+  auto segment = std::make_shared<SimSegment>(name);
+  if (!PathOf(name, path) || SimSegmentFile::Load(path.string(), *segment) != 0) return nullptr;
+  return segment;
+}
+
 int SimSegmentStore::RealPath(const SimCommand& cmd, SimContext& context) {
   Dstring name;
   std::filesystem::path path;
@@ -362,7 +365,7 @@ int SimSegmentStore::QueryData(unsigned, SimSegment& segment, const SimCommand& 
   if (WordAt(items, 4) != "BIN") return -224;
   std::string block;
   if (int rc = segment.ReadBlock(range[0], range[1], range[2], range[3], block)) return rc;
-  context.Reply(BlockHeader(block.size()) + block);
+  context.Reply(SimBlockHeader(block.size()) + block);
   return 0;
 }
 

@@ -20,6 +20,9 @@ class SimSegmentStore : public SimCommandModule {
   explicit SimSegmentStore(const Dstring& dataDir);
 
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
+  // The segment of that name as a client would open it (the open one, else its file); null
+  // when there is none.
+  std::shared_ptr<const SimSegment> Find(const Dstring& name) const;
 
  private:
   struct OpenSegment {

@@ -22,6 +22,9 @@ class SimSequence : public SimCommandModule {
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
   void Advance(SimContext& context) override;
 
+  const Dstring& GetSequence() const { return mSequence; }
+  const SimSequenceConfig& GetConfig() const { return mConfig; }
+
  private:
   using Handler = void (SimSequence::*)(const SimCommand&, SimContext&);
   struct Entry {

@@ -15,6 +15,8 @@ const char* SimTimedTask::Word(State state) {
   }
 }
 
+int SimTimedTask::StartRefusal(SimContext& context) const { return context.Global().IsRunning() ? -200 : 0; }
+
 void SimTimedTask::Advance(SimContext& context) {
   if (mState != State::Running) return;
   const double seconds = static_cast<double>(context.NowMs() - mStartMs) / 1000.0;
@@ -28,8 +30,9 @@ bool SimTimedTask::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, 
   if (!rest.StartsWith(stem)) return false;
   const Dstring what(rest.substr(stem.size()));
   if (what == "STAR" && !cmd.IsQuery()) {
-    if (mState == State::Running || context.Global().IsRunning()) {
-      context.Error(-200);
+    const int refusal = mState == State::Running ? -200 : StartRefusal(context);
+    if (refusal != 0) {
+      context.Error(refusal);
     } else {
       mItems = Begin(context);
       mDone = 0;

@@ -6,7 +6,7 @@
 
 // A task the instrument carries out over some seconds, item after item (the modules of a self
 // test, the ports of a deskew), under one command stem (":SYST:TEST"):
-//   "<stem>:STAR"   starts it (-200 while the instrument runs or the task is going on)
+//   "<stem>:STAR"   starts it (-200 while the task is going on, or when StartRefusal says so)
 //   "<stem>:STAT?"  "IDLE|RUNN|DONE|ABOR",<items done>,<items>
 //   "<stem>:ABOR"   stops it; what the items not yet done are is the task's
 //   "<stem>:PACE MS" (test control) the time one item takes (0 … 60000; 0 ends a task at once)
@@ -19,6 +19,9 @@ class SimTimedTask : public SimCommandModule {
   void Advance(SimContext& context) override;
 
  protected:
+  // The error a start is refused with now, or 0; by default a task cannot start while the
+  // instrument runs.
+  virtual int StartRefusal(SimContext& context) const;
   // Sets the items up; their number.
   virtual std::size_t Begin(SimContext& context) = 0;
   virtual void ItemDone(std::size_t item, SimContext& context) = 0;

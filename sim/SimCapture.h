@@ -1,0 +1,70 @@
+#pragma once
+
+#include <map>
+#include <memory>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "SimTimedTask.h"
+
+class SimBerMeter;
+class SimSegment;
+class SimSegmentStore;
+class SimSequence;
+
+// The capture of every analyser data port (":CAPT", see SimTimedTask; 250 ms per port): while
+// the instrument runs, each analyser port records ":MEAS:CAPT:DEPT" vectors of what its
+// generator port sends under the sequence (the k-th analyser data port of a clock group
+// receives the group's k-th generator data port), with bit errors at the port's error ratio.
+// The last finished capture stays until the next one finishes; a cancelled one changes nothing.
+//   "<port>:CAPT:SIZE?"              <vectors>,<traces> of the last capture ("0,0" before one)
+//   "<port>:CAPT:DATA? START,COUNT"  the received bits, a block of one row per trace, packed
+//                                    most significant bit first and padded to a byte
+//   "<port>:CAPT:ERR? START,COUNT"   the bits in error, in the same layout
+// A start while nothing runs is -221.
+class SimCapture : public SimTimedTask {
+ public:
+  // At most this many bytes in one reply.
+  static constexpr std::size_t kMaxReplyBytes = 8u << 20;
+
+  SimCapture(std::shared_ptr<const SimSequence> sequence, std::shared_ptr<const SimSegmentStore> segments,
+             std::shared_ptr<const SimBerMeter> ber)
+      : SimTimedTask(":CAPT", 0.25), mSequence(std::move(sequence)), mSegments(std::move(segments)), mBer(std::move(ber)) {}
+
+  bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
+
+ protected:
+  int StartRefusal(SimContext& context) const override;
+  std::size_t Begin(SimContext& context) override;
+  void ItemDone(std::size_t item, SimContext& context) override;
+  void Aborted(std::size_t, SimContext&) override { mPending.clear(); }
+  bool RunTaskCommand(const Dstring&, const SimCommand&, SimContext&) override { return false; }
+
+ private:
+  struct Record {
+    long width = 0;
+    long length = 0;
+    std::vector<std::string> rows;    // received
+    std::vector<std::string> errors;  // received XOR sent
+  };
+  // A segment's states as bits (the second state of its coding, and "1" and "H", are high).
+  struct Bits {
+    long width = 0;
+    long length = 0;
+    std::vector<std::vector<bool>> traces;
+  };
+
+  // What `generator` (a data port's place, or -1 for none) sends for `vectors` vectors.
+  Record Sent(long generator, long vectors);
+  const Bits& BitsOf(const Dstring& name, long vectors, std::map<Dstring, Bits>& cache) const;
+  void InjectErrors(Record& record, double ratio);
+  int ReplyBits(const Record& record, bool errors, const SimCommand& cmd, SimContext& context) const;
+
+  std::shared_ptr<const SimSequence> mSequence;
+  std::shared_ptr<const SimSegmentStore> mSegments;
+  std::shared_ptr<const SimBerMeter> mBer;
+  std::map<Dstring, Record> mRecords;  // by port path, upper case
+  std::map<Dstring, Record> mPending;
+  std::mt19937_64 mRandom{71300};
+};
