@@ -1,0 +1,97 @@
+#include "capture/VcdWriter.h"
+
+#include <cerrno>
+#include <cmath>
+#include <cstring>
+#include <fstream>
+
+#include "support/ConditionListLoader.h"
+
+namespace {
+
+constexpr int kFirstCode = 33;
+constexpr int kCodes = 94;
+
+// A VCD name holds no blanks or colons.
+Dstring ScopeName(const Dstring& scope) {
+  Dstring name;
+  for (char c : scope) {
+    if (c == ':') {
+      if (!name.empty()) name += '_';
+    } else if (c > ' ' && c < 127) {
+      name += c;
+    }
+  }
+  return name.empty() ? Dstring("capture") : name;
+}
+
+Dstring BusBits(const CaptureData& data, long low, long high, long vector) {
+  Dstring bits = "b";
+  for (long t = high; t >= low; --t) bits += data.Bit(t, vector) ? '1' : '0';
+  return bits;
+}
+
+}  // namespace
+
+Dstring VcdWriter::Identifier(std::size_t index) {
+  Dstring id;
+  do {
+    id += static_cast<char>(kFirstCode + index % kCodes);
+    index /= kCodes;
+  } while (index > 0);
+  return id;
+}
+
+void VcdWriter::Write(const CaptureData& data, const Dstring& scope, const Range& range, std::ostream& out) {
+  const double ps = data.GetPeriod() * 1e12;
+  const bool wholePs = std::fabs(ps - std::round(ps)) < 1e-6 * ps;
+  // Times are rounded vector by vector, so that a long capture does not drift.
+  const long double tick = wholePs ? std::round(ps) : static_cast<long double>(ps) * 1000.0L;
+  auto timeOf = [&](long vectors) { return static_cast<unsigned long long>(std::llround(vectors * tick)); };
+  const long width = data.GetWidth();
+  const bool bus = range.busLow <= range.busHigh;
+  const Dstring errorId = Identifier(static_cast<std::size_t>(width));
+  const Dstring busId = Identifier(static_cast<std::size_t>(width) + 1);
+
+  out << "$version qengui capture $end\n$timescale 1 " << (wholePs ? "ps" : "fs") << " $end\n";
+  out << "$scope module " << ScopeName(scope) << " $end\n";
+  for (long t = 0; t < width; ++t) out << "$var wire 1 " << Identifier(static_cast<std::size_t>(t)) << " d" << t << " $end\n";
+  out << "$var wire 1 " << errorId << " error $end\n";
+  if (bus) {
+    out << "$var wire " << range.busHigh - range.busLow + 1 << ' ' << busId << " bus[" << range.busHigh << ':'
+        << range.busLow << "] $end\n";
+  }
+  out << "$upscope $end\n$enddefinitions $end\n";
+  for (long v = range.from; v < range.to; ++v) {
+    Dstring changes;
+    for (long t = 0; t < width; ++t) {
+      if (v == range.from || data.Bit(t, v) != data.Bit(t, v - 1)) {
+        changes += (data.Bit(t, v) ? "1" : "0") + Identifier(static_cast<std::size_t>(t)) + "\n";
+      }
+    }
+    const bool error = data.HasError(v, v + 1);
+    if (v == range.from || error != data.HasError(v - 1, v)) changes += (error ? "1" : "0") + errorId + "\n";
+    if (bus && (v == range.from || data.Value(range.busLow, range.busHigh, v) !=
+                                       data.Value(range.busLow, range.busHigh, v - 1))) {
+      changes += BusBits(data, range.busLow, range.busHigh, v) + " " + busId + "\n";
+    }
+    if (changes.empty()) continue;
+    out << '#' << timeOf(v - range.from) << '\n';
+    if (v == range.from) out << "$dumpvars\n" << changes << "$end\n";
+    else out << changes;
+  }
+  out << '#' << timeOf(range.to - range.from) << '\n';
+}
+
+int VcdWriter::WriteFile(const CaptureData& data, const Dstring& scope, const Range& range, const Dstring& path,
+                         ConditionList& list) {
+  errno = 0;
+  std::ofstream file(path, std::ios::binary | std::ios::trunc);
+  if (file) Write(data, scope, range, file);
+  if (file) file.flush();
+  if (file) return 0;
+  const int error = errno;
+  ConditionListLoader::ConditionToken(list, "GUI_EXPORT_FAILED",
+                                      {path, Dstring(error != 0 ? std::strerror(error) : "write error")}, 1);
+  return 1;
+}

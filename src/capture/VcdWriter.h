@@ -1,0 +1,29 @@
+#pragma once
+
+#include <ostream>
+
+#include "capture/CaptureData.h"
+#include "support/ConditionList.h"
+#include "support/Dstring.h"
+
+// Writes vectors [from, to) of a capture as a Value Change Dump, which the common waveform
+// viewers open: a wire per trace ("d0" …), the bus shown in the window as a vector wire
+// ("bus[high:low]"), and a wire "error" high on the vectors with an error. Time 0 is the
+// first vector; the time scale is 1 ps, or 1 fs when the clock period is no whole number of
+// picoseconds. Only changes are written, so a quiet capture makes a small file.
+class VcdWriter {
+ public:
+  struct Range {
+    long from = 0;
+    long to = 0;
+    long busLow = 0;   // the bus's traces; busLow > busHigh: no bus
+    long busHigh = -1;
+  };
+
+  static void Write(const CaptureData& data, const Dstring& scope, const Range& range, std::ostream& out);
+  // GUI_EXPORT_FAILED when the file cannot be written.
+  static int WriteFile(const CaptureData& data, const Dstring& scope, const Range& range, const Dstring& path,
+                       ConditionList& list);
+  // The identifier of signal `index`: printable characters from "!".
+  static Dstring Identifier(std::size_t index);
+};
