@@ -150,7 +150,8 @@ void MainWin::BuildWindowsMenu() {
   for (const WindowFactory::Entry& entry : WindowFactory::Entries()) {
     const QString resource = QString::fromStdString(entry.resource);
     QAction* action = menu->addAction(QString::fromStdString(entry.title), this, [this, resource] { OpenWindow(resource); });
-    action->setShortcut(QKeySequence(Qt::CTRL | (Qt::Key_0 + index++)));
+    if (index <= 9) action->setShortcut(QKeySequence(Qt::CTRL | (Qt::Key_0 + index)));
+    ++index;
   }
   menu->addSeparator();
   menu->addAction(QStringLiteral("&Cascade"), mArea, &QMdiArea::cascadeSubWindows);

@@ -24,6 +24,9 @@ void TaskFollower::Report(int (TaskFollower::*action)(ConditionList&)) {
 
 int TaskFollower::Start(ConditionList& list) {
   if (IsActive()) return 0;
+  if (mHooks.before) {
+    if (int status = mHooks.before(list)) return status;
+  }
   if (int status = mTask.Start(list)) return status;
   mBar->setValue(0);
   SetActive(true);

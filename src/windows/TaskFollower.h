@@ -22,6 +22,8 @@ class TaskFollower : public QObject {
   static constexpr int kPollMs = 200;
 
   struct Hooks {
+    // Asked before a start: nonzero (with a condition) keeps the task from starting.
+    std::function<int(ConditionList&)> before;
     std::function<void(const InstrumentTask::Progress&)> running;
     std::function<void(const InstrumentTask::Progress&)> ended;
     std::function<void(const QString&)> say;

@@ -7,6 +7,7 @@
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
+#include "windows/wavewin/WavewinWaveWin.h"
 
 namespace {
 
@@ -31,6 +32,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
       {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
+      {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
   };
   return kEntries;
 }
