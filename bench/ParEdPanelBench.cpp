@@ -8,6 +8,7 @@
 #include <memory>
 #include <vector>
 
+#include "BenchApp.h"
 #include "ManyParamsRig.h"
 #include "data/Dte.h"
 #include "instrument/QenGuiInst.h"
@@ -18,15 +19,6 @@
 namespace {
 
 constexpr int kColumns = 20;
-
-QApplication& App() {
-  static int argc = 1;
-  static char name[] = "qen_bench";
-  static char* argv[] = {name, nullptr};
-  qputenv("QT_QPA_PLATFORM", "offscreen");
-  static QApplication app(argc, argv);
-  return app;
-}
 
 // `count` widgets in a grid of kColumns, shown offscreen.
 template <class T>
@@ -43,7 +35,7 @@ std::unique_ptr<QWidget> Panel(std::vector<T*>& widgets, int count = ManyParamsR
 }
 
 void BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits(benchmark::State& state) {
-  App();
+  BenchApp();
   ManyParamsRig& rig = ManyParamsRig::Get();
   if (!rig.Ok()) return state.SkipWithError("qensim did not start");
   std::vector<QenParEd*> fields;
@@ -96,7 +88,7 @@ void BM_ParEdPanelRefreshVsJoinedQueriesAndLineEdits(benchmark::State& state) {
 // A panel of one port's 50 fields moved between two ports, as the parameter editor moves it,
 // against reading the same 100 sources (values and attributes) in one joined query.
 void BM_PanelSwitchBetweenPortsVsOneJoinedRead(benchmark::State& state) {
-  App();
+  BenchApp();
   ManyParamsRig& rig = ManyParamsRig::Get();
   if (!rig.Ok()) return state.SkipWithError("qensim did not start");
   std::vector<QenParEd*> fields;

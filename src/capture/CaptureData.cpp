@@ -30,9 +30,10 @@ void CaptureData::Summarise() {
   mErrorVectors = mAnyError.CountSet();
 }
 
-std::uint8_t CaptureData::Flags(long trace, long from, long to) const {
+std::uint8_t CaptureData::Flags(long trace, long from, long to, bool anyError) const {
   const auto t = static_cast<std::size_t>(trace);
-  return static_cast<std::uint8_t>(mTraces[t].Flags(from, to) | ((mErrors[t].Flags(from, to) & kHigh) != 0 ? kError : 0));
+  const bool error = anyError && (mErrors[t].Flags(from, to) & kHigh) != 0;
+  return static_cast<std::uint8_t>(mTraces[t].Flags(from, to) | (error ? kError : 0));
 }
 
 std::uint64_t CaptureData::Value(long low, long high, long vector) const {

@@ -26,8 +26,10 @@ class CaptureData {
   double GetPeriod() const { return mPeriod; }
   bool Bit(long trace, long vector) const { return mTraces[static_cast<std::size_t>(trace)].At(vector); }
   bool IsError(long trace, long vector) const { return mErrors[static_cast<std::size_t>(trace)].At(vector); }
-  // kLow, kHigh and kError for a trace over [from, to).
-  std::uint8_t Flags(long trace, long from, long to) const;
+  // kLow, kHigh and kError for a trace over [from, to); `anyError` says whether HasError(from,
+  // to), which a caller asking every trace over the same range asks once.
+  std::uint8_t Flags(long trace, long from, long to, bool anyError) const;
+  std::uint8_t Flags(long trace, long from, long to) const { return Flags(trace, from, to, HasError(from, to)); }
   bool HasError(long from, long to) const { return (mAnyError.Flags(from, to) & kHigh) != 0; }
   // The traces low … high (at most 64) of a vector as a number, trace `low` its least bit.
   std::uint64_t Value(long low, long high, long vector) const;

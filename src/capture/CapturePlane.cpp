@@ -68,20 +68,23 @@ void CapturePlane::Summarise() {
 std::uint8_t CapturePlane::Flags(long from, long to) const {
   std::uint8_t flags = 0;
   long at = from;
-  while (at < to && flags != (kLow | kHigh)) {
-    if (at % 64 != 0 || to - at < 64) {
-      const long end = std::min(to, (at | 63) + 1);
-      flags |= WordFlags(static_cast<std::size_t>(at / 64), LowBits(end - at) << (at % 64));
-      at = end;
-      continue;
-    }
-    // The largest summarised bucket that starts here and fits.
-    int level = static_cast<int>(mLevels.size());
-    while (level > 0 && (at % BucketOf(level) != 0 || to - at < BucketOf(level))) --level;
+  if (at % 64 != 0 || to - at < 64) {
+    const long end = std::min(to, (at | 63) + 1);
+    flags |= WordFlags(static_cast<std::size_t>(at / 64), LowBits(end - at) << (at % 64));
+    at = end;
+  }
+  // Up through the levels while the place is aligned to the next bucket, then down as the
+  // rest gets shorter: a few buckets per level.
+  const int top = static_cast<int>(mLevels.size());
+  int level = 0;
+  while (to - at >= 64 && flags != (kLow | kHigh)) {
+    while (level < top && (at & (BucketOf(level + 1) - 1)) == 0 && to - at >= BucketOf(level + 1)) ++level;
+    while (to - at < BucketOf(level)) --level;
     flags |= level == 0 ? WordFlags(static_cast<std::size_t>(at / 64), ~0ULL)
                         : mLevels[static_cast<std::size_t>(level - 1)][static_cast<std::size_t>(at / BucketOf(level))];
     at += BucketOf(level);
   }
+  if (at < to && flags != (kLow | kHigh)) flags |= WordFlags(static_cast<std::size_t>(at / 64), LowBits(to - at));
   return flags;
 }
 

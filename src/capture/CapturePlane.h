@@ -5,7 +5,7 @@
 #include <vector>
 
 // One row of bits over a capture's vectors (a trace, or where its errors are), with a summary
-// per 1,024, 16,384, 262,144 … vectors of whether the bits there are low, high or both. Asking
+// per 256, 1,024, 4,096 … vectors of whether the bits there are low, high or both. Asking
 // what a range holds costs a few steps per level whatever its length, so that drawing follows
 // the pixels and not the samples.
 class CapturePlane {
@@ -30,7 +30,7 @@ class CapturePlane {
   void OrWith(const CapturePlane& other);
 
  private:
-  static constexpr int kLevelShift = 4;  // 16 buckets of a level make one of the next
+  static constexpr int kLevelShift = 2;  // 4 buckets of a level make one of the next
   static long BucketOf(int level) { return 64L << (kLevelShift * level); }
   std::uint8_t WordFlags(std::size_t word, std::uint64_t mask) const;
 

@@ -25,6 +25,12 @@ Dstring ScopeName(const Dstring& scope) {
   return name.empty() ? Dstring("capture") : name;
 }
 
+void AddChange(Dstring& changes, bool high, const Dstring& id) {
+  changes += high ? '1' : '0';
+  changes += id;
+  changes += '\n';
+}
+
 Dstring BusBits(const CaptureData& data, long low, long high, long vector) {
   Dstring bits = "b";
   for (long t = high; t >= low; --t) bits += data.Bit(t, vector) ? '1' : '0';
@@ -65,12 +71,10 @@ void VcdWriter::Write(const CaptureData& data, const Dstring& scope, const Range
   for (long v = range.from; v < range.to; ++v) {
     Dstring changes;
     for (long t = 0; t < width; ++t) {
-      if (v == range.from || data.Bit(t, v) != data.Bit(t, v - 1)) {
-        changes += (data.Bit(t, v) ? "1" : "0") + Identifier(static_cast<std::size_t>(t)) + "\n";
-      }
+      if (v == range.from || data.Bit(t, v) != data.Bit(t, v - 1)) AddChange(changes, data.Bit(t, v), Identifier(static_cast<std::size_t>(t)));
     }
     const bool error = data.HasError(v, v + 1);
-    if (v == range.from || error != data.HasError(v - 1, v)) changes += (error ? "1" : "0") + errorId + "\n";
+    if (v == range.from || error != data.HasError(v - 1, v)) AddChange(changes, error, errorId);
     if (bus && (v == range.from || data.Value(range.busLow, range.busHigh, v) !=
                                        data.Value(range.busLow, range.busHigh, v - 1))) {
       changes += BusBits(data, range.busLow, range.busHigh, v) + " " + busId + "\n";

@@ -137,6 +137,14 @@ void WaveView::ColumnRange(int column, long& from, long& to) const {
   const long length = mData->GetLength();
   from = std::min(length, static_cast<long>(std::floor(mFirst + column * mPerPixel)));
   to = std::min(length, std::max(from + 1, static_cast<long>(std::floor(mFirst + (column + 1) * mPerPixel))));
+  // Zoomed out, columns start on a grain of the capture's summary a few times finer than a
+  // column, so each asks a few summary entries; the columns still cover every vector once.
+  if (mPerPixel >= kGrainFrom) {
+    long grain = 64;
+    while (grain * 16 <= mPerPixel) grain *= 4;
+    from -= from % grain;
+    if (to < length) to -= to % grain;
+  }
 }
 
 void WaveView::paintEvent(QPaintEvent*) {
@@ -150,14 +158,15 @@ void WaveView::paintEvent(QPaintEvent*) {
   }
   PaintRuler(p);
   int top = kRulerHeight;
-  PaintErrorLane(p, top);
+  const std::vector<char> errors = ErrorColumns();
+  PaintErrorLane(p, top, errors);
   top += kLaneHeight;
   const bool bus = mBusLow <= mBusHigh && mBusHigh < mData->GetWidth() && mBusHigh - mBusLow < 64;
   if (bus) {
     PaintBus(p, top);
     top += kRowHeight;
   }
-  for (long t = 0; t < mData->GetWidth() && top < height(); ++t, top += kRowHeight) PaintTrace(p, t, top);
+  for (long t = 0; t < mData->GetWidth() && top < height(); ++t, top += kRowHeight) PaintTrace(p, t, top, errors);
   PaintCursors(p);
 }
 
@@ -179,19 +188,27 @@ void WaveView::PaintRuler(QPainter& p) const {
   p.drawLine(0, kRulerHeight - 1, width(), kRulerHeight - 1);
 }
 
-void WaveView::PaintErrorLane(QPainter& p, int top) const {
+std::vector<char> WaveView::ErrorColumns() const {
+  std::vector<char> errors(static_cast<std::size_t>(PlotWidth()), 0);
+  for (int c = 0; c < PlotWidth(); ++c) {
+    long from = 0, to = 0;
+    ColumnRange(c, from, to);
+    errors[static_cast<std::size_t>(c)] = from < to && mData->HasError(from, to);
+  }
+  return errors;
+}
+
+void WaveView::PaintErrorLane(QPainter& p, int top, const std::vector<char>& errors) const {
   p.setPen(kErrorColour);
   p.drawText(QRect(6, top, kNameWidth - 12, kLaneHeight), Qt::AlignVCenter | Qt::AlignLeft, QStringLiteral("errors"));
   std::vector<QLine> marks;
   for (int c = 0; c < PlotWidth(); ++c) {
-    long from = 0, to = 0;
-    ColumnRange(c, from, to);
-    if (from < to && mData->HasError(from, to)) marks.emplace_back(kNameWidth + c, top + 1, kNameWidth + c, top + kLaneHeight - 2);
+    if (errors[static_cast<std::size_t>(c)] != 0) marks.emplace_back(kNameWidth + c, top + 1, kNameWidth + c, top + kLaneHeight - 2);
   }
   p.drawLines(marks.data(), static_cast<int>(marks.size()));
 }
 
-void WaveView::PaintTrace(QPainter& p, long trace, int top) const {
+void WaveView::PaintTrace(QPainter& p, long trace, int top, const std::vector<char>& errorColumns) const {
   p.setPen(palette().color(QPalette::Text));
   p.drawText(QRect(6, top, kNameWidth - 12, kRowHeight), Qt::AlignVCenter | Qt::AlignLeft, QStringLiteral("d%1").arg(trace));
   const int high = top + kTraceMargin;
@@ -204,7 +221,7 @@ void WaveView::PaintTrace(QPainter& p, long trace, int top) const {
     long from = 0, to = 0;
     ColumnRange(c, from, to);
     if (from >= to) break;
-    const std::uint8_t flags = mData->Flags(trace, from, to);
+    const std::uint8_t flags = mData->Flags(trace, from, to, errorColumns[static_cast<std::size_t>(c)] != 0);
     const Level level = LevelOf(flags);
     const int x = kNameWidth + c;
     if ((flags & CaptureData::kError) != 0) errors.emplace_back(x - 1, top + 1, 3, kRowHeight - 2);
@@ -250,7 +267,7 @@ void WaveView::PaintBus(QPainter& p, int top) const {
     ColumnRange(c, from, to);
     if (from >= to) break;
     bool busy = false;
-    for (long t = mBusLow; t <= mBusHigh && !busy; ++t) busy = LevelOf(mData->Flags(t, from, to)) == Level::Busy;
+    for (long t = mBusLow; t <= mBusHigh && !busy; ++t) busy = LevelOf(mData->Flags(t, from, to, false)) == Level::Busy;
     const std::uint64_t value = busy ? 0 : mData->Value(mBusLow, mBusHigh, from);
     const int x = kNameWidth + c;
     if (!runs.empty() && runs.back().busy == busy && runs.back().value == value) {

@@ -2,6 +2,7 @@
 
 #include <QWidget>
 #include <cstdint>
+#include <vector>
 
 class CaptureData;
 
@@ -21,6 +22,8 @@ class WaveView : public QWidget {
   static constexpr int kRowHeight = 24;
   // Zoomed in furthest, a vector is this many pixels wide.
   static constexpr double kMaxPixelsPerVector = 48.0;
+  // From this many vectors a column, columns start on the summary's grain.
+  static constexpr double kGrainFrom = 1024.0;
 
   explicit WaveView(QWidget* parent = nullptr);
 
@@ -70,9 +73,11 @@ class WaveView : public QWidget {
   double MaxVectorsPerPixel() const;
   void Clamp();
   void PaintRuler(QPainter& p) const;
-  void PaintErrorLane(QPainter& p, int top) const;
+  // Per plot column, whether its vectors hold an error.
+  std::vector<char> ErrorColumns() const;
+  void PaintErrorLane(QPainter& p, int top, const std::vector<char>& errors) const;
   void PaintBus(QPainter& p, int top) const;
-  void PaintTrace(QPainter& p, long trace, int top) const;
+  void PaintTrace(QPainter& p, long trace, int top, const std::vector<char>& errors) const;
   void PaintCursors(QPainter& p) const;
 
   const CaptureData* mData = nullptr;
