@@ -224,7 +224,7 @@ void WaveView::PaintTrace(QPainter& p, long trace, int top, const std::vector<ch
     const std::uint8_t flags = mData->Flags(trace, from, to, errorColumns[static_cast<std::size_t>(c)] != 0);
     const Level level = LevelOf(flags);
     const int x = kNameWidth + c;
-    if ((flags & CaptureData::kError) != 0) errors.emplace_back(x - 1, top + 1, 3, kRowHeight - 2);
+    if ((flags & CaptureData::kError) != 0) errors.emplace_back(x - 1, top + 2, 3, kRowHeight - 4);
     if (level == Level::Busy) {
       busy.emplace_back(x, high, 1, low - high + 1);
     } else {
@@ -235,15 +235,16 @@ void WaveView::PaintTrace(QPainter& p, long trace, int top, const std::vector<ch
     before = level;
   }
   p.setPen(Qt::NoPen);
-  QColor errorBand = kErrorColour;
-  errorBand.setAlpha(70);
-  p.setBrush(errorBand);
-  p.drawRects(errors.data(), static_cast<int>(errors.size()));
   p.setBrush(kTraceColour);
   p.drawRects(busy.data(), static_cast<int>(busy.size()));
   p.setBrush(Qt::NoBrush);
   p.setPen(QPen(kTraceColour, 1.5));
   p.drawLines(lines.data(), static_cast<int>(lines.size()));
+  // Errors over the trace, so that they show on a busy one too.
+  p.setPen(Qt::NoPen);
+  p.setBrush(kErrorColour);
+  p.drawRects(errors.data(), static_cast<int>(errors.size()));
+  p.setBrush(Qt::NoBrush);
 }
 
 void WaveView::PaintBus(QPainter& p, int top) const {
