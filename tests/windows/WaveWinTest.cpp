@@ -3,6 +3,7 @@
 #include <QCoreApplication>
 #include <QPushButton>
 #include <QTest>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <map>
@@ -11,6 +12,7 @@
 
 #include "capture/ui/WaveView.h"
 #include "common/gui/GuiSimFixture.h"
+#include "instrument/QenGuiInst.h"
 #include "windows/TaskFollower.h"
 #include "windows/wavewin/WavewinWaveWin.h"
 
@@ -212,4 +214,24 @@ TEST_F(WaveWinTest, ACaptureWhileNothingRunsIsRefusedAndACancelledOneKeepsTheLas
   EXPECT_EQ(mWin->StateText().toStdString(), "Cancelled; the last capture is kept.");
   EXPECT_EQ(mWin->Data().GetLength(), kDepth);
   EXPECT_EQ(Other(std::string(kPort) + ":CAPT:SIZE?"), "4096,4");
+}
+
+TEST_F(WaveWinTest, ARepliedCaptureThatCannotBeReadLeavesNoneAndSaysWhichReply) {
+  Click("PButCapture");
+  const std::pair<const char*, const char*> kCases[] = {
+      {":CGR1:MOD3:CONN1:CAPT:SIZE?", "4096"},           {":CGR1:MOD3:CONN1:CAPT:SIZE?", "4096,-4"},
+      {":CGR1:PER?", "0"},                               {":CGR1:MOD3:CONN1:CAPT:DATA?", "#15abcde"},
+      {":CGR1:MOD3:CONN1:CAPT:ERR?", "0"},
+  };
+  for (const auto& [header, form] : kCases) {
+    Dstring reply;
+    ASSERT_EQ(QenGuiInst::Call(":TEST:MALF \"" + Dstring(header) + "\",\"" + form + "\"", reply, mList), 0);
+    ConditionList list;
+    EXPECT_NE(mWin->ReadCapture(list), 0) << header << " " << form;
+    EXPECT_NE(list.ToText().find(Dstring(header).substr(0, std::strlen(header) - 1)), std::string::npos) << list.ToText();
+    EXPECT_EQ(mWin->Data().GetLength(), 0);
+  }
+  ConditionList list;
+  EXPECT_EQ(mWin->ReadCapture(list), 0) << list.ToText();
+  EXPECT_EQ(mWin->Data().GetLength(), kDepth);
 }
