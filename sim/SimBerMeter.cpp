@@ -30,6 +30,17 @@ double SimBerMeter::RatioFor(const Dstring& port) const {
   return it != mCounts.end() && it->second.injected > 0 ? it->second.injected : RatioOf(header);
 }
 
+double SimBerMeter::ErrorsOf(const Dstring& port, unsigned long& epoch) const {
+  auto it = mCounts.find(port + Dstring(kSuffix));
+  epoch = it != mCounts.end() ? it->second.epoch : 0;
+  return it != mCounts.end() ? std::floor(it->second.errors) : 0.0;
+}
+
+bool SimBerMeter::IsPort(const Dstring& port, SimContext& context) {
+  std::size_t index = 0;
+  return context.Params().Find(port + Dstring(kSuffix), index);
+}
+
 void SimBerMeter::Advance(SimContext& context) {
   const long long now = context.NowMs();
   const bool running = context.Global().IsRunning();
@@ -39,7 +50,7 @@ void SimBerMeter::Advance(SimContext& context) {
     }
   }
   if (running && !mWasRunning) {
-    for (auto& [header, count] : mCounts) count = Count{0, 0, count.injected};
+    for (auto& [header, count] : mCounts) count.Restart();
   }
   if (running && mWasRunning && mLastMs >= 0) {
     const double seconds = static_cast<double>(now - mLastMs) / 1000.0;
@@ -67,7 +78,7 @@ bool SimBerMeter::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, S
     if (cmd.IsQuery()) {
       context.Error(-113);
     } else {
-      mCounts[header] = Count{0, 0, mCounts[header].injected};
+      mCounts[header].Restart();
     }
     return true;
   }

@@ -16,12 +16,19 @@ class SimBerMeter : public SimCommandModule {
   void Advance(SimContext& context) override;
   // The ratio a data port (":CGR1:MOD3:CONN1") sees errors at now: the injected one, else its own.
   double RatioFor(const Dstring& port) const;
+  // A data port's whole errors so far, and how often its counts started afresh.
+  double ErrorsOf(const Dstring& port, unsigned long& epoch) const;
+  // Whether `port` (":CGR1:MOD3:CONN1", upper case) is an analyser data port.
+  static bool IsPort(const Dstring& port, SimContext& context);
 
  private:
   struct Count {
     double compared = 0;
     double errors = 0;
     double injected = 0;  // a ratio set by test control, 0 when none
+    unsigned long epoch = 0;
+    // Starts the counts afresh, keeping the injected ratio.
+    void Restart() { *this = Count{0, 0, injected, epoch + 1}; }
   };
   // The port's ":BER" parameter, or false when `rest` names none.
   static bool PortOf(const Dstring& rest, std::string_view suffix, SimContext& context, Dstring& header);

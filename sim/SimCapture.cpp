@@ -74,6 +74,18 @@ void SimCapture::ItemDone(std::size_t item, SimContext&) {
   if (item + 1 == mPending.size()) mRecords = std::move(mPending);
 }
 
+long SimCapture::ReceivedWidth(const Dstring& port) const {
+  const std::map<Dstring, long> sources = Sources(mSequence->GetConfig());
+  auto found = sources.find(port);
+  long width = 1;
+  if (found == sources.end() || found->second < 0) return width;
+  for (const SimCapturePlan::Run& run : SimCapturePlan::Runs(mSequence->GetSequence(), static_cast<std::size_t>(found->second), kDefaultDepth)) {
+    if (!run.named) continue;
+    if (std::shared_ptr<const SimSegment> segment = mSegments->Find(run.segment)) width = std::max(width, segment->GetWidth());
+  }
+  return width;
+}
+
 SimCapture::Record SimCapture::Sent(long generator, long vectors) {
   std::vector<SimCapturePlan::Run> runs;
   if (generator >= 0) {

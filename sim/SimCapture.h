@@ -33,6 +33,9 @@ class SimCapture : public SimTimedTask {
       : SimTimedTask(":CAPT", 0.25), mSequence(std::move(sequence)), mSegments(std::move(segments)), mBer(std::move(ber)) {}
 
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
+  // The traces an analyser data port receives under the sequence now: the widest segment its
+  // generator plays in a capture of the default depth; 1 when it receives nothing.
+  long ReceivedWidth(const Dstring& port) const;
 
  protected:
   int StartRefusal(SimContext& context) const override;

@@ -2,6 +2,7 @@
 
 #include "SimBerMeter.h"
 #include "SimCapture.h"
+#include "SimChannelErrors.h"
 #include "SimDeskew.h"
 #include "SimSelfTest.h"
 #include "SimSegmentStore.h"
@@ -137,7 +138,9 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
   mModules.push_back(segments);
   mModules.push_back(std::make_shared<SimSelfTest>());
   mModules.push_back(std::make_shared<SimDeskew>());
-  mModules.push_back(std::make_shared<SimCapture>(sequence, segments, ber));
+  auto capture = std::make_shared<SimCapture>(sequence, segments, ber);
+  mModules.push_back(capture);
+  mModules.push_back(std::make_shared<SimChannelErrors>(ber, capture));
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {

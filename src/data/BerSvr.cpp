@@ -1,5 +1,6 @@
 #include "data/BerSvr.h"
 
+#include <algorithm>
 #include <string_view>
 
 #include "instrument/QenGuiInst.h"
@@ -27,6 +28,20 @@ bool ReadResult(std::string_view text, BerSvr::PortResult& result) {
   return true;
 }
 
+// "errors on channel 0,errors on channel 1,…"
+bool ReadChannels(std::string_view text, std::vector<unsigned long long>& channels) {
+  DataParcel parcel;
+  ConditionList ignored;
+  if (ParserExpression::Parse(text, parcel, ignored) != 0 || parcel.size() == 0) return false;
+  channels.assign(parcel.size(), 0);
+  for (std::size_t i = 0; i < parcel.size(); ++i) {
+    unsigned long count = 0;
+    if (!parcel[i].GetULong(count)) return false;
+    channels[i] = count;
+  }
+  return true;
+}
+
 }  // namespace
 
 int BerSvr::Init(ConditionList& list) {
@@ -44,7 +59,7 @@ int BerSvr::Init(ConditionList& list) {
     Dstring header(reply.substr(pos + 1, end - pos - 1));
     pos = end + 1;
     if (!header.EndsWith(kBerSuffix) || !header.ToUpper().StartsWith(prefix)) continue;
-    ports.push_back({Dstring(header.substr(prefix.size()))});
+    ports.emplace_back().port = Dstring(header.substr(prefix.size()));
   }
   mResults = std::move(ports);
   mInitialized = true;
@@ -60,20 +75,25 @@ int BerSvr::UpdateFromFW(unsigned what, ConditionList& list) {
   if (what != kReadResults || !mInitialized || mResults.empty()) return 0;
   FWBlocker guard("BerSvr::UpdateFromFW", list);
   if (int status = guard.Block()) return status;
-  const Dstring cmd = Joined("?");
+  const bool channels = HasChannels();
+  const Dstring cmd = Joined("?", channels ? ":CHAN?" : nullptr);
   Dstring reply;
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
   std::vector<std::string_view> parts;
-  if (ParserExpression::SplitJoined(reply, parts, list) != 0 || parts.size() != mResults.size()) {
+  const std::size_t each = channels ? 2 : 1;
+  if (ParserExpression::SplitJoined(reply, parts, list) != 0 || parts.size() != each * mResults.size()) {
     ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {cmd, reply}, 1);
     return 1;
   }
   std::vector<PortResult> next = mResults;
   for (std::size_t i = 0; i < parts.size(); ++i) {
-    if (!ReadResult(parts[i], next[i])) {
+    PortResult& result = next[i / each];
+    const bool read = i % each == 0 ? ReadResult(parts[i], result) : ReadChannels(parts[i], result.channels);
+    if (!read) {
       ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {cmd, Dstring(parts[i])}, 1);
       return 1;
     }
+    if (!channels) result.channels.clear();
   }
   if (next == mResults) return 0;
   mResults = std::move(next);
@@ -91,9 +111,16 @@ int BerSvr::Reset(ConditionList& list) {
   return UpdateFromFW(kReadResults, list);
 }
 
-Dstring BerSvr::Joined(const char* suffix) const {
+void BerSvr::WantChannels(bool want) {
+  mChannelViews = want ? mChannelViews + 1 : std::max(0, mChannelViews - 1);
+}
+
+Dstring BerSvr::Joined(const char* suffix, const char* second) const {
   const Dstring handle = QenGuiInst::GetAppHandle();
   Dstring cmd;
-  for (const auto& r : mResults) cmd += (cmd.empty() ? ":" : ";:") + handle + r.port + suffix;
+  for (const auto& r : mResults) {
+    cmd += (cmd.empty() ? ":" : ";:") + handle + r.port + suffix;
+    if (second != nullptr) cmd += ";:" + handle + r.port + second;
+  }
   return cmd;
 }

@@ -9,7 +9,9 @@
 // port, read from the instrument while it runs and kept in this data source for the views.
 // Init finds the analyser ports (their ":BER" settings, listed with the "L" prefix);
 // UpdateFromFW(1, …) reads all of them in one joined query and tells the views when anything
-// changed. The initialised flag is what the poll tests before setting the service up again
+// changed. While a view wants the error state by channel (WantChannels), the same query also
+// asks each port's "<port>:CHAN?", so the error state costs no round trip of its own. The
+// initialised flag is what the poll tests before setting the service up again
 // after the instrument was held by another client.
 class BerSvr : public QenDs {
  public:
@@ -18,6 +20,7 @@ class BerSvr : public QenDs {
     unsigned long long compared = 0;
     unsigned long long errors = 0;
     double ratio = 0.0;
+    std::vector<unsigned long long> channels;  // errors per channel, when asked for
     bool operator==(const PortResult&) const = default;
   };
 
@@ -30,11 +33,16 @@ class BerSvr : public QenDs {
   // Starts the counts of every port afresh ("<port>:RES", one frame), then reads them.
   int Reset(ConditionList& list);
   const std::vector<PortResult>& GetResults() const { return mResults; }
+  // Counts the views that want the channels; the last one to stop wanting them drops them.
+  void WantChannels(bool want);
+  bool HasChannels() const { return mChannelViews > 0; }
 
  private:
-  // One command per port, the port's setting followed by `suffix`, joined into one frame.
-  Dstring Joined(const char* suffix) const;
+  // One command per port, the port's setting followed by `suffix` (and then another followed
+  // by `second`, when given), joined into one frame.
+  Dstring Joined(const char* suffix, const char* second = nullptr) const;
 
   bool mInitialized = false;
+  int mChannelViews = 0;
   std::vector<PortResult> mResults;
 };

@@ -4,6 +4,7 @@
 #include "windows/deskew/DeskewDeskewWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
+#include "windows/errstate/ErrstateErrStateWin.h"
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -29,6 +30,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
+      {"errstate.ErrStateWin", "Error State", Maker<ErrstateErrStateWin>()},
       {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
       {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},

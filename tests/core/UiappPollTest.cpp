@@ -118,6 +118,13 @@ TEST_F(UiappTest, LockIsNoticedThenReleasedAndTheStateReadAnew) {
   Inst().Expect(":_H:CGR1:MOD3:CONN1:BER?", "1000000,3,3.000000000000E-006");
   Tick();
   EXPECT_EQ(uiapp::GetBerSvr()->GetResults()[0].errors, 3u);
+  // A view of the error state adds each port's channels to the same frame.
+  uiapp::GetBerSvr()->WantChannels(true);
+  Inst().Expect("_H:DFL?", "");
+  Inst().Expect(":_H:CGR1:MOD3:CONN1:BER?;:_H:CGR1:MOD3:CONN1:BER:CHAN?", "1000000,4,4.000000000000E-006;1,0,3");
+  Tick();
+  EXPECT_EQ(uiapp::GetBerSvr()->GetResults()[0].channels, (std::vector<unsigned long long>{1, 0, 3}));
+  uiapp::GetBerSvr()->WantChannels(false);
 }
 
 TEST_F(UiappTest, TickDuringTheSynchronousPartNeitherSetsTheFlagNorPolls) {

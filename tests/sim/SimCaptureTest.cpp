@@ -2,6 +2,9 @@
 // the errors injected into it, and a capture that is refused or cancelled.
 #include <gtest/gtest.h>
 
+#include <sstream>
+#include <vector>
+
 #include "SimFixture.h"
 
 namespace {
@@ -106,4 +109,40 @@ TEST_F(SimCaptureTest, ReadsOutsideTheCaptureAreRefused) {
   }
 }
 
+// The error state by channel: one count per trace the port receives, adding up to the port's
+// error count at every moment, and starting afresh with the port's counts.
+TEST_F(SimCaptureTest, ChannelErrorsShareOutThePortsErrors) {
+  const std::string port = std::string(":_H") + kPort;
+  auto channels = [&] {
+    std::vector<double> counts;
+    std::istringstream reply(Text(port + ":BER:CHAN?"));
+    for (std::string count; std::getline(reply, count, ',');) counts.push_back(std::stod(count));
+    return counts;
+  };
+  auto errors = [&] {
+    const std::string reply = Text(port + ":BER?");
+    return std::stod(reply.substr(reply.find(',') + 1));
+  };
+  Text(":_H:SGEN:GLOB:INIT:CONT ON");
+  Text(port + ":BER:INJ 1E-4");
+  for (int step = 0; step < 3; ++step) {
+    mClock.Advance(700);
+    const std::vector<double> counts = channels();
+    ASSERT_EQ(counts.size(), 4u);
+    double sum = 0;
+    for (double c : counts) {
+      EXPECT_GT(c, 0);
+      sum += c;
+    }
+    EXPECT_EQ(sum, errors());
+  }
+  Text(port + ":BER:RES");
+  EXPECT_EQ(channels(), std::vector<double>(4, 0.0));
+  // A port of the other group receives nothing but pauses: one channel.
+  EXPECT_EQ(Text(":_H:CGR2:MOD2:CONN1:BER:CHAN?").find(','), std::string::npos);
+  Reply(port + ":BER:CHAN 1");
+  EXPECT_EQ(Text(":_H:SYST:ERR?").substr(0, 4), "-200");
+}
+
 }  // namespace
+

@@ -18,18 +18,13 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
 
 namespace {
 
 // A ratio of 0 has no place on a logarithmic axis: it is drawn at the axis floor.
 constexpr double kFloor = 1e-15;
-
-QString Grouped(unsigned long long value) {
-  QString digits = QString::number(value);
-  for (int at = digits.size() - 3; at > 0; at -= 3) digits.insert(at, QChar(0x2009));
-  return digits;
-}
 
 QTableWidgetItem* Cell(const QString& text, bool number) {
   auto* item = new QTableWidgetItem(text);
@@ -122,8 +117,8 @@ void BerBerWin::ShowResults() {
   for (int row = 0; row < static_cast<int>(results.size()); ++row) {
     const BerSvr::PortResult& r = results[static_cast<std::size_t>(row)];
     mTable->setItem(row, 0, Cell(PlaceName(r.port), false));
-    mTable->setItem(row, 1, Cell(Grouped(r.compared), true));
-    mTable->setItem(row, 2, Cell(Grouped(r.errors), true));
+    mTable->setItem(row, 1, Cell(GroupedCount(r.compared), true));
+    mTable->setItem(row, 2, Cell(GroupedCount(r.errors), true));
     mTable->setItem(row, 3, Cell(r.compared == 0 ? QStringLiteral("–") : QString::number(r.ratio, 'E', 2), true));
     mTable->item(row, 2)->setForeground(r.errors > 0 ? QColor(0xb3, 0x26, 0x1e) : palette().color(QPalette::Text));
   }

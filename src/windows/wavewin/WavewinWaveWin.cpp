@@ -20,18 +20,13 @@
 #include "sequences/CPortInfo.h"
 #include "support/ConditionListLoader.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
 #include "windows/TaskFollower.h"
 
 namespace {
 
 const QString kNoCapture = QStringLiteral("No capture yet. Start the instrument (Run, F5) and press Capture.");
-
-QString Grouped(long value) {
-  QString digits = QString::number(std::labs(value));
-  for (int at = digits.size() - 3; at > 0; at -= 3) digits.insert(at, QChar(0x2009));
-  return value < 0 ? QStringLiteral("−") + digits : digits;
-}
 
 // A time with four significant digits in the unit that suits it.
 QString TimeText(double seconds) {
@@ -169,10 +164,10 @@ void WavewinWaveWin::ShowCapture(const QString& emptyText) {
     return;
   }
   mSummary->setText(QStringLiteral("%1 vectors × %2 traces · clock period %3 · %4 error vectors")
-                        .arg(Grouped(mData.GetLength()))
+                        .arg(GroupedNumber(mData.GetLength()))
                         .arg(width)
                         .arg(TimeText(mData.GetPeriod()))
-                        .arg(Grouped(mData.ErrorVectors())));
+                        .arg(GroupedNumber(mData.ErrorVectors())));
 }
 
 void WavewinWaveWin::ApplyBus() {
@@ -201,10 +196,10 @@ void WavewinWaveWin::ShowCursors() {
   const long b = mView->GetCursor(1);
   const double period = mData.GetPeriod();
   QStringList parts;
-  if (a >= 0) parts << QStringLiteral("A: %1 (%2)").arg(Grouped(a), TimeText(static_cast<double>(a) * period));
-  if (b >= 0) parts << QStringLiteral("B: %1 (%2)").arg(Grouped(b), TimeText(static_cast<double>(b) * period));
+  if (a >= 0) parts << QStringLiteral("A: %1 (%2)").arg(GroupedNumber(a), TimeText(static_cast<double>(a) * period));
+  if (b >= 0) parts << QStringLiteral("B: %1 (%2)").arg(GroupedNumber(b), TimeText(static_cast<double>(b) * period));
   if (a >= 0 && b >= 0) {
-    parts << QStringLiteral("B − A: %1 vectors = %2").arg(Grouped(b - a), TimeText(static_cast<double>(b - a) * period));
+    parts << QStringLiteral("B − A: %1 vectors = %2").arg(GroupedNumber(b - a), TimeText(static_cast<double>(b - a) * period));
   }
   mCursors->setText(parts.isEmpty() ? QStringLiteral("Click to set cursor A, right-click for cursor B.")
                                     : parts.join(QStringLiteral("    ")));
