@@ -10,6 +10,8 @@ class GridDisp : public QWidget {
   Q_OBJECT
   // Width in cells; 0 shares the width the fixed columns leave.
   Q_PROPERTY(int cells READ Cells WRITE SetCells)
+  // An address or name column's text to the right (numbers) rather than the left.
+  Q_PROPERTY(bool right READ IsRight WRITE SetRight)
 
  public:
   enum class Kind { kAddr, kDigit, kName };
@@ -19,6 +21,9 @@ class GridDisp : public QWidget {
   Kind GetKind() const { return mKind; }
   int Cells() const { return mCells; }
   void SetCells(int cells);
+  bool IsRight() const { return mRight; }
+  void SetRight(bool right) { mRight = right; }
+  Qt::Alignment Alignment() const { return (mRight ? Qt::AlignRight : Qt::AlignLeft) | Qt::AlignVCenter; }
   // The grid this column belongs to: its nearest GridManager ancestor.
   GridManager* Grid() const;
   // The line and cell at a point of this column; false in the header or outside the lines.
@@ -34,4 +39,5 @@ class GridDisp : public QWidget {
  private:
   Kind mKind;
   int mCells = 0;
+  bool mRight = false;
 };

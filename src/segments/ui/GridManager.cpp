@@ -193,19 +193,24 @@ void GridManager::paintEvent(QPaintEvent*) {
   painter.fillRect(rect(), palette().window());
 }
 
+// A digit column draws a cell per digit; an address or name column one cell across the column
+// per line, its text kept clear of the column's edges.
 void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const {
   const QPalette& pal = disp.palette();
-  const int dx = mFields.dx;
   const int dy = mFields.dy;
   painter.fillRect(area, pal.base());
-  if (dx <= 0 || dy <= 0) return;
-  const int cells = disp.CellsShown();
+  if (mFields.dx <= 0 || dy <= 0) return;
+  const bool digits = disp.GetKind() == GridDisp::Kind::kDigit;
+  const int dx = digits ? mFields.dx : disp.width();
+  const int pad = digits ? 0 : 6;
+  const int cells = digits ? disp.CellsShown() : 1;
   const int top = mFields.offy;
   if (area.top() < top) {
     painter.fillRect(QRect(0, 0, disp.width(), top), pal.window());
     painter.setPen(pal.windowText().color());
+    const Qt::Alignment align = digits ? Qt::AlignCenter : disp.Alignment();
     for (int c = 0; c < cells; ++c) {
-      painter.drawText(QRect(c * dx, 0, dx, top), Qt::AlignCenter, DispHeader(disp, c));
+      painter.drawText(QRect(c * dx + pad, 0, dx - 2 * pad, top), align, DispHeader(disp, c));
     }
   }
   const long first = DispFirstLine();
@@ -229,7 +234,7 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
       }
       if (cell.text.isEmpty()) continue;
       painter.setPen(cell.cursor ? pal.highlightedText().color() : cell.marked ? alert : cell.dim ? dimText : text);
-      painter.drawText(box, Qt::AlignCenter, cell.text);
+      painter.drawText(box.adjusted(pad, 0, -pad, 0), digits ? Qt::AlignCenter : disp.Alignment(), cell.text);
     }
   }
 }

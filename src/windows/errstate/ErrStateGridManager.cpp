@@ -1,7 +1,6 @@
 #include "windows/errstate/ErrStateGridManager.h"
 
 #include <QKeyEvent>
-#include <QPainter>
 #include <algorithm>
 #include <cmath>
 
@@ -120,31 +119,6 @@ GridCell ErrStateGridManager::DispCell(const GridDisp& disp, long line, int cell
   out.dim = errors == 0;
   out.cursor = line == mLine && channel == mChannel;
   return out;
-}
-
-// The name columns are drawn a line at a time across the column; the channels cell by cell.
-void ErrStateGridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const {
-  const int dy = GetDY();
-  if (disp.GetKind() == GridDisp::Kind::kDigit || dy <= 0) {
-    GridManager::DispPaint(disp, painter, area);
-    return;
-  }
-  const QPalette& pal = disp.palette();
-  const int top = GetOffY();
-  const Qt::Alignment align = (IsTotals(disp) ? Qt::AlignRight : Qt::AlignLeft) | Qt::AlignVCenter;
-  painter.fillRect(area, pal.base());
-  painter.fillRect(QRect(0, 0, disp.width(), top), pal.window());
-  painter.setPen(pal.windowText().color());
-  painter.drawText(QRect(6, 0, disp.width() - 12, top), align, DispHeader(disp, 0));
-  for (long line = mFirst; line < DispLineCount(); ++line) {
-    const int y = top + static_cast<int>(line - mFirst) * dy;
-    if (y > area.bottom()) break;
-    const GridCell cell = DispCell(disp, line, 0);
-    const QRect box(0, y, disp.width(), dy);
-    if (cell.selected) painter.fillRect(box, pal.highlight().color().lighter(170));
-    painter.setPen(cell.marked ? QColor(0xc0, 0x10, 0x10) : pal.text().color());
-    painter.drawText(box.adjusted(6, 0, -6, 0), align, cell.text);
-  }
 }
 
 void ErrStateGridManager::DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers) {

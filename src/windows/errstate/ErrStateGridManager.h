@@ -40,7 +40,6 @@ class ErrStateGridManager : public GridManager {
   void DispScrollTo(long firstLine) override { mFirst = firstLine; }
   QString DispHeader(const GridDisp& disp, int cell) const override;
   GridCell DispCell(const GridDisp& disp, long line, int cell) const override;
-  void DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const override;
   void DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers) override;
 
  protected:
