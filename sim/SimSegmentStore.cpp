@@ -1,5 +1,6 @@
 #include "SimSegmentStore.h"
 
+#include <algorithm>
 #include <chrono>
 #include <climits>
 #include <ctime>
@@ -42,6 +43,7 @@ const SimSegmentStore::StoreEntry SimSegmentStore::kStoreCommands[] = {
     {":EDIT:SEGM:RPAT", &SimSegmentStore::RealPath, nullptr},
     {":EDIT:SEGM:CRE", &SimSegmentStore::Create, nullptr},
     {":EDIT:SEGM:EXIS", &SimSegmentStore::Exists, nullptr},
+    {":EDIT:SEGM:CAT", &SimSegmentStore::Catalog, nullptr},
     {":EDIT:SEGM:DEL", nullptr, &SimSegmentStore::Delete},
     {":EDIT:SEGM:PATT:CLIP", &SimSegmentStore::ClipFilled, nullptr},
     {":EDIT:SEGM:PATT:CLIP:WIDT", &SimSegmentStore::ClipWidth, nullptr},
@@ -233,6 +235,26 @@ int SimSegmentStore::Exists(const SimCommand& cmd, SimContext& context) {
   if (int rc = Name(cmd, name)) return rc;
   std::error_code error;
   context.Reply(PathOf(name, path) && std::filesystem::is_regular_file(path, error) ? "TRUE" : "FALSE");
+  return 0;
+}
+
+// The saved segments of the data directory, sub-folders as "dir/name", quoted and sorted.
+int SimSegmentStore::Catalog(const SimCommand&, SimContext& context) {
+  std::vector<std::string> names;
+  std::error_code error;
+  if (!mDir.empty()) {
+    for (auto it = std::filesystem::recursive_directory_iterator(mDir, error);
+         !error && it != std::filesystem::recursive_directory_iterator(); it.increment(error)) {
+      if (!it->is_regular_file(error) || it->path().extension() != kExtension) continue;
+      std::filesystem::path relative = it->path().lexically_relative(mDir);
+      relative.replace_extension();
+      names.push_back(relative.generic_string());
+    }
+  }
+  std::sort(names.begin(), names.end());
+  Dstring reply;
+  for (const std::string& name : names) reply += (reply.empty() ? "\"" : ",\"") + name + "\"";
+  context.Reply(reply);
   return 0;
 }
 

@@ -62,6 +62,7 @@ class SimSegmentStore : public SimCommandModule {
   int RealPath(const SimCommand& cmd, SimContext& context);
   int Create(const SimCommand& cmd, SimContext& context);
   int Exists(const SimCommand& cmd, SimContext& context);
+  int Catalog(const SimCommand& cmd, SimContext& context);
   int Delete(const SimCommand& cmd, SimContext& context);
   int FileInfo(const SimCommand& cmd, SimContext& context);
   int ClipFilled(const SimCommand& cmd, SimContext& context);

@@ -12,8 +12,10 @@
 #include "segments/SegmentKeywords.h"
 #include "segments/SegmentReply.h"
 #include "segments/SegmentStatus.h"
+#include "support/DataParcel.h"
 #include "support/FWBlocker.h"
 #include "support/LgsDebug.h"
+#include "support/ParserExpression.h"
 
 std::vector<QenSegmentDs*> QenSegmentPool::mPool;
 DirtyFlagDs* QenSegmentPool::mDirtyFlag = nullptr;
@@ -238,6 +240,26 @@ int QenSegmentPool::Exists(const Dstring& name, bool& exists, ConditionList& lis
   if (SegmentReply::Truth(reply, exists)) return SegmentStatus::kOk;
   return SegmentReply::Refuse(list, "GUI_SEGMENTDS_BAD_REPLY", {cmd, SegmentReply::Shown(reply)},
                               SegmentStatus::kBadReply);
+}
+
+int QenSegmentPool::Catalog(std::vector<Dstring>& names, ConditionList& list) {
+  const Dstring cmd = Dstring::Format("%s:EDIT:SEGM:CAT?", Handle().c_str());
+  Dstring reply;
+  if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  DataParcel items;
+  ConditionList ignored;
+  std::vector<Dstring> read;
+  bool good = reply.empty() || ParserExpression::Parse(reply, items, ignored) == 0;
+  for (std::size_t i = 0; good && i < items.size(); ++i) {
+    good = items[i].GetType() == DataItemType::String;
+    if (good) read.emplace_back(items[i].GetText());
+  }
+  if (!good) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTDS_BAD_REPLY", {cmd, SegmentReply::Shown(reply)},
+                                SegmentStatus::kBadReply);
+  }
+  names = std::move(read);
+  return SegmentStatus::kOk;
 }
 
 int QenSegmentPool::Save(unsigned number, ConditionList& list) {

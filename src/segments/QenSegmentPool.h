@@ -56,6 +56,8 @@ class QenSegmentPool {
                   ConditionList& list);
   static int Delete(const Dstring& name, ConditionList& list);
   static int Exists(const Dstring& name, bool& exists, ConditionList& list);
+  // The names of the saved segments, as the server sorts them.
+  static int Catalog(std::vector<Dstring>& names, ConditionList& list);
   static int Save(unsigned number, ConditionList& list);
   static int Close(unsigned number, ConditionList& list);
   static int RealPath(const Dstring& name, Dstring& path, ConditionList& list);

@@ -486,6 +486,21 @@ TEST_F(QenSegmentDsTest, CreateLeavesNoHalfMadeSegment) {
   EXPECT_EQ(QenSegmentPool::NumSources(), 0u);
 }
 
+// The catalogue is a list of names: anything else is refused and the names held are kept.
+TEST_F(QenSegmentDsTest, TheCatalogueTakesOnlyNames) {
+  std::vector<Dstring> names;
+  Inst().Expect("_H:EDIT:SEGM:CAT?", "\"a/b\",\"c\"");
+  ASSERT_EQ(QenSegmentPool::Catalog(names, mList), 0);
+  EXPECT_EQ(names, (std::vector<Dstring>{"a/b", "c"}));
+  Inst().Expect("_H:EDIT:SEGM:CAT?", "\"a\",7");
+  EXPECT_NE(QenSegmentPool::Catalog(names, mList), 0);
+  EXPECT_EQ(names.size(), 2u);
+  EXPECT_NE(mList.ToText().find("\"a\",7"), std::string::npos) << mList.ToText();
+  Inst().Expect("_H:EDIT:SEGM:CAT?", "");
+  ASSERT_EQ(QenSegmentPool::Catalog(names, mList), 0);
+  EXPECT_TRUE(names.empty());
+}
+
 // A change the server reports for an open segment makes it read again and tell its views.
 TEST_F(QenSegmentDsTest, TheDirtyFlagRereadsTheSegmentsItNames) {
   auto* dirty = new DirtyFlagDs;

@@ -3,6 +3,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <memory>
 #include <random>
@@ -146,6 +147,9 @@ TEST_F(SegmentSimTest, ASegmentLivesThroughEditsSavesAndARestart) {
   mSim.reset();
   mOther.Disconnect();
   StartServer();
+  std::vector<Dstring> names;
+  ASSERT_EQ(QenSegmentPool::Catalog(names, mList), 0) << mList.ToText();
+  EXPECT_NE(std::find(names.begin(), names.end(), Dstring("Work/Round")), names.end());
   ds = QenSegmentPool::AllocDs("Work/Round");
   ASSERT_EQ(ds->Open(mList), 0) << mList.ToText();
   EXPECT_FALSE(ds->IsDirty());
@@ -161,6 +165,8 @@ TEST_F(SegmentSimTest, ASegmentLivesThroughEditsSavesAndARestart) {
   ASSERT_EQ(QenSegmentPool::Delete("Work/Round", mList), 0);
   ASSERT_EQ(QenSegmentPool::Exists("Work/Round", exists, mList), 0);
   EXPECT_FALSE(exists);
+  ASSERT_EQ(QenSegmentPool::Catalog(names, mList), 0);
+  EXPECT_EQ(std::find(names.begin(), names.end(), Dstring("Work/Round")), names.end());
 }
 
 // The other user removes vectors, so the range written back no longer exists.

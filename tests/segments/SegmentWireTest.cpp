@@ -16,6 +16,7 @@ const std::map<Dstring, WireReply> kReplies = {
     {"_H:EDIT:SEGM:RPAT? \"S\"", {"\"/d/S.qseg\""}},
     {"_H:EDIT:SEGM:EXIS? \"S\"", {"TRUE"}},
     {"_H:EDIT:SEGM:EXIS? \"N\"", {"FALSE"}},
+    {"_H:EDIT:SEGM:CAT?", {"\"S\""}},
     {"_H:EDIT:SEGM:CRE? \"N\",PRBS", {"5"}},
     {"_H:EDIT:SEGM:OPEN? \"N\"", {"5"}},
     {"_H:EDIT:SEGM:RPAT? \"N\"", {"\"/d/N.qseg\""}},
@@ -80,6 +81,12 @@ const WireRow kRows[] = {
        return QenSegmentPool::Exists("S", exists, l);
      },
      {"_H:EDIT:SEGM:EXIS? \"S\""}},
+    {"catalogue",
+     [](ConditionList& l) {
+       std::vector<Dstring> names;
+       return QenSegmentPool::Catalog(names, l);
+     },
+     {"_H:EDIT:SEGM:CAT?"}},
     {"delete by name", [](ConditionList& l) { return QenSegmentPool::Delete("S", l); }, {"_H:EDIT:SEGM:DEL \"S\""}},
     {"real path",
      [](ConditionList& l) {
