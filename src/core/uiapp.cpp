@@ -147,7 +147,7 @@ int uiapp::LoadDatLib(ConditionList& list) { return Toolkit::Get().LoadResourceL
 const std::vector<Dstring>& uiapp::ClassNames() {
   static const std::vector<Dstring> kClasses = {"UnitEd",      "LbUnitEd",  "QenDsCBut", "QenDsRBut", "QenDsCBox",
                                                 "QenDsSlidr",  "QenDsSTEd", "QenParEd",  "QenParLb",  "GridManager",
-                                                "AddrDisp",    "DigitDisp", "NameDisp",  "ErrStateGridManager"};
+                                                "AddrDisp",    "DigitDisp", "NameDisp",  "ErrStateGridManager", "SegmentGridManager"};
   return kClasses;
 }
 

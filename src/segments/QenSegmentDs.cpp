@@ -368,6 +368,11 @@ int QenSegmentDs::GetDigit(SegmentBuffer* buffer, long vector, long trace, DataF
                            ConditionList& list) {
   FWBlocker guard("QenSegmentDs::GetDigit", list);
   if (int status = guard.Block()) return status;
+  return DigitOf(buffer, vector, trace, format, digit, list);
+}
+
+int QenSegmentDs::DigitOf(const SegmentBuffer* buffer, long vector, long trace, DataFormat format, char& digit,
+                          ConditionList& list) const {
   if (int status = FindBuffer(buffer, list)) return status;
   long d = 0;
   if (int status = DigitIndex(trace, format, buffer->mWidth, d, list)) return status;

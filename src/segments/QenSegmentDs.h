@@ -100,6 +100,10 @@ class QenSegmentDs : public QenDs {
                ConditionList& list);
   int SetDigit(SegmentBuffer* buffer, long vector, long trace, DataFormat format, char digit,
                ConditionList& list);
+  // GetDigit of what the buffer holds without the operation guard: a view still shows the
+  // data while another client holds the instrument.
+  int DigitOf(const SegmentBuffer* buffer, long vector, long trace, DataFormat format, char& digit,
+              ConditionList& list) const;
   int MaxDigit(DataFormat format, long& max, ConditionList& list);
   // The last digit index of `format` over `width` traces.
   static long MaxDigitOf(DataFormat format, long width);

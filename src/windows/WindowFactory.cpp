@@ -1,6 +1,7 @@
 #include "windows/WindowFactory.h"
 
 #include "windows/ber/BerBerWin.h"
+#include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/deskew/DeskewDeskewWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
@@ -27,6 +28,7 @@ WindowFactory::Make Maker() {
 const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
   static const std::vector<Entry> kEntries = {
       {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>()},
+      {"dataedit.SegmentEditWin", "Segment Editor", Maker<DataeditSegmentEditWin>()},
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},

@@ -1,6 +1,9 @@
 #include "common/gui/GuiSimFixture.h"
 
+#include <unistd.h>
+
 #include <QApplication>
+#include <filesystem>
 #include <string>
 
 #include "core/ErrorJournal.h"
@@ -23,14 +26,18 @@ void EnsureApplication() {
   if (QApplication::instance() == nullptr) new QApplication(argc, argv);
 }
 
+// Test programs run side by side: each qensim keeps its segments in a folder of its own.
 void GuiSimFixture::SetUpTestSuite() {
   EnsureApplication();
-  sSim = new SimProcess({"--test-control"});
+  sDataDir = (std::filesystem::temp_directory_path() / ("qengui-gui-" + std::to_string(::getpid()))).string();
+  sSim = new SimProcess({"--test-control", "--data-dir", sDataDir});
 }
 
 void GuiSimFixture::TearDownTestSuite() {
   delete sSim;
   sSim = nullptr;
+  std::error_code ignored;
+  std::filesystem::remove_all(sDataDir.c_str(), ignored);
 }
 
 void GuiSimFixture::SetUp() {

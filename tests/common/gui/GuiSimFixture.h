@@ -29,6 +29,7 @@ class GuiSimFixture : public testing::Test {
   void Poll();
 
   static inline SimProcess* sSim = nullptr;
+  static inline Dstring sDataDir;
   QtToolkit mToolkit;
   std::vector<Dstring> mAlerts;
   ConditionList mList;

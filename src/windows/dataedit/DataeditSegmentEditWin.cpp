@@ -1,0 +1,315 @@
+#include "windows/dataedit/DataeditSegmentEditWin.h"
+
+#include <QAction>
+#include <QComboBox>
+#include <QDialog>
+#include <QDialogButtonBox>
+#include <QFormLayout>
+#include <QInputDialog>
+#include <QLabel>
+#include <QLayout>
+#include <QLineEdit>
+#include <QListWidget>
+#include <QMdiSubWindow>
+#include <QMenuBar>
+#include <QMessageBox>
+#include <QPushButton>
+#include <QSpinBox>
+
+#include "params/ui/BoundControl.h"
+#include "segments/QenSegmentDs.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/ui/SegmentGridManager.h"
+#include "support/FWBlocker.h"
+#include "toolkit/qt/ResourceLibrary.h"
+
+// A menu entry: its text and key, what it does, and when it is offered.
+struct DataeditSegmentEditWin::Command {
+  const char* menu;
+  const char* name;
+  const char* text;
+  QKeySequence key;
+  std::function<int(SegmentGridManager&, ConditionList&)> run;
+  std::function<bool(SegmentGridManager&)> possible;
+};
+
+DataeditSegmentEditWin::DataeditSegmentEditWin(QWidget* parent) : QWidget(parent) {
+  setObjectName(QStringLiteral("DataeditSegmentEditWin"));
+}
+
+// The grid goes after this window's part of the object: what it says while it lets go of the
+// segment must not reach this window any more.
+DataeditSegmentEditWin::~DataeditSegmentEditWin() {
+  if (mGrid != nullptr) disconnect(mGrid, nullptr, this, nullptr);
+}
+
+int DataeditSegmentEditWin::Load(ConditionList& list) {
+  if (int status = ResourceLibrary::LoadInto("dataedit.SegmentEditWin", this, list)) return status;
+  mGrid = findChild<SegmentGridManager*>(QStringLiteral("GridSegment"));
+  mSegments = findChild<QListWidget*>(QStringLiteral("ListSegments"));
+  mFormat = findChild<QComboBox*>(QStringLiteral("CBoxFormat"));
+  mAddr = findChild<QComboBox*>(QStringLiteral("CBoxAddr"));
+  mFind = findChild<QLineEdit*>(QStringLiteral("EditFind"));
+  mGoto = findChild<QLineEdit*>(QStringLiteral("EditGoto"));
+  mCursor = findChild<QLabel*>(QStringLiteral("LabelCursor"));
+  mMessage = findChild<QLabel*>(QStringLiteral("LabelMessage"));
+  if (mGrid == nullptr || mSegments == nullptr || mFormat == nullptr || mAddr == nullptr || mFind == nullptr ||
+      mGoto == nullptr || mCursor == nullptr || mMessage == nullptr) {
+    list.Add(1, "The window resource \"dataedit.SegmentEditWin\" lacks its grid, segment list or tools.");
+    return 1;
+  }
+  mMessage->setStyleSheet(QStringLiteral("color: #b3261e"));
+  BuildMenus();
+  connect(mGrid, &GridManager::StateChanged, this, &DataeditSegmentEditWin::ShowState);
+  connect(mGrid, &SegmentGridManager::Message, mMessage, &QLabel::setText);
+  connect(mSegments, &QListWidget::itemActivated, this, &DataeditSegmentEditWin::HitSegmentChosen);
+  connect(mSegments, &QListWidget::itemClicked, this, &DataeditSegmentEditWin::HitSegmentChosen);
+  connect(findChild<QPushButton*>(QStringLiteral("PButNew")), &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButNew);
+  connect(findChild<QPushButton*>(QStringLiteral("PButDelete")), &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButDelete);
+  connect(mFormat, &QComboBox::currentIndexChanged, this, [this](int index) {
+    Run([this, index](ConditionList& l) { return mGrid->SetDataFormat(0, static_cast<DataFormat>(index), l); });
+  });
+  connect(mAddr, &QComboBox::currentIndexChanged, this, [this](int index) {
+    Run([this, index](ConditionList& l) { return mGrid->SetAddrFormat(static_cast<AddrFormat>(index), l); });
+  });
+  connect(mFind, &QLineEdit::textChanged, this, [this](const QString& text) {
+    mGrid->SetFindText(text.trimmed().toStdString());
+    ShowState();
+  });
+  connect(mFind, &QLineEdit::returnPressed, Action(QStringLiteral("FindNext")), &QAction::trigger);
+  connect(findChild<QPushButton*>(QStringLiteral("PButFindNext")), &QPushButton::clicked, Action(QStringLiteral("FindNext")), &QAction::trigger);
+  connect(findChild<QPushButton*>(QStringLiteral("PButFindPrev")), &QPushButton::clicked, Action(QStringLiteral("FindPrevious")), &QAction::trigger);
+  connect(mGoto, &QLineEdit::returnPressed, this, &DataeditSegmentEditWin::HitGoto);
+  setFocusProxy(mGrid);
+  const int status = ReadCatalog(list);
+  ShowState();
+  return status;
+}
+
+void DataeditSegmentEditWin::BuildMenus() {
+  using G = SegmentGridManager;
+  const auto editable = [](G& g) { return g.IsFillPossible(); };
+  const Command commands[] = {
+      {"&Segment", "Save", "&Save", QKeySequence(Qt::CTRL | Qt::ALT | Qt::Key_S),
+       [](G& g, ConditionList& l) { return g.SaveSegment(0, 0, l); }, [](G& g) { return g.IsDirty(); }},
+      {"&Segment", "SaveAs", "Save &As…", QKeySequence(), nullptr, [](G& g) { return g.GetSegmentDs() != nullptr; }},
+      {"&Edit", "Fill0", "Fill with &0", QKeySequence(Qt::CTRL | Qt::Key_0),
+       [](G& g, ConditionList& l) { g.SetFillState(0); return g.ModifyFill(l); }, editable},
+      {"&Edit", "Fill1", "Fill with &1", QKeySequence(Qt::CTRL | Qt::Key_1),
+       [](G& g, ConditionList& l) { g.SetFillState(1); return g.ModifyFill(l); }, editable},
+      {"&Edit", "Invert", "&Invert", QKeySequence(Qt::CTRL | Qt::Key_I), [](G& g, ConditionList& l) { return g.ModifyInvert(l); },
+       [](G& g) { return g.IsInvertPossible(); }},
+      {"&Edit", "MirrorTraces", "Mirror &Traces", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.ModifyMirror(MirrorMode::kTrace, l); }, [](G& g) { return g.IsMirrorPossible(); }},
+      {"&Edit", "MirrorVectors", "Mirror &Vectors", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.ModifyMirror(MirrorMode::kVector, l); }, [](G& g) { return g.IsMirrorPossible(); }},
+      {"&Edit", "Copy", "&Copy", QKeySequence::Copy, [](G& g, ConditionList& l) { return g.ModifyCopy(l); },
+       [](G& g) { return g.IsCopyPossible(); }},
+      {"&Edit", "Paste", "&Paste", QKeySequence::Paste, [](G& g, ConditionList& l) { return g.ModifyPaste(l); }, nullptr},
+      {"&Edit", "InsertVectors", "I&nsert Vectors…", QKeySequence(Qt::Key_Insert), nullptr,
+       [](G& g) { return g.IsInsertPossible(); }},
+      {"&Edit", "DeleteVectors", "&Delete Vectors", QKeySequence(Qt::Key_Delete), [](G& g, ConditionList& l) { return g.ModifyDelete(l); },
+       [](G& g) { return g.IsDeletePossible(); }},
+      {"&Edit", "SelectAll", "Select &All", QKeySequence::SelectAll,
+       [](G& g, ConditionList& l) {
+         long vectors = 0, digits = 0;
+         g.GetNumVectors(0, vectors);
+         g.GetNumDigits(0, digits);
+         return g.SetSelection(0, 0, vectors - 1, 0, digits - 1, 0, l);
+       },
+       editable},
+      {"&Go", "FindNext", "Find &Next", QKeySequence(Qt::Key_F3),
+       [](G& g, ConditionList& l) { return g.FindPattern(FindDirection::kNext, VectorTrace::kVector, l); },
+       [](G& g) { return g.IsFindPossible(); }},
+      {"&Go", "FindPrevious", "Find &Previous", QKeySequence(Qt::SHIFT | Qt::Key_F3),
+       [](G& g, ConditionList& l) { return g.FindPattern(FindDirection::kPrevious, VectorTrace::kVector, l); },
+       [](G& g) { return g.IsFindPossible(); }},
+      {"&Go", "NextError", "Next &Error", QKeySequence(Qt::CTRL | Qt::Key_E),
+       [](G& g, ConditionList& l) { return g.MoveToError(ERR_DIR::kNext, l); }, [](G& g) { return g.CanMoveToError(ERR_DIR::kNext); }},
+      {"&Go", "PreviousError", "Pre&vious Error", QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_E),
+       [](G& g, ConditionList& l) { return g.MoveToError(ERR_DIR::kPrevious, l); },
+       [](G& g) { return g.CanMoveToError(ERR_DIR::kPrevious); }},
+      {"&Go", "Goto", "&Go to Vector…", QKeySequence(Qt::CTRL | Qt::Key_G), nullptr, [](G& g) { return g.CanShowGoto(); }},
+  };
+  auto* bar = new QMenuBar(this);
+  layout()->setMenuBar(bar);
+  QMenu* menu = nullptr;
+  for (const Command& c : commands) {
+    if (menu == nullptr || menu->title() != QLatin1String(c.menu)) menu = bar->addMenu(QString::fromUtf8(c.menu));
+    QAction* action = menu->addAction(QString::fromUtf8(c.text));
+    action->setObjectName(QString::fromLatin1(c.name));
+    action->setShortcut(c.key);
+    // The keys are the grid's: in the find field Ctrl+C copies its text, not the segment.
+    action->setShortcutContext(Qt::WidgetShortcut);
+    mGrid->addAction(action);
+    if (c.run) {
+      auto run = c.run;
+      connect(action, &QAction::triggered, this, [this, run] { Run([this, run](ConditionList& l) { return run(*mGrid, l); }); });
+    }
+    if (c.possible) {
+      auto possible = c.possible;
+      mOffered.emplace_back(action, [this, possible] { return possible(*mGrid); });
+    }
+  }
+  connect(Action(QStringLiteral("SaveAs")), &QAction::triggered, this, &DataeditSegmentEditWin::HitSaveAs);
+  connect(Action(QStringLiteral("InsertVectors")), &QAction::triggered, this, &DataeditSegmentEditWin::HitInsertVectors);
+  connect(Action(QStringLiteral("Goto")), &QAction::triggered, mGoto, qOverload<>(&QWidget::setFocus));
+  // Whether the server's clipboard fits is asked only when the menu opens.
+  for (QMenu* m : bar->findChildren<QMenu*>()) {
+    connect(m, &QMenu::aboutToShow, this, [this] { Action(QStringLiteral("Paste"))->setEnabled(mGrid->IsPastePossible()); });
+  }
+}
+
+QAction* DataeditSegmentEditWin::Action(const QString& name) const { return findChild<QAction*>(name); }
+
+QString DataeditSegmentEditWin::MessageText() const { return mMessage->text(); }
+
+void DataeditSegmentEditWin::ShowState() {
+  for (const auto& [action, possible] : mOffered) action->setEnabled(possible());
+  Action(QStringLiteral("Paste"))->setEnabled(mGrid->IsEditable());
+  mCursor->setText(mGrid->CursorText());
+  Dstring name;
+  ConditionList ignored;
+  mGrid->GetSegmentName(0, 0, name, ignored);
+  const QString title = name.empty() ? QStringLiteral("Segment Editor")
+                                     : QStringLiteral("Segment Editor – %1%2").arg(QString::fromStdString(name),
+                                                                                  mGrid->IsDirty() ? QStringLiteral(" *") : QString());
+  setWindowTitle(title);
+  if (auto* sub = qobject_cast<QMdiSubWindow*>(parentWidget())) sub->setWindowTitle(title);
+}
+
+void DataeditSegmentEditWin::Run(const std::function<int(ConditionList&)>& operation) {
+  ConditionList list;
+  mMessage->clear();
+  // A lock is a state, not an error: it adds no condition, so it is said here.
+  if (operation(list) == FWBlocker::kLocked) mMessage->setText(SegmentGridManager::LockedText());
+  ShowState();
+  BoundControl::Report(list);
+}
+
+int DataeditSegmentEditWin::ReadCatalog(ConditionList& list) {
+  std::vector<Dstring> names;
+  if (int status = QenSegmentPool::Catalog(names, list)) return status;
+  Dstring open;
+  mGrid->GetSegmentName(0, 0, open, list);
+  const QSignalBlocker quiet(mSegments);
+  mSegments->clear();
+  for (const Dstring& name : names) {
+    auto* item = new QListWidgetItem(QString::fromStdString(name), mSegments);
+    if (name == open) mSegments->setCurrentItem(item);
+  }
+  return 0;
+}
+
+int DataeditSegmentEditWin::OpenSegment(const Dstring& name, ConditionList& list) {
+  mMessage->clear();
+  const int status = mGrid->HookOn(0, 0, name, list);
+  ShowState();
+  return status;
+}
+
+int DataeditSegmentEditWin::CreateSegment(const SegmentProperties& properties, ConditionList& list) {
+  unsigned created = 0;
+  if (int status = QenSegmentPool::Create(properties, created, list)) return status;
+  if (int status = ReadCatalog(list)) return status;
+  const int status = OpenSegment(properties.name, list);
+  ReadCatalog(list);
+  return status;
+}
+
+int DataeditSegmentEditWin::DeleteSegment(const Dstring& name, ConditionList& list) {
+  Dstring open;
+  mGrid->GetSegmentName(0, 0, open, list);
+  if (open == name) {
+    if (int status = mGrid->Release(list)) return status;
+  }
+  const int status = QenSegmentPool::Delete(name, list);
+  ReadCatalog(list);
+  ShowState();
+  return status;
+}
+
+void DataeditSegmentEditWin::HitSegmentChosen() {
+  QListWidgetItem* item = mSegments->currentItem();
+  if (item == nullptr) return;
+  Dstring open;
+  ConditionList list;
+  mGrid->GetSegmentName(0, 0, open, list);
+  if (open == item->text().toStdString()) return;
+  OpenSegment(item->text().toStdString(), list);
+  BoundControl::Report(list);
+}
+
+void DataeditSegmentEditWin::HitPButNew() {
+  QDialog dialog(this);
+  dialog.setWindowTitle(QStringLiteral("New Segment"));
+  auto* form = new QFormLayout(&dialog);
+  auto* name = new QLineEdit(&dialog);
+  auto* length = new QSpinBox(&dialog);
+  length->setRange(1, 1 << 30);
+  length->setValue(1024);
+  length->setGroupSeparatorShown(true);
+  auto* width = new QSpinBox(&dialog);
+  width->setRange(1, 4096);
+  width->setValue(16);
+  auto* coding = new QComboBox(&dialog);
+  coding->addItems({QStringLiteral("01"), QStringLiteral("LH"), QStringLiteral("01X"), QStringLiteral("LHX"),
+                    QStringLiteral("LHXZ01"), QStringLiteral("npkr"), QStringLiteral("npkrX")});
+  form->addRow(QStringLiteral("&Name"), name);
+  form->addRow(QStringLiteral("&Vectors"), length);
+  form->addRow(QStringLiteral("&Traces"), width);
+  form->addRow(QStringLiteral("&Coding"), coding);
+  auto* buttons = new QDialogButtonBox(QDialogButtonBox::Ok | QDialogButtonBox::Cancel, &dialog);
+  form->addRow(buttons);
+  connect(buttons, &QDialogButtonBox::accepted, &dialog, &QDialog::accept);
+  connect(buttons, &QDialogButtonBox::rejected, &dialog, &QDialog::reject);
+  if (dialog.exec() != QDialog::Accepted || name->text().trimmed().isEmpty()) return;
+  SegmentProperties properties;
+  properties.name = name->text().trimmed().toStdString();
+  properties.length = length->value();
+  properties.width = width->value();
+  properties.coding = coding->currentText().toStdString();
+  Run([this, &properties](ConditionList& l) { return CreateSegment(properties, l); });
+}
+
+void DataeditSegmentEditWin::HitPButDelete() {
+  QListWidgetItem* item = mSegments->currentItem();
+  if (item == nullptr) return;
+  if (QMessageBox::question(this, QStringLiteral("Delete Segment"),
+                            QStringLiteral("Delete the segment \"%1\" from the instrument?").arg(item->text())) != QMessageBox::Yes) {
+    return;
+  }
+  const Dstring name = item->text().toStdString();
+  Run([this, &name](ConditionList& l) { return DeleteSegment(name, l); });
+}
+
+void DataeditSegmentEditWin::HitSaveAs() {
+  bool ok = false;
+  const QString name = QInputDialog::getText(this, QStringLiteral("Save Segment As"), QStringLiteral("&Name"), QLineEdit::Normal, {}, &ok);
+  if (!ok || name.trimmed().isEmpty()) return;
+  Run([this, &name](ConditionList& l) {
+    const int status = mGrid->SaveSegmentAs(0, 0, name.trimmed().toStdString(), l);
+    ReadCatalog(l);
+    return status;
+  });
+}
+
+void DataeditSegmentEditWin::HitInsertVectors() {
+  bool ok = false;
+  const int count = QInputDialog::getInt(this, QStringLiteral("Insert Vectors"), QStringLiteral("&Vectors before the cursor"), 1, 1,
+                                         1 << 30, 1, &ok);
+  if (!ok) return;
+  Run([this, count](ConditionList& l) { return mGrid->ModifyInsert(VectorTrace::kVector, InsertMode::kBefore, count, l); });
+}
+
+void DataeditSegmentEditWin::HitGoto() {
+  bool number = false;
+  const QString text = mGoto->text().trimmed();
+  const long vector = mAddr->currentIndex() == 1 ? text.toLong(&number, 16) : text.toLong(&number, 10);
+  if (!number) {
+    mMessage->setText(QStringLiteral("\"%1\" is no vector number.").arg(text));
+    return;
+  }
+  Run([this, vector](ConditionList& l) { return mGrid->GoToVectorTrace(vector, mGrid->CursorTrace(), l); });
+  mGrid->setFocus();
+}

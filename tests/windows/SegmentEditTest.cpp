@@ -1,0 +1,170 @@
+#include <gtest/gtest.h>
+
+#include <QAction>
+#include <QLabel>
+#include <QLineEdit>
+#include <QListWidget>
+#include <QTest>
+#include <map>
+#include <memory>
+
+#include "common/gui/GuiSimFixture.h"
+#include "segments/QenSegmentDs.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/ui/GridDisp.h"
+#include "segments/ui/SegmentGridManager.h"
+#include "windows/dataedit/DataeditSegmentEditWin.h"
+
+namespace {
+
+// The segment editor against qensim: 64 vectors of 16 traces, four hex digits a vector.
+class SegmentEditTest : public GuiSimFixture {
+ protected:
+  void SetUp() override {
+    GuiSimFixture::SetUp();
+    mWin = OpenWindow();
+    ASSERT_NE(mWin, nullptr);
+    SegmentProperties properties;
+    properties.name = kName;
+    properties.length = 64;
+    properties.width = 16;
+    properties.coding = "01";
+    ASSERT_EQ(mWin->CreateSegment(properties, mList), 0) << mList.ToText();
+    mWin->Grid()->setFocus();
+  }
+  void TearDown() override {
+    mWin.reset();
+    QenSegmentPool::Delete(kName, mList);
+    GuiSimFixture::TearDown();
+  }
+  std::unique_ptr<DataeditSegmentEditWin> OpenWindow() {
+    auto win = std::make_unique<DataeditSegmentEditWin>();
+    EXPECT_EQ(win->Load(mList), 0) << mList.ToText();
+    win->resize(900, 600);
+    win->show();
+    return win;
+  }
+  // The digits of a vector as the grid shows them, the most significant first.
+  static QString Row(SegmentGridManager* grid, long vector) {
+    ConditionList list;
+    EXPECT_EQ(grid->SetVectorOffset(0, vector, list), 0) << list.ToText();
+    const GridDisp* digits = grid->findChild<GridDisp*>(QStringLiteral("digits"));
+    QString text;
+    for (int cell = 0; cell < 4; ++cell) text += grid->DispCell(*digits, vector, cell).text;
+    return text;
+  }
+  // Every vector of the segment: the expected ones as given, the rest zero.
+  static void ExpectRows(SegmentGridManager* grid, const std::map<long, QString>& expected) {
+    for (long v = 0; v < 64; ++v) {
+      const auto it = expected.find(v);
+      EXPECT_EQ(Row(grid, v), it == expected.end() ? QStringLiteral("0000") : it->second) << "vector " << v;
+    }
+  }
+  void Trigger(const char* action) {
+    QAction* a = mWin->Action(QString::fromLatin1(action));
+    ASSERT_NE(a, nullptr) << action;
+    ASSERT_TRUE(a->isEnabled()) << action;
+    a->trigger();
+  }
+
+  static constexpr const char* kName = "Edit/Work";
+  std::unique_ptr<DataeditSegmentEditWin> mWin;
+};
+
+}  // namespace
+
+TEST_F(SegmentEditTest, EditsFindsAndSavesWhatAFreshWindowReadsBack) {
+  SegmentGridManager* grid = mWin->Grid();
+  ASSERT_TRUE(grid->IsEditable());
+  EXPECT_EQ(mWin->SegmentList()->currentItem()->text(), QString::fromLatin1(kName));
+  EXPECT_EQ(mWin->windowTitle(), QStringLiteral("Segment Editor – Edit/Work"));
+
+  QTest::keyClicks(grid, QStringLiteral("a5F0"));
+  EXPECT_EQ(grid->CursorVector(), 1);
+  EXPECT_TRUE(mWin->windowTitle().endsWith(QStringLiteral(" *")));
+  // A letter outside hexadecimal changes nothing and says why.
+  QTest::keyClick(grid, Qt::Key_G);
+  EXPECT_FALSE(mWin->MessageText().isEmpty());
+  EXPECT_EQ(grid->CursorVector(), 1);
+
+  ASSERT_EQ(grid->SetSelection(0, 2, 5, 1, 2, 0, mList), 0) << mList.ToText();
+  Trigger("Fill1");
+  ASSERT_EQ(grid->SetVectorSelection(0, 3, 4, mList), 0);
+  Trigger("Invert");
+  ASSERT_EQ(grid->GoToVectorTrace(40, 12, mList), 0);
+  QTest::keyClicks(grid, QStringLiteral("beef"));
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+
+  ASSERT_EQ(grid->GoToVectorTrace(6, 12, mList), 0);
+  QTest::keyClicks(mWin->findChild<QLineEdit*>(QStringLiteral("EditFind")), QStringLiteral("bxef"));
+  Trigger("FindNext");
+  EXPECT_EQ(grid->CursorVector(), 40);
+  // Nothing like it after the last one: the cursor stays and the message says so.
+  ASSERT_EQ(grid->GoToVectorTrace(41, 12, mList), 0);
+  mWin->findChild<QLineEdit*>(QStringLiteral("EditFind"))->setText(QStringLiteral("1234"));
+  Trigger("FindNext");
+  EXPECT_EQ(grid->CursorVector(), 41);
+  EXPECT_TRUE(mWin->MessageText().contains(QStringLiteral("not found"))) << mWin->MessageText().toStdString();
+
+  const std::map<long, QString> expected = {{0, "a5f0"}, {2, "0ff0"}, {3, "f00f"}, {4, "f00f"}, {5, "0ff0"}, {40, "beef"}};
+  Trigger("Save");
+  EXPECT_FALSE(grid->IsDirty());
+  EXPECT_FALSE(mWin->windowTitle().endsWith(QStringLiteral(" *")));
+  mWin.reset();
+  ASSERT_EQ(QenSegmentPool::NumSources(), 0u);
+
+  mWin = OpenWindow();
+  ASSERT_EQ(mWin->OpenSegment(kName, mList), 0) << mList.ToText();
+  ExpectRows(mWin->Grid(), expected);
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}
+
+// A save refused under another user's lock keeps what was typed; it goes out once the lock is gone.
+TEST_F(SegmentEditTest, ALockDuringSaveKeepsTheEdits) {
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("c3"));
+  Control(":TEST:LOCK ON");
+  Trigger("Save");
+  EXPECT_TRUE(grid->IsDirty());
+  EXPECT_EQ(mWin->MessageText(), SegmentGridManager::LockedText());
+  // The grid still shows the data; typing is refused and says why.
+  EXPECT_EQ(Row(grid, 0), QStringLiteral("c300"));
+  mWin->findChild<QLabel*>(QStringLiteral("LabelMessage"))->clear();
+  QTest::keyClick(grid, Qt::Key_F);
+  EXPECT_EQ(mWin->MessageText(), SegmentGridManager::LockedText());
+  EXPECT_EQ(Row(grid, 1), QStringLiteral("0000"));
+  Control(":TEST:LOCK OFF");
+  Trigger("Save");
+  EXPECT_FALSE(grid->IsDirty());
+  mWin.reset();
+  mWin = OpenWindow();
+  ASSERT_EQ(mWin->OpenSegment(kName, mList), 0) << mList.ToText();
+  ExpectRows(mWin->Grid(), {{0, "c300"}});
+}
+
+// Scrolling to the end of a long segment reads only the lines around the ones shown.
+TEST_F(SegmentEditTest, TheGridHoldsAFewScreensWhateverTheLength) {
+  SegmentProperties properties;
+  properties.name = "Edit/Long";
+  properties.length = 1 << 20;
+  properties.width = 16;
+  properties.coding = "01";
+  ASSERT_EQ(mWin->CreateSegment(properties, mList), 0) << mList.ToText();
+  SegmentGridManager* grid = mWin->Grid();
+  const long screen = grid->GetNumDispVectors(0);
+  ASSERT_GT(screen, 10);
+  ASSERT_EQ(grid->GoToVectorTrace((1 << 20) - 1, 0, mList), 0);
+  QTest::keyClicks(grid, QStringLiteral("7"));
+  long lines = 0;
+  grid->GetNumVectors(0, lines);
+  EXPECT_EQ(lines, 1 << 20);
+  EXPECT_EQ(Row(grid, (1 << 20) - 1), QStringLiteral("0007"));
+  EXPECT_LE(grid->HeldVectors(), 5 * screen);
+  // Going back to the start writes the typed digit out before the buffer moves.
+  ASSERT_EQ(grid->GoToVectorTrace(0, 0, mList), 0);
+  EXPECT_LE(grid->HeldVectors(), 5 * screen);
+  EXPECT_EQ(Row(grid, 0), QStringLiteral("0000"));
+  EXPECT_EQ(Other(":EDIT:SEGM:EXIS? \"Edit/Long\""), "TRUE");
+  ASSERT_EQ(grid->Release(mList), 0);
+  QenSegmentPool::Delete("Edit/Long", mList);
+}
