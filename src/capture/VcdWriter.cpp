@@ -1,29 +1,13 @@
 #include "capture/VcdWriter.h"
 
-#include <cerrno>
 #include <cmath>
-#include <cstring>
-#include <fstream>
 
-#include "support/ConditionListLoader.h"
+#include "support/ExportFile.h"
 
 namespace {
 
 constexpr int kFirstCode = 33;
 constexpr int kCodes = 94;
-
-// A VCD name holds no blanks or colons.
-Dstring ScopeName(const Dstring& scope) {
-  Dstring name;
-  for (char c : scope) {
-    if (c == ':') {
-      if (!name.empty()) name += '_';
-    } else if (c > ' ' && c < 127) {
-      name += c;
-    }
-  }
-  return name.empty() ? Dstring("capture") : name;
-}
 
 void AddChange(Dstring& changes, bool high, const Dstring& id) {
   changes += high ? '1' : '0';
@@ -38,6 +22,18 @@ Dstring BusBits(const CaptureData& data, long low, long high, long vector) {
 }
 
 }  // namespace
+
+Dstring VcdWriter::ScopeName(const Dstring& scope, const char* fallback) {
+  Dstring name;
+  for (char c : scope) {
+    if (c == ':' || c == '/') {
+      if (!name.empty()) name += '_';
+    } else if (c > ' ' && c < 127) {
+      name += c;
+    }
+  }
+  return name.empty() ? Dstring(fallback) : name;
+}
 
 Dstring VcdWriter::Identifier(std::size_t index) {
   Dstring id;
@@ -60,7 +56,7 @@ void VcdWriter::Write(const CaptureData& data, const Dstring& scope, const Range
   const Dstring busId = Identifier(static_cast<std::size_t>(width) + 1);
 
   out << "$version qengui capture $end\n$timescale 1 " << (wholePs ? "ps" : "fs") << " $end\n";
-  out << "$scope module " << ScopeName(scope) << " $end\n";
+  out << "$scope module " << ScopeName(scope, "capture") << " $end\n";
   for (long t = 0; t < width; ++t) out << "$var wire 1 " << Identifier(static_cast<std::size_t>(t)) << " d" << t << " $end\n";
   out << "$var wire 1 " << errorId << " error $end\n";
   if (bus) {
@@ -89,13 +85,5 @@ void VcdWriter::Write(const CaptureData& data, const Dstring& scope, const Range
 
 int VcdWriter::WriteFile(const CaptureData& data, const Dstring& scope, const Range& range, const Dstring& path,
                          ConditionList& list) {
-  errno = 0;
-  std::ofstream file(path, std::ios::binary | std::ios::trunc);
-  if (file) Write(data, scope, range, file);
-  if (file) file.flush();
-  if (file) return 0;
-  const int error = errno;
-  ConditionListLoader::ConditionToken(list, "GUI_EXPORT_FAILED",
-                                      {path, Dstring(error != 0 ? std::strerror(error) : "write error")}, 1);
-  return 1;
+  return ExportFile::Write(path, [&](std::ostream& out) { Write(data, scope, range, out); return 0; }, list);
 }

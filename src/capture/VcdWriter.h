@@ -26,4 +26,6 @@ class VcdWriter {
                        ConditionList& list);
   // The identifier of signal `index`: printable characters from "!".
   static Dstring Identifier(std::size_t index);
+  // A module name of `scope` without blanks, colons or slashes; `fallback` when nothing is left.
+  static Dstring ScopeName(const Dstring& scope, const char* fallback);
 };

@@ -1,11 +1,5 @@
 #include "data/BerHistory.h"
 
-#include <cerrno>
-#include <cstring>
-#include <fstream>
-
-#include "support/ConditionListLoader.h"
-
 void BerHistory::Add(double seconds, const std::vector<BerSvr::PortResult>& results) {
   std::vector<Dstring> ports;
   ports.reserve(results.size());
@@ -44,17 +38,4 @@ Dstring BerHistory::HistoryCsv() const {
     out += '\n';
   }
   return out;
-}
-
-int BerHistory::WriteFile(const Dstring& path, const Dstring& text, ConditionList& list) {
-  std::ofstream file(path, std::ios::binary | std::ios::trunc);
-  if (file) file.write(text.data(), static_cast<std::streamsize>(text.size()));
-  if (file) file.flush();
-  if (!file) {
-    const int error = errno;
-    ConditionListLoader::ConditionToken(list, "GUI_EXPORT_FAILED",
-                                        {path, Dstring(error != 0 ? std::strerror(error) : "write error")}, 1);
-    return 1;
-  }
-  return 0;
 }

@@ -31,8 +31,6 @@ class BerHistory {
   static Dstring TableCsv(const std::vector<BerSvr::PortResult>& results);
   // "seconds,<port>,...", a line per sample.
   Dstring HistoryCsv() const;
-  // Writes the text to the file, replacing it; GUI_EXPORT_FAILED naming the path otherwise.
-  static int WriteFile(const Dstring& path, const Dstring& text, ConditionList& list);
 
  private:
   std::vector<Dstring> mPorts;

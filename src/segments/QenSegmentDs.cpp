@@ -18,18 +18,19 @@ constexpr std::string_view kZeroStates = "0nNkKlL";
 constexpr std::string_view kOneStates = "1pPrRhH";
 constexpr std::string_view kErroredStates = "kKrR";
 
-// A state as one bit of a digit: 0, 1, or -1 when it is neither.
-int BitOf(char state) {
-  if (kZeroStates.find(state) != std::string_view::npos) return 0;
-  if (kOneStates.find(state) != std::string_view::npos) return 1;
-  return -1;
-}
-
 Dstring Number(long n) {
   return Dstring::Format("%ld", n);
 }
 
 }  // namespace
+
+int QenSegmentDs::BitOf(char state) {
+  if (kZeroStates.find(state) != std::string_view::npos) return 0;
+  if (kOneStates.find(state) != std::string_view::npos) return 1;
+  return -1;
+}
+
+bool QenSegmentDs::IsErrored(char state) { return kErroredStates.find(state) != std::string_view::npos; }
 
 QenSegmentDs::QenSegmentDs(const Dstring& name) : mName(name) {
   mBuffers.reserve(64);
@@ -386,7 +387,7 @@ int QenSegmentDs::DigitOf(const SegmentBuffer* buffer, long vector, long trace, 
     if (int status = buffer->GetState(vector, t, state, list)) return status;
     const int bit = BitOf(state);
     unknown = unknown || bit < 0;
-    errored = errored || kErroredStates.find(state) != std::string_view::npos;
+    errored = errored || IsErrored(state);
     value = (value << 1) | (bit > 0 ? 1u : 0u);
   }
   digit = !unknown ? info.digits[value] : (errored ? '!' : '?');

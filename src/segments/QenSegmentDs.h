@@ -105,6 +105,10 @@ class QenSegmentDs : public QenDs {
   int DigitOf(const SegmentBuffer* buffer, long vector, long trace, DataFormat format, char& digit,
               ConditionList& list) const;
   int MaxDigit(DataFormat format, long& max, ConditionList& list);
+  // A state as one bit of a digit: 0, 1, or -1 when it is neither.
+  static int BitOf(char state);
+  // A compare state that counts as an error ('k', 'r', either case).
+  static bool IsErrored(char state);
   // The last digit index of `format` over `width` traces.
   static long MaxDigitOf(DataFormat format, long width);
 

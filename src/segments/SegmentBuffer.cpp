@@ -67,8 +67,7 @@ int SegmentBuffer::ReadDimension(ConditionList& list) {
   mWidth = width;
   // The window stays inside the segment and within one block, so that it can always be
   // written back.
-  const long fitting =
-      mWidth > 0 && mStateWidth > 0 ? kMaxBlockBytes / mWidth * 8 / mStateWidth : mBufferLength;
+  const long fitting = mWidth > 0 && mStateWidth > 0 ? VectorsPerBlock(mWidth, mStateWidth) : mBufferLength;
   mBufferLength = std::min({mBufferLength, length, fitting});
   mBufferStart = std::clamp(mBufferStart, 0L, length - mBufferLength);
   mRows.assign(static_cast<std::size_t>(BlockBytes()), 0);

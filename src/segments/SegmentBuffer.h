@@ -22,6 +22,10 @@ class SegmentBuffer {
 
   // Bits per state for an alphabet of n characters: the smallest count that holds n states.
   static long StateWidthOf(const Dstring& alphabet);
+  // The most vectors of `width` traces one block carries.
+  static long VectorsPerBlock(long width, long stateWidth) {
+    return width > 0 && stateWidth > 0 ? kMaxBlockBytes / width * 8 / stateWidth : 0;
+  }
   // Bytes of one row of `length` states.
   static long RowBytes(long length, long stateWidth) { return (length * stateWidth + 7) / 8; }
 

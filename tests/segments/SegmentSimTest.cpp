@@ -5,8 +5,11 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <fstream>
+#include <map>
 #include <memory>
 #include <random>
+#include <sstream>
 #include <string>
 
 #include "common/SimProcess.h"
@@ -16,6 +19,8 @@
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/SegmentBuffer.h"
+#include "segments/SegmentTextFile.h"
+#include "segments/SegmentVcdWriter.h"
 #include "support/QenEnvironment.h"
 
 namespace {
@@ -395,3 +400,105 @@ TEST_F(SegmentSimTest, CodingsInEveryReplyFormAreTaken) {
 }
 
 }  // namespace
+
+// Text out and back in, for a two-state coding in every format and for a coding of more states;
+// 13 traces leave the top hex digit one trace and the top octal digit one trace.
+TEST_F(SegmentSimTest, TextExportsAndImportsBackBitIdentical) {
+  const std::pair<const char*, DataFormat> cases[] = {
+      {"01", DataFormat::kHex}, {"01", DataFormat::kOct}, {"LH", DataFormat::kBin}, {"LHXZ01", DataFormat::kHex}};
+  const Dstring path = mDir + "/out.txt";
+  for (const auto& [coding, format] : cases) {
+    SCOPED_TRACE(coding);
+    QenSegmentDs* from = Make("Text/From", coding, 300, 13);
+    const std::string written = Scribble(from, Window(from, 0, 300), coding, 5);
+    ASSERT_EQ(from->Write(mList), 0) << mList.ToText();
+    ASSERT_EQ(SegmentTextFile::Export(*from, format, path, mList), 0) << mList.ToText();
+    QenSegmentDs* to = Make("Text/To", coding, 7, 13);
+    ASSERT_EQ(SegmentTextFile::Import(*to, format, path, mList), 0) << mList.ToText();
+    long length = 0;
+    ASSERT_EQ(to->GetLength(length, mList, true), 0);
+    EXPECT_EQ(length, 300);
+    EXPECT_EQ(States(to, Window(to, 0, 300)), written);
+    for (QenSegmentDs* ds : {from, to}) {
+      ds->Close(mList);
+      QenSegmentPool::FreeDs(ds);
+    }
+  }
+}
+
+TEST_F(SegmentSimTest, AnImportThatDoesNotFitChangesNothing) {
+  QenSegmentDs* ds = Make("Text/Kept", "01", 20, 6);
+  const std::string before = Scribble(ds, Window(ds, 0, 20), "01", 9);
+  ASSERT_EQ(ds->Write(mList), 0);
+  const Dstring path = mDir + "/bad.txt";
+  // Six traces are two hex digits, the upper one holding two traces (0-3).
+  const std::pair<const char*, const char*> files[] = {
+      {"# fine\n3f\n1 0\n2a1\n", "Line 4 of"},   // three digits
+      {"3f\n4f\n", "Line 2 of"},                   // 4 needs a third trace
+      {"3f\n0g\n", "\"g\" at column 2"},
+      {"# nothing\n\n", "holds no vectors"},
+  };
+  for (const auto& [text, expected] : files) {
+    std::ofstream(path, std::ios::trunc) << text;
+    ConditionList list;
+    EXPECT_NE(SegmentTextFile::Import(*ds, DataFormat::kHex, path, list), 0) << text;
+    EXPECT_NE(list.ToText().find(expected), std::string::npos) << list.ToText();
+  }
+  ConditionList list;
+  EXPECT_NE(SegmentTextFile::Import(*ds, DataFormat::kHex, mDir + "/missing.txt", list), 0);
+  EXPECT_NE(list.ToText().find("could not be read"), std::string::npos) << list.ToText();
+  long length = 0;
+  ASSERT_EQ(ds->GetLength(length, mList, true), 0);
+  EXPECT_EQ(length, 20);
+  EXPECT_EQ(States(ds, Window(ds, 0, 20)), before);
+  ds->Close(mList);
+  QenSegmentPool::FreeDs(ds);
+}
+
+// The dump read back as a viewer reads it gives every state of the segment at its vector.
+TEST_F(SegmentSimTest, TheValueChangeDumpHoldsEveryState) {
+  QenSegmentDs* ds = Make("Vcd/Seg", "npkrX", 90, 5);
+  const std::string states = Scribble(ds, Window(ds, 0, 90), "npkrX", 3);
+  ASSERT_EQ(ds->Write(mList), 0);
+  std::ostringstream out;
+  ASSERT_EQ(SegmentVcdWriter::Write(*ds, out, mList), 0) << mList.ToText();
+  std::istringstream in(out.str());
+  std::map<std::string, long> ids;  // identifier -> trace, 5 for the error wire
+  std::string word, line;
+  while (in >> word && word != "$enddefinitions") {
+    if (word != "$var") continue;
+    std::string kind, size, id, name;
+    in >> kind >> size >> id >> name;
+    ids[id] = name == "error" ? 5 : std::stol(name.substr(1));
+  }
+  ASSERT_EQ(ids.size(), 6u);
+  std::string now(6, '?');
+  long time = -1;
+  auto check = [&](long upTo) {
+    for (long v = time; v >= 0 && v < upTo; ++v) {
+      bool error = false;
+      for (long t = 0; t < 5; ++t) {
+        const char s = states[static_cast<std::size_t>(t * 90 + v)];
+        error = error || s == 'k' || s == 'r';
+        const char want = s == 'n' || s == 'k' ? '0' : s == 'p' || s == 'r' ? '1' : 'x';
+        ASSERT_EQ(now[static_cast<std::size_t>(t)], want) << "vector " << v << " trace " << t;
+      }
+      ASSERT_EQ(now[5], error ? '1' : '0') << "vector " << v;
+    }
+  };
+  std::getline(in, line);  // the rest of the definitions line
+  while (std::getline(in, line)) {
+    if (line.empty() || line[0] == '$') continue;
+    if (line[0] == '#') {
+      const long next = std::stol(line.substr(1));
+      check(next);
+      time = next;
+      continue;
+    }
+    ASSERT_TRUE(ids.count(line.substr(1))) << line;
+    now[static_cast<std::size_t>(ids[line.substr(1)])] = line[0];
+  }
+  EXPECT_EQ(time, 90);
+  ds->Close(mList);
+  QenSegmentPool::FreeDs(ds);
+}

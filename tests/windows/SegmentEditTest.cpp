@@ -5,6 +5,7 @@
 #include <QLineEdit>
 #include <QListWidget>
 #include <QTest>
+#include <fstream>
 #include <map>
 #include <memory>
 
@@ -167,4 +168,27 @@ TEST_F(SegmentEditTest, TheGridHoldsAFewScreensWhateverTheLength) {
   EXPECT_EQ(Other(":EDIT:SEGM:EXIS? \"Edit/Long\""), "TRUE");
   ASSERT_EQ(grid->Release(mList), 0);
   QenSegmentPool::Delete("Edit/Long", mList);
+}
+
+// The editor's text goes out and comes back bit-identical over other contents; a file of the
+// wrong width is refused with the line it failed on and the grid keeps what it had.
+TEST_F(SegmentEditTest, TextExportImportsBackAndAWrongWidthIsRefused) {
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("12ab34cd"));
+  const Dstring text = sDataDir + "/edit.txt";
+  ASSERT_EQ(grid->ExportText(text, mList), 0) << mList.ToText();
+  Trigger("SelectAll");
+  Trigger("Fill1");
+  EXPECT_EQ(Row(grid, 1), QStringLiteral("ffff"));
+  ASSERT_EQ(grid->ImportText(text, mList), 0) << mList.ToText();
+  ExpectRows(grid, {{0, "12ab"}, {1, "34cd"}});
+
+  const Dstring wide = sDataDir + "/wide.txt";
+  std::ofstream(wide) << "1234\n12345\n";
+  ConditionList list;
+  EXPECT_NE(grid->ImportText(wide, list), 0);
+  EXPECT_NE(list.ToText().find("Line 2 of"), std::string::npos) << list.ToText();
+  ExpectRows(grid, {{0, "12ab"}, {1, "34cd"}});
+  EXPECT_NE(grid->ExportVcd(sDataDir + "/no/such/dir/edit.vcd", list), 0);
+  EXPECT_NE(list.ToText().find("could not be written"), std::string::npos) << list.ToText();
 }

@@ -9,6 +9,8 @@
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/SegmentBuffer.h"
+#include "segments/SegmentTextFile.h"
+#include "segments/SegmentVcdWriter.h"
 #include "segments/ui/GridDisp.h"
 #include "support/FWBlocker.h"
 #include "toolkit/qt/WidgetClassTable.h"
@@ -116,7 +118,7 @@ int SegmentGridManager::CoverShown(ConditionList& list) {
   long bits = 1;
   if (int status = mDs->GetStateWidth(bits, list)) return status;
   // One block carries it all: a very wide segment holds fewer lines.
-  const long fits = std::max(1L, SegmentBuffer::kMaxBlockBytes / SegmentBuffer::RowBytes(1, 1) / mWidth * 8 / std::max(1L, bits));
+  const long fits = std::max(1L, SegmentBuffer::VectorsPerBlock(mWidth, std::max(1L, bits)));
   const long length = std::min({kScreensHeld * page, fits, mLength});
   const long from = std::clamp(mFirst - page, 0L, mLength - length);
   return mDs->SetBufferStartAndLength(mBuffer, from, length, list);
@@ -213,6 +215,30 @@ int SegmentGridManager::SaveSegmentAs(long row, long column, const Dstring& name
 }
 
 bool SegmentGridManager::IsDirty() { return mDs != nullptr && (mDs->IsDirty() || mDs->IsBufferDirty(mBuffer)); }
+
+int SegmentGridManager::ExportText(const Dstring& path, ConditionList& list) {
+  if (!IsEditable()) return 0;
+  if (int status = mDs->Write(list)) return status;
+  return SegmentTextFile::Export(*mDs, mFormat, path, list);
+}
+
+int SegmentGridManager::ExportVcd(const Dstring& path, ConditionList& list) {
+  if (!IsEditable()) return 0;
+  if (int status = mDs->Write(list)) return status;
+  return SegmentVcdWriter::WriteFile(*mDs, path, list);
+}
+
+int SegmentGridManager::ImportText(const Dstring& path, ConditionList& list) {
+  if (mDs == nullptr) return 0;
+  if (int status = mDs->Write(list)) return status;
+  int status = SegmentTextFile::Import(*mDs, mFormat, path, list);
+  // The grid's own window was not part of the import: it reads what the server now holds.
+  if (int read = ReadDimensions(list); status == 0) status = read;
+  if (int read = mDs->Read(mBuffer, list); status == 0) status = read;
+  Refresh();
+  emit StateChanged();
+  return status;
+}
 
 int SegmentGridManager::SetVectorOffset(long, long first, ConditionList& list) {
   mFirst = std::clamp(first, 0L, std::max(0L, mLength - 1));

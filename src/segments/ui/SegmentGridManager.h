@@ -51,6 +51,12 @@ class SegmentGridManager : public GridManager {
   // Text of the buffer's digits under the cursor for the status line.
   QString CursorText() const;
 
+  // The segment as text in the grid's data format, or as a Value Change Dump; what was typed
+  // goes to the server first. An import that does not fit is refused whole.
+  int ExportText(const Dstring& path, ConditionList& list);
+  int ImportText(const Dstring& path, ConditionList& list);
+  int ExportVcd(const Dstring& path, ConditionList& list);
+
   // The segment grid's own operations after the base's.
   virtual int ValidateSbDigit(ConditionList& list);
   virtual int ValidateSbAddr(ConditionList& list);

@@ -17,6 +17,7 @@
 #include "data/QenDsView.h"
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
+#include "support/ExportFile.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
@@ -166,11 +167,11 @@ void BerBerWin::ShowChart() {
 }
 
 int BerBerWin::ExportTable(const Dstring& path, ConditionList& list) const {
-  return BerHistory::WriteFile(path, BerHistory::TableCsv(mShown), list);
+  return ExportFile::WriteText(path, BerHistory::TableCsv(mShown), list);
 }
 
 int BerBerWin::ExportHistory(const Dstring& path, ConditionList& list) const {
-  return BerHistory::WriteFile(path, mHistory.HistoryCsv(), list);
+  return ExportFile::WriteText(path, mHistory.HistoryCsv(), list);
 }
 
 void BerBerWin::HitPButReset() {

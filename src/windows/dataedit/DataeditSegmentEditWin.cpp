@@ -4,6 +4,7 @@
 #include <QComboBox>
 #include <QDialog>
 #include <QDialogButtonBox>
+#include <QFileDialog>
 #include <QFormLayout>
 #include <QInputDialog>
 #include <QLabel>
@@ -93,6 +94,9 @@ void DataeditSegmentEditWin::BuildMenus() {
       {"&Segment", "Save", "&Save", QKeySequence(Qt::CTRL | Qt::ALT | Qt::Key_S),
        [](G& g, ConditionList& l) { return g.SaveSegment(0, 0, l); }, [](G& g) { return g.IsDirty(); }},
       {"&Segment", "SaveAs", "Save &As…", QKeySequence(), nullptr, [](G& g) { return g.GetSegmentDs() != nullptr; }},
+      {"&Segment", "ImportText", "&Import Text…", QKeySequence(), nullptr, [](G& g) { return g.GetSegmentDs() != nullptr; }},
+      {"&Segment", "ExportText", "&Export Text…", QKeySequence(), nullptr, editable},
+      {"&Segment", "ExportVcd", "Export &VCD…", QKeySequence(), nullptr, editable},
       {"&Edit", "Fill0", "Fill with &0", QKeySequence(Qt::CTRL | Qt::Key_0),
        [](G& g, ConditionList& l) { g.SetFillState(0); return g.ModifyFill(l); }, editable},
       {"&Edit", "Fill1", "Fill with &1", QKeySequence(Qt::CTRL | Qt::Key_1),
@@ -152,6 +156,9 @@ void DataeditSegmentEditWin::BuildMenus() {
     }
   }
   connect(Action(QStringLiteral("SaveAs")), &QAction::triggered, this, &DataeditSegmentEditWin::HitSaveAs);
+  connect(Action(QStringLiteral("ImportText")), &QAction::triggered, this, [this] { HitFile(File::kImportText); });
+  connect(Action(QStringLiteral("ExportText")), &QAction::triggered, this, [this] { HitFile(File::kExportText); });
+  connect(Action(QStringLiteral("ExportVcd")), &QAction::triggered, this, [this] { HitFile(File::kExportVcd); });
   connect(Action(QStringLiteral("InsertVectors")), &QAction::triggered, this, &DataeditSegmentEditWin::HitInsertVectors);
   connect(Action(QStringLiteral("Goto")), &QAction::triggered, mGoto, qOverload<>(&QWidget::setFocus));
   // Whether the server's clipboard fits is asked only when the menu opens.
@@ -291,6 +298,27 @@ void DataeditSegmentEditWin::HitSaveAs() {
     const int status = mGrid->SaveSegmentAs(0, 0, name.trimmed().toStdString(), l);
     ReadCatalog(l);
     return status;
+  });
+}
+
+void DataeditSegmentEditWin::HitFile(File what) {
+  const QString text = QStringLiteral("Text (*.txt);;All files (*)");
+  const QString vcd = QStringLiteral("Value Change Dump (*.vcd);;All files (*)");
+  QString path;
+  switch (what) {
+    case File::kImportText: path = QFileDialog::getOpenFileName(this, QStringLiteral("Import Segment Text"), {}, text); break;
+    case File::kExportText: path = QFileDialog::getSaveFileName(this, QStringLiteral("Export Segment Text"), {}, text); break;
+    case File::kExportVcd: path = QFileDialog::getSaveFileName(this, QStringLiteral("Export Segment as VCD"), {}, vcd); break;
+  }
+  if (path.isEmpty()) return;
+  const Dstring file = path.toStdString();
+  Run([this, what, &file](ConditionList& l) {
+    switch (what) {
+      case File::kImportText: return mGrid->ImportText(file, l);
+      case File::kExportText: return mGrid->ExportText(file, l);
+      case File::kExportVcd: return mGrid->ExportVcd(file, l);
+    }
+    return 0;
   });
 }
 

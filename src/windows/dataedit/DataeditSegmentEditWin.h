@@ -41,6 +41,7 @@ class DataeditSegmentEditWin : public QWidget {
 
  private:
   struct Command;
+  enum class File { kImportText, kExportText, kExportVcd };
 
   void BuildMenus();
   // Enables every command as the grid says, and puts the name and dirty mark in the title.
@@ -51,6 +52,7 @@ class DataeditSegmentEditWin : public QWidget {
   void HitPButDelete();
   void HitSegmentChosen();
   void HitSaveAs();
+  void HitFile(File what);
   void HitInsertVectors();
   void HitGoto();
 
