@@ -1,6 +1,7 @@
 // Segment buffers through qensim: moving a full buffer against a raw transfer of the same
 // bytes, state access against a plain byte loop over the same memory, and paging through a
-// 16M x 64 segment.
+// 16M x 64 segment, by buffer and through the segment grid, whose page is also painted against
+// plain text cells.
 #include <benchmark/benchmark.h>
 
 #include <unistd.h>
@@ -10,12 +11,22 @@
 #include <memory>
 #include <string>
 
+#include <QImage>
+#include <QKeyEvent>
+#include <QPainter>
+#include <random>
+
+#include "BenchApp.h"
+#include "ManyParamsRig.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
 #include "instrument/QenTcpInstrument.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/SegmentBuffer.h"
+#include "segments/ui/AddrDisp.h"
+#include "segments/ui/DigitDisp.h"
+#include "segments/ui/SegmentGridManager.h"
 #include "support/QenEnvironment.h"
 
 namespace {
@@ -42,6 +53,13 @@ class Server {
 
   bool IsUp() const { return mUp; }
   QenTcpInstrument& Raw() { return mRaw; }
+  CountingInstrument& Counter() { return *mCounter; }
+
+  // The 16M x 64 segment, made once.
+  bool MakeBig() {
+    if (!mBigMade) mBigMade = Make("Bench/Big", kBigLength, kBigWidth);
+    return mBigMade;
+  }
 
   // Makes a segment of memory data, saved, and closed again.
   bool Make(const Dstring& name, long length, long width) {
@@ -78,7 +96,8 @@ class Server {
     QenEnvironment::SetLogDirectory(Dstring(dir));
     std::filesystem::create_directories(dir);
     mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--test-control", "--data-dir", dir});
-    auto client = std::make_unique<QenTcpInstrument>();
+    auto client = std::make_unique<CountingInstrument>(std::make_unique<QenTcpInstrument>());
+    mCounter = client.get();
     Dstring handle;
     mUp = mSim.Port() != 0 && client->Connect("127.0.0.1", mSim.Port()) == 0 &&
           client->Call(":QEN:INST:HAND:CRE? _B,\"PSX\",\"BENCH\"", handle) == 0 &&
@@ -96,8 +115,10 @@ class Server {
 
   QenSimProcess mSim;
   QenTcpInstrument mRaw;
+  CountingInstrument* mCounter = nullptr;
   std::filesystem::path mDir;
   bool mUp = false;
+  bool mBigMade = false;
 };
 
 // Each move writes the 99,999 edited bytes back and reads the next 99,999; the raw exchange
@@ -184,7 +205,7 @@ void BM_Page16Mx64(benchmark::State& state) {
   if (!server.IsUp()) return state.SkipWithError("qensim did not come up");
   SegmentBuffer* buffer = nullptr;
   auto t0 = Clock::now();
-  const bool made = server.Make("Bench/Big", kBigLength, kBigWidth);
+  const bool made = server.MakeBig();
   const double makeSeconds = Seconds(t0);
   t0 = Clock::now();
   QenSegmentDs* ds = made ? server.Open("Bench/Big", kPageVectors, buffer) : nullptr;
@@ -209,8 +230,122 @@ void BM_Page16Mx64(benchmark::State& state) {
   ds->Release();
 }
 
+// The segment grid of the editor at 1920 x 1080 on the 16M x 64 segment, in `format`.
+class GridRig {
+ public:
+  explicit GridRig(DataFormat format) {
+    BenchApp();
+    mGrid.SetDX(14);
+    mGrid.SetDY(20);
+    mGrid.SetOffY(22);
+    (new AddrDisp(&mGrid))->SetCells(9);
+    new DigitDisp(&mGrid);
+    mGrid.resize(1920, 1080);
+    ConditionList list;
+    mUp = Server::Get().MakeBig() && mGrid.HookOn(0, 0, "Bench/Big", list) == 0 &&
+          mGrid.SetDataFormat(0, format, list) == 0;
+  }
+  ~GridRig() {
+    ConditionList list;
+    mGrid.Release(list);
+  }
+  bool IsUp() const { return mUp; }
+  SegmentGridManager& Grid() { return mGrid; }
+
+ private:
+  SegmentGridManager mGrid;
+  bool mUp = false;
+};
+
+// Runs `step` on the grid and then sends the very commands it sent again, straight through the
+// connection: the same bytes both ways, without the grid and its buffer.
+template <typename Step>
+void GridAgainstRaw(benchmark::State& state, GridRig& rig, Step step) {
+  CountingInstrument& counter = Server::Get().Counter();
+  double gridSeconds = 0, rawSeconds = 0;
+  long calls = 0;
+  long steps = 0;
+  for (auto _ : state) {
+    counter.mRecorded.clear();
+    counter.mRecording = true;
+    const long before = counter.mCalls;
+    auto t0 = Clock::now();
+    step();
+    gridSeconds += Seconds(t0);
+    counter.mRecording = false;
+    calls += counter.mCalls - before;
+    ++steps;
+    t0 = Clock::now();
+    for (const Dstring& cmd : counter.mRecorded) {
+      Dstring reply;
+      if (counter.Call(cmd, reply) != 0) return state.SkipWithError("raw call failed");
+    }
+    rawSeconds += Seconds(t0);
+  }
+  state.counters["round_trips"] = static_cast<double>(calls) / static_cast<double>(steps);
+  state.counters["held_vectors"] = static_cast<double>(rig.Grid().HeldVectors());
+  state.counters["grid_us"] = 1e6 * gridSeconds / static_cast<double>(steps);
+  state.counters["raw_us"] = 1e6 * rawSeconds / static_cast<double>(steps);
+  state.counters["ratio"] = gridSeconds / rawSeconds;
+}
+
+// A jump to a vector anywhere in the segment, as the go-to field does.
+void BM_GridJump16Mx64(benchmark::State& state) {
+  GridRig rig(DataFormat::kHex);
+  if (!rig.IsUp()) return state.SkipWithError("the grid did not open the segment");
+  std::mt19937 random(7);
+  ConditionList list;
+  GridAgainstRaw(state, rig, [&] { rig.Grid().GoToVectorTrace(static_cast<long>(random() % kBigLength), 0, list); });
+}
+
+// Page Down through the grid: the buffer moves when the page shown leaves the screens it holds.
+void BM_GridPageDown16Mx64(benchmark::State& state) {
+  GridRig rig(DataFormat::kHex);
+  if (!rig.IsUp()) return state.SkipWithError("the grid did not open the segment");
+  QKeyEvent press(QEvent::KeyPress, Qt::Key_PageDown, Qt::NoModifier);
+  GridAgainstRaw(state, rig, [&] { QCoreApplication::sendEvent(&rig.Grid(), &press); });
+}
+
+// A full page of binary digits painted offscreen, against QPainter::drawText of as many
+// one-character cells of the same size on the same image.
+void BM_GridPaintVsDrawText(benchmark::State& state) {
+  GridRig rig(DataFormat::kBin);
+  if (!rig.IsUp()) return state.SkipWithError("the grid did not open the segment");
+  SegmentGridManager& grid = rig.Grid();
+  const long lines = grid.GetNumDispVectors(0);
+  const long digits = grid.GetNumDispDigits(0);
+  const long cells = lines * (digits + 1);
+  QImage image(1920, 1080, QImage::Format_ARGB32_Premultiplied);
+  const QString one = QStringLiteral("1");
+  double gridSeconds = 0, textSeconds = 0;
+  for (auto _ : state) {
+    auto t0 = Clock::now();
+    grid.render(&image);
+    gridSeconds += Seconds(t0);
+    t0 = Clock::now();
+    {
+      QPainter painter(&image);
+      painter.fillRect(image.rect(), Qt::white);
+      for (long line = 0; line < lines; ++line) {
+        for (long cell = 0; cell <= digits; ++cell) {
+          painter.drawText(QRect(static_cast<int>(cell * 14), static_cast<int>(22 + line * 20), 14, 20), Qt::AlignCenter, one);
+        }
+      }
+    }
+    textSeconds += Seconds(t0);
+  }
+  const double n = static_cast<double>(state.iterations());
+  state.counters["cells"] = static_cast<double>(cells);
+  state.counters["grid_ms"] = 1e3 * gridSeconds / n;
+  state.counters["drawtext_ms"] = 1e3 * textSeconds / n;
+  state.counters["ratio"] = gridSeconds / textSeconds;
+}
+
 }  // namespace
 
+BENCHMARK(BM_GridJump16Mx64)->MinTime(2.0)->UseRealTime();
+BENCHMARK(BM_GridPageDown16Mx64)->MinTime(2.0)->UseRealTime();
+BENCHMARK(BM_GridPaintVsDrawText)->MinTime(2.0)->UseRealTime();
 BENCHMARK(BM_MoveFullBufferVsRaw)->MinTime(2.0)->UseRealTime();
 BENCHMARK(BM_StateAccessVsByteLoop)->MinTime(1.0)->UseRealTime();
 BENCHMARK(BM_Page16Mx64)->Iterations(3)->UseRealTime();

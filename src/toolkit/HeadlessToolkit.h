@@ -23,6 +23,7 @@ class HeadlessToolkit : public ToolkitPort {
   void CallDeferred(Proc proc, void* client) override;
   void Alert(const Dstring& text, Icon icon) override;
   int AskYesNo(const Dstring& text) override;
+  int AskYesNoCancel(const Dstring& text) override { return AskYesNo(text); }
   void SetWaitCursor(bool on) override { mWaitCursor = on; }
   bool IsShiftDown() override { return mShiftDown; }
   // Without a display there are no resources to read: the names are only recorded.

@@ -13,6 +13,7 @@ class ToolkitPort {
   enum class Icon { Information, Warning, Critical };
   static constexpr int kYes = 2;
   static constexpr int kNo = 1;
+  static constexpr int kCancel = 0;
 
   virtual ~ToolkitPort() = default;
 
@@ -30,6 +31,8 @@ class ToolkitPort {
   virtual void Alert(const Dstring& text, Icon icon) = 0;
   // kYes or kNo.
   virtual int AskYesNo(const Dstring& text) = 0;
+  // kYes, kNo or kCancel: a question whose answer may also be to go back.
+  virtual int AskYesNoCancel(const Dstring& text) = 0;
   virtual void SetWaitCursor(bool on) = 0;
   virtual bool IsShiftDown() = 0;
 

@@ -293,7 +293,10 @@ void MainWin::UpdateTitle() {
   setWindowTitle(QStringLiteral("%1 - Corvane 71300").arg(setting.empty() ? QStringLiteral("UNTITLED") : QString::fromStdString(setting)));
 }
 
+// Every window is asked first: one with unsaved work may keep the program open.
 void MainWin::closeEvent(QCloseEvent* event) {
+  mArea->closeAllSubWindows();
+  if (!mArea->subWindowList().isEmpty()) return event->ignore();
   uiapp::MainLoopExit();
   QMainWindow::closeEvent(event);
 }

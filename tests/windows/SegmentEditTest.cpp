@@ -192,3 +192,18 @@ TEST_F(SegmentEditTest, TextExportImportsBackAndAWrongWidthIsRefused) {
   EXPECT_NE(grid->ExportVcd(sDataDir + "/no/such/dir/edit.vcd", list), 0);
   EXPECT_NE(list.ToText().find("could not be written"), std::string::npos) << list.ToText();
 }
+
+// Closing with unsaved edits asks: going back keeps the window and the edits, saving saves them.
+TEST_F(SegmentEditTest, ClosingWithUnsavedEditsAsks) {
+  QTest::keyClicks(mWin->Grid(), QStringLiteral("9e"));
+  mToolkit.QueueAnswer(ToolkitPort::kCancel);
+  EXPECT_FALSE(mWin->close());
+  EXPECT_TRUE(mWin->Grid()->IsDirty());
+  mToolkit.QueueAnswer(ToolkitPort::kYes);
+  EXPECT_TRUE(mWin->close());
+  EXPECT_FALSE(mWin->Grid()->IsDirty());
+  mWin.reset();
+  mWin = OpenWindow();
+  ASSERT_EQ(mWin->OpenSegment(kName, mList), 0) << mList.ToText();
+  ExpectRows(mWin->Grid(), {{0, "9e00"}});
+}

@@ -1,6 +1,7 @@
 #include "segments/ui/SegmentGridManager.h"
 
 #include <QKeyEvent>
+#include <QPainter>
 #include <algorithm>
 #include <cstring>
 
@@ -408,8 +409,9 @@ void SegmentGridManager::DispScrollTo(long firstLine) {
 QString SegmentGridManager::DispHeader(const GridDisp& disp, int cell) const {
   if (disp.GetKind() != GridDisp::Kind::kDigit) return disp.GetKind() == GridDisp::Kind::kAddr ? QStringLiteral("Vector") : QString();
   const long digit = DigitAt(mDigitOffset + cell);
-  // Every other digit is labelled with its lowest trace, so two-figure numbers do not collide.
-  if (digit < 0 || (TracesPerDigit() == 1 && digit % 2 != 0)) return {};
+  // Once trace numbers take two figures, every other digit is labelled, so that they do not collide.
+  const bool wide = (mDigits - 1) * TracesPerDigit() >= 10;
+  if (digit < 0 || (wide && digit % 2 != 0)) return {};
   return QString::number(digit * TracesPerDigit());
 }
 
@@ -436,6 +438,15 @@ GridCell SegmentGridManager::DispCell(const GridDisp& disp, long line, int cell)
   out.text = QString(QChar::fromLatin1(ch));
   out.marked = ch == '!';
   return out;
+}
+
+void SegmentGridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const {
+  GridManager::DispPaint(disp, painter, area);
+  if (disp.GetKind() != GridDisp::Kind::kDigit || IsEditable()) return;
+  const QString hint = mDs == nullptr ? QStringLiteral("Choose a segment from the list, or make one with New…")
+                                      : QStringLiteral("The segment has no vectors: Edit > Insert Vectors… adds some.");
+  painter.setPen(disp.palette().color(QPalette::Disabled, QPalette::Text));
+  painter.drawText(disp.rect().adjusted(12, GetOffY() + 12, -12, -12), Qt::AlignLeft | Qt::AlignTop | Qt::TextWordWrap, hint);
 }
 
 void SegmentGridManager::DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers) {

@@ -114,6 +114,8 @@ class SegmentGridManager : public GridManager {
   GridCell DispCell(const GridDisp& disp, long line, int cell) const override;
   void DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers) override;
   void DispMove(const GridDisp& disp, long line, int cell) override;
+  // Without a segment, or with an empty one, the digit column says what to do.
+  void DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const override;
 
  signals:
   // A refusal the user should read where they type (a digit the format does not know).

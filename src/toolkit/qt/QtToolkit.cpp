@@ -66,6 +66,14 @@ int QtToolkit::AskYesNo(const Dstring& text) {
   return answer == QMessageBox::Yes ? kYes : kNo;
 }
 
+int QtToolkit::AskYesNoCancel(const Dstring& text) {
+  if (!mAnswers.empty() || mAlertSink) return AskYesNo(text);
+  const auto answer = QMessageBox::question(QApplication::activeWindow(), QApplication::applicationDisplayName(),
+                                            QString::fromStdString(text),
+                                            QMessageBox::Yes | QMessageBox::No | QMessageBox::Cancel, QMessageBox::Cancel);
+  return answer == QMessageBox::Yes ? kYes : answer == QMessageBox::No ? kNo : kCancel;
+}
+
 void QtToolkit::SetWaitCursor(bool on) {
   if (on) {
     ++mWaitDepth;

@@ -25,6 +25,7 @@ class QtToolkit : public QObject, public ToolkitPort {
   void CallDeferred(Proc proc, void* client) override;
   void Alert(const Dstring& text, Icon icon) override;
   int AskYesNo(const Dstring& text) override;
+  int AskYesNoCancel(const Dstring& text) override;
   void SetWaitCursor(bool on) override;
   bool IsShiftDown() override;
   int LoadResourceLibrary(const Dstring& name, ConditionList& list) override;

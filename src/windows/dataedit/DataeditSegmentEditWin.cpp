@@ -1,6 +1,7 @@
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 
 #include <QAction>
+#include <QCloseEvent>
 #include <QComboBox>
 #include <QDialog>
 #include <QDialogButtonBox>
@@ -22,6 +23,7 @@
 #include "segments/QenSegmentPool.h"
 #include "segments/ui/SegmentGridManager.h"
 #include "support/FWBlocker.h"
+#include "toolkit/Toolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
 
 // A menu entry: its text and key, what it does, and when it is offered.
@@ -59,12 +61,14 @@ int DataeditSegmentEditWin::Load(ConditionList& list) {
     list.Add(1, "The window resource \"dataedit.SegmentEditWin\" lacks its grid, segment list or tools.");
     return 1;
   }
+  layout()->setContentsMargins(8, 6, 8, 6);
   mMessage->setStyleSheet(QStringLiteral("color: #b3261e"));
   BuildMenus();
   connect(mGrid, &GridManager::StateChanged, this, &DataeditSegmentEditWin::ShowState);
   connect(mGrid, &SegmentGridManager::Message, mMessage, &QLabel::setText);
   connect(mSegments, &QListWidget::itemActivated, this, &DataeditSegmentEditWin::HitSegmentChosen);
-  connect(mSegments, &QListWidget::itemClicked, this, &DataeditSegmentEditWin::HitSegmentChosen);
+  // Arrow keys in the list open what they land on, as a click does.
+  connect(mSegments, &QListWidget::currentItemChanged, this, &DataeditSegmentEditWin::HitSegmentChosen);
   connect(findChild<QPushButton*>(QStringLiteral("PButNew")), &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButNew);
   connect(findChild<QPushButton*>(QStringLiteral("PButDelete")), &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButDelete);
   connect(mFormat, &QComboBox::currentIndexChanged, this, [this](int index) {
@@ -143,9 +147,13 @@ void DataeditSegmentEditWin::BuildMenus() {
     QAction* action = menu->addAction(QString::fromUtf8(c.text));
     action->setObjectName(QString::fromLatin1(c.name));
     action->setShortcut(c.key);
-    // The keys are the grid's: in the find field Ctrl+C copies its text, not the segment.
-    action->setShortcutContext(Qt::WidgetShortcut);
-    mGrid->addAction(action);
+    // Keys a text field has too are the grid's alone: in the find field Ctrl+C copies its text,
+    // not the segment. The others work anywhere in the window.
+    const bool textKey = c.key == QKeySequence(QKeySequence::Copy) || c.key == QKeySequence(QKeySequence::Paste) ||
+                         c.key == QKeySequence(QKeySequence::SelectAll) || c.key == QKeySequence(Qt::Key_Delete) ||
+                         c.key == QKeySequence(Qt::Key_Insert);
+    action->setShortcutContext(textKey ? Qt::WidgetShortcut : Qt::WidgetWithChildrenShortcut);
+    (textKey ? static_cast<QWidget*>(mGrid) : this)->addAction(action);
     if (c.run) {
       auto run = c.run;
       connect(action, &QAction::triggered, this, [this, run] { Run([this, run](ConditionList& l) { return run(*mGrid, l); }); });
@@ -234,6 +242,21 @@ int DataeditSegmentEditWin::DeleteSegment(const Dstring& name, ConditionList& li
   ReadCatalog(list);
   ShowState();
   return status;
+}
+
+void DataeditSegmentEditWin::closeEvent(QCloseEvent* event) {
+  Dstring name;
+  ConditionList list;
+  mGrid->GetSegmentName(0, 0, name, list);
+  if (!mGrid->IsDirty()) return QWidget::closeEvent(event);
+  const int answer = Toolkit::Get().AskYesNoCancel(
+      Dstring::Format("The segment \"%s\" has changes that are not saved. Save them before closing?", name.c_str()));
+  if (answer == ToolkitPort::kCancel) return event->ignore();
+  if (answer == ToolkitPort::kYes) {
+    Run([this](ConditionList& l) { return mGrid->SaveSegment(0, 0, l); });
+    if (mGrid->IsDirty()) return event->ignore();
+  }
+  QWidget::closeEvent(event);
 }
 
 void DataeditSegmentEditWin::HitSegmentChosen() {

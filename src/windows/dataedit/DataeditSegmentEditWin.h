@@ -39,6 +39,10 @@ class DataeditSegmentEditWin : public QWidget {
   int CreateSegment(const SegmentProperties& properties, ConditionList& list);
   int DeleteSegment(const Dstring& name, ConditionList& list);
 
+ protected:
+  // Edits not saved are saved, let go, or the window stays, as the user answers.
+  void closeEvent(QCloseEvent* event) override;
+
  private:
   struct Command;
   enum class File { kImportText, kExportText, kExportVcd };
