@@ -234,7 +234,6 @@ void BM_Page16Mx64(benchmark::State& state) {
 class GridRig {
  public:
   explicit GridRig(DataFormat format) {
-    BenchApp();
     mGrid.SetDX(14);
     mGrid.SetDY(20);
     mGrid.SetOffY(22);
@@ -253,6 +252,7 @@ class GridRig {
   SegmentGridManager& Grid() { return mGrid; }
 
  private:
+  QApplication& mApp = BenchApp();  // before any widget
   SegmentGridManager mGrid;
   bool mUp = false;
 };
