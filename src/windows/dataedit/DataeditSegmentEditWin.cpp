@@ -168,7 +168,10 @@ void DataeditSegmentEditWin::BuildMenus() {
   connect(Action(QStringLiteral("ExportText")), &QAction::triggered, this, [this] { HitFile(File::kExportText); });
   connect(Action(QStringLiteral("ExportVcd")), &QAction::triggered, this, [this] { HitFile(File::kExportVcd); });
   connect(Action(QStringLiteral("InsertVectors")), &QAction::triggered, this, &DataeditSegmentEditWin::HitInsertVectors);
-  connect(Action(QStringLiteral("Goto")), &QAction::triggered, mGoto, qOverload<>(&QWidget::setFocus));
+  connect(Action(QStringLiteral("Goto")), &QAction::triggered, this, [this] {
+    mGoto->setFocus();
+    mGoto->selectAll();
+  });
   // Whether the server's clipboard fits is asked only when the menu opens.
   for (QMenu* m : bar->findChildren<QMenu*>()) {
     connect(m, &QMenu::aboutToShow, this, [this] { Action(QStringLiteral("Paste"))->setEnabled(mGrid->IsPastePossible()); });
