@@ -207,3 +207,38 @@ TEST_F(SegmentEditTest, ClosingWithUnsavedEditsAsks) {
   ASSERT_EQ(mWin->OpenSegment(kName, mList), 0) << mList.ToText();
   ExpectRows(mWin->Grid(), {{0, "9e00"}});
 }
+
+// Traces in and out, serial and back, another coding: the grid follows the segment's new shape.
+TEST_F(SegmentEditTest, ReshapingCommandsKeepTheGridInStep) {
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("8001"));
+  long digits = 0;
+  ASSERT_EQ(grid->GoToVectorTrace(0, 4, mList), 0);
+  Trigger("DeleteTraces");
+  grid->GetNumDigits(0, digits);
+  EXPECT_EQ(digits, 3);
+  EXPECT_EQ(Row(grid, 0).left(3), QStringLiteral("801"));
+
+  Trigger("SerializeLsb");
+  long vectors = 0;
+  grid->GetNumVectors(0, vectors);
+  EXPECT_EQ(vectors, 64 * 12);
+  EXPECT_TRUE(mWin->Action(QStringLiteral("Deserialize"))->isEnabled());
+  EXPECT_FALSE(mWin->Action(QStringLiteral("SerializeLsb"))->isEnabled());
+  ConditionList refused;
+  EXPECT_NE(grid->ModifyDeserialize(12, 64 * 12, refused), 0);
+  ASSERT_EQ(grid->ModifyDeserialize(12, 0, mList), 0) << mList.ToText();
+  grid->GetNumVectors(0, vectors);
+  grid->GetNumDigits(0, digits);
+  EXPECT_EQ(vectors, 64);
+  EXPECT_EQ(digits, 3);
+  EXPECT_EQ(Row(grid, 0).left(3), QStringLiteral("801"));
+
+  grid->SetTargetCoding("01X");
+  ASSERT_EQ(grid->ModifyCoding(mList), 0) << mList.ToText();
+  Dstring coding;
+  ASSERT_EQ(grid->GetSegmentDs()->GetCoding(coding, mList, true), 0);
+  EXPECT_EQ(coding, "01X");
+  EXPECT_EQ(Row(grid, 0).left(3), QStringLiteral("801"));
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}

@@ -400,6 +400,41 @@ int SegmentGridManager::ModifyDelete(ConditionList& list) {
   return mDs->ModifyDelete(r.GetFirstVector(), VectorTrace::kVector, count, DeleteMode::kNormal, list);
 }
 
+int SegmentGridManager::DeleteTraces(ConditionList& list) {
+  if (!IsEditable()) return 0;
+  const StateRange r = SelectedRange();
+  if (r.GetLastTrace() - r.GetFirstTrace() + 1 >= mWidth) {
+    list.Add(1, "A segment keeps at least one trace: select fewer digits to delete.");
+    return 1;
+  }
+  mSelecting = false;
+  return mDs->ModifyDelete(r.GetFirstTrace(), VectorTrace::kTrace, r.GetLastTrace() - r.GetFirstTrace() + 1, DeleteMode::kNormal,
+                           list);
+}
+
+int SegmentGridManager::ModifySerialize(Direction direction, ConditionList& list) {
+  if (!IsSerializePossible()) return 0;
+  mSelecting = false;
+  return mDs->ModifySerialize(direction, list);
+}
+
+int SegmentGridManager::ModifyDeserialize(long width, long offset, ConditionList& list) {
+  if (!IsDeserializePossible()) return 0;
+  if (width < 1 || offset < 0 || offset >= mLength || width > mLength - offset) {
+    list.Add(1, Dstring::Format("%ld traces from state %ld do not fit in the %ld states of the serial trace.", width, offset, mLength));
+    return 1;
+  }
+  mSelecting = false;
+  return mDs->ModifyDeserialize(width, offset, list);
+}
+
+int SegmentGridManager::ModifyCoding(ConditionList& list) {
+  if (!IsCodingPossible() || mTargetCoding.empty()) return 0;
+  Dstring coding;
+  if (int status = mDs->GetCoding(coding, list)) return status;
+  return coding == mTargetCoding ? 0 : mDs->ConvertCoding(coding, mTargetCoding, list);
+}
+
 void SegmentGridManager::DispScrollTo(long firstLine) {
   mFirst = firstLine;
   ConditionList list;

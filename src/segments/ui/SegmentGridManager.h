@@ -44,6 +44,10 @@ class SegmentGridManager : public GridManager {
   StateRange SelectedRange() const;
   // What fill writes: a state number of the coding (0 the first state, 1 the second).
   void SetFillState(long state) { mFillState = state; }
+  // The coding ModifyCoding converts the segment to ("01X").
+  void SetTargetCoding(const Dstring& coding) { mTargetCoding = coding; }
+  // Deletes the traces of the selected digits (or of the cursor's digit); the traces above close up.
+  int DeleteTraces(ConditionList& list);
   // What find looks for: a number in the data format, 'x' digits matching anything.
   void SetFindText(const Dstring& text) { mFindText = text; }
   // What the user reads when an edit meets another client's lock.
@@ -97,6 +101,13 @@ class SegmentGridManager : public GridManager {
   int ModifyPaste(ConditionList& list) override;
   int ModifyInsert(VectorTrace what, InsertMode mode, long count, ConditionList& list) override;
   int ModifyDelete(ConditionList& list) override;
+  int ModifySerialize(Direction direction, ConditionList& list) override;
+  // Width and offset: the serial trace becomes `width` traces from its state `offset`.
+  int ModifyDeserialize(long width, long offset, ConditionList& list) override;
+  int ModifyCoding(ConditionList& list) override;
+  bool IsSerializePossible() override { return IsEditable() && mWidth > 1; }
+  bool IsDeserializePossible() override { return IsEditable() && mWidth == 1 && mLength > 1; }
+  bool IsCodingPossible() override { return IsEditable(); }
   bool IsFillPossible() override { return IsEditable(); }
   bool IsInvertPossible() override { return IsEditable(); }
   bool IsMirrorPossible() override { return IsEditable() && mSelecting; }
@@ -158,4 +169,5 @@ class SegmentGridManager : public GridManager {
   AddrFormat mAddrFormat = AddrFormat::kDecimal;
   long mFillState = 1;
   Dstring mFindText;
+  Dstring mTargetCoding;
 };

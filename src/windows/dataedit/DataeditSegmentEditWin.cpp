@@ -118,6 +118,15 @@ void DataeditSegmentEditWin::BuildMenus() {
        [](G& g) { return g.IsInsertPossible(); }},
       {"&Edit", "DeleteVectors", "&Delete Vectors", QKeySequence(Qt::Key_Delete), [](G& g, ConditionList& l) { return g.ModifyDelete(l); },
        [](G& g) { return g.IsDeletePossible(); }},
+      {"&Edit", "InsertTraces", "Insert T&races…", QKeySequence(), nullptr, [](G& g) { return g.IsEditable(); }},
+      {"&Edit", "DeleteTraces", "Delete Tr&aces", QKeySequence(), [](G& g, ConditionList& l) { return g.DeleteTraces(l); },
+       [](G& g) { return g.IsEditable(); }},
+      {"&Edit", "SerializeLsb", "Serialise, &Lowest Trace First", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.ModifySerialize(Direction::kLsbFirst, l); }, [](G& g) { return g.IsSerializePossible(); }},
+      {"&Edit", "SerializeMsb", "Serialise, &Highest Trace First", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.ModifySerialize(Direction::kMsbFirst, l); }, [](G& g) { return g.IsSerializePossible(); }},
+      {"&Edit", "Deserialize", "Deseriali&se…", QKeySequence(), nullptr, [](G& g) { return g.IsDeserializePossible(); }},
+      {"&Edit", "Coding", "C&onvert Coding…", QKeySequence(), nullptr, [](G& g) { return g.IsCodingPossible(); }},
       {"&Edit", "SelectAll", "Select &All", QKeySequence::SelectAll,
        [](G& g, ConditionList& l) {
          long vectors = 0, digits = 0;
@@ -167,7 +176,10 @@ void DataeditSegmentEditWin::BuildMenus() {
   connect(Action(QStringLiteral("ImportText")), &QAction::triggered, this, [this] { HitFile(File::kImportText); });
   connect(Action(QStringLiteral("ExportText")), &QAction::triggered, this, [this] { HitFile(File::kExportText); });
   connect(Action(QStringLiteral("ExportVcd")), &QAction::triggered, this, [this] { HitFile(File::kExportVcd); });
-  connect(Action(QStringLiteral("InsertVectors")), &QAction::triggered, this, &DataeditSegmentEditWin::HitInsertVectors);
+  connect(Action(QStringLiteral("InsertVectors")), &QAction::triggered, this, [this] { HitInsert(VectorTrace::kVector); });
+  connect(Action(QStringLiteral("InsertTraces")), &QAction::triggered, this, [this] { HitInsert(VectorTrace::kTrace); });
+  connect(Action(QStringLiteral("Deserialize")), &QAction::triggered, this, &DataeditSegmentEditWin::HitDeserialize);
+  connect(Action(QStringLiteral("Coding")), &QAction::triggered, this, &DataeditSegmentEditWin::HitCoding);
   connect(Action(QStringLiteral("Goto")), &QAction::triggered, this, [this] {
     mGoto->setFocus();
     mGoto->selectAll();
@@ -286,8 +298,7 @@ void DataeditSegmentEditWin::HitPButNew() {
   width->setRange(1, 4096);
   width->setValue(16);
   auto* coding = new QComboBox(&dialog);
-  coding->addItems({QStringLiteral("01"), QStringLiteral("LH"), QStringLiteral("01X"), QStringLiteral("LHX"),
-                    QStringLiteral("LHXZ01"), QStringLiteral("npkr"), QStringLiteral("npkrX")});
+  coding->addItems(Codings());
   form->addRow(QStringLiteral("&Name"), name);
   form->addRow(QStringLiteral("&Vectors"), length);
   form->addRow(QStringLiteral("&Traces"), width);
@@ -348,12 +359,46 @@ void DataeditSegmentEditWin::HitFile(File what) {
   });
 }
 
-void DataeditSegmentEditWin::HitInsertVectors() {
+void DataeditSegmentEditWin::HitInsert(VectorTrace what) {
+  const bool vectors = what == VectorTrace::kVector;
   bool ok = false;
-  const int count = QInputDialog::getInt(this, QStringLiteral("Insert Vectors"), QStringLiteral("&Vectors before the cursor"), 1, 1,
-                                         1 << 30, 1, &ok);
+  const int count = QInputDialog::getInt(this, vectors ? QStringLiteral("Insert Vectors") : QStringLiteral("Insert Traces"),
+                                         vectors ? QStringLiteral("&Vectors before the cursor") : QStringLiteral("&Traces below the cursor"),
+                                         1, 1, vectors ? 1 << 30 : 4096, 1, &ok);
   if (!ok) return;
-  Run([this, count](ConditionList& l) { return mGrid->ModifyInsert(VectorTrace::kVector, InsertMode::kBefore, count, l); });
+  Run([this, what, count](ConditionList& l) { return mGrid->ModifyInsert(what, InsertMode::kBefore, count, l); });
+}
+
+void DataeditSegmentEditWin::HitDeserialize() {
+  QDialog dialog(this);
+  dialog.setWindowTitle(QStringLiteral("Deserialise"));
+  auto* form = new QFormLayout(&dialog);
+  auto* width = new QSpinBox(&dialog);
+  width->setRange(1, 4096);
+  width->setValue(8);
+  auto* offset = new QSpinBox(&dialog);
+  offset->setRange(0, 1 << 30);
+  form->addRow(QStringLiteral("&Traces"), width);
+  form->addRow(QStringLiteral("&From state"), offset);
+  auto* buttons = new QDialogButtonBox(QDialogButtonBox::Ok | QDialogButtonBox::Cancel, &dialog);
+  form->addRow(buttons);
+  connect(buttons, &QDialogButtonBox::accepted, &dialog, &QDialog::accept);
+  connect(buttons, &QDialogButtonBox::rejected, &dialog, &QDialog::reject);
+  if (dialog.exec() != QDialog::Accepted) return;
+  Run([this, w = width->value(), o = offset->value()](ConditionList& l) { return mGrid->ModifyDeserialize(w, o, l); });
+}
+
+void DataeditSegmentEditWin::HitCoding() {
+  bool ok = false;
+  const QString coding = QInputDialog::getItem(this, QStringLiteral("Convert Coding"), QStringLiteral("&Coding"), Codings(), 0, false, &ok);
+  if (!ok) return;
+  mGrid->SetTargetCoding(coding.toStdString());
+  Run([this](ConditionList& l) { return mGrid->ModifyCoding(l); });
+}
+
+QStringList DataeditSegmentEditWin::Codings() {
+  return {QStringLiteral("01"), QStringLiteral("LH"), QStringLiteral("01X"), QStringLiteral("LHX"),
+          QStringLiteral("LHXZ01"), QStringLiteral("npkr"), QStringLiteral("npkrX")};
 }
 
 void DataeditSegmentEditWin::HitGoto() {

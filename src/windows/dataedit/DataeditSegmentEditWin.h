@@ -57,7 +57,11 @@ class DataeditSegmentEditWin : public QWidget {
   void HitSegmentChosen();
   void HitSaveAs();
   void HitFile(File what);
-  void HitInsertVectors();
+  void HitInsert(VectorTrace what);
+  void HitDeserialize();
+  void HitCoding();
+  // The codings a segment can have, as the server spells them.
+  static QStringList Codings();
   void HitGoto();
 
   SegmentGridManager* mGrid = nullptr;
