@@ -5,6 +5,7 @@
 #include <cerrno>
 #include <cstring>
 #include <fstream>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -36,6 +37,9 @@ int LayoutOf(QenSegmentDs& ds, DataFormat format, Layout& layout, ConditionList&
   return 0;
 }
 
+// The column of the text form that holds `trace`.
+long ColumnOf(const Layout& layout, long trace) { return layout.columns - 1 - trace / layout.k; }
+
 int Refuse(ConditionList& list, const char* key, std::initializer_list<Dstring> args) {
   ConditionListLoader::ConditionToken(list, key, args, 1);
   return 1;
@@ -55,9 +59,86 @@ int ValueAt(const Layout& layout, DataFormat format, long column, char c) {
   return value < (1 << traces) ? value : -1;
 }
 
+// Checks every line of `in` against the columns [first, first + width) of the layout; the
+// lines read are the text without blanks, underscores and comments. width < 0: the whole line.
+int Parse(const Layout& layout, DataFormat format, std::istream& in, const Dstring& source, const Dstring& segment,
+          long first, long width, std::vector<std::string>& lines, ConditionList& list) {
+  std::string raw;
+  for (long number = 1; std::getline(in, raw); ++number) {
+    std::string line;
+    for (char c : raw) {
+      if (c != ' ' && c != '\t' && c != '_' && c != '\r') line += c;
+    }
+    if (line.empty() || line[0] == '#') continue;
+    const long size = static_cast<long>(line.size());
+    if ((width < 0 && size != layout.columns) || (width >= 0 && size > width)) {
+      return Refuse(list, width < 0 ? "GUI_IMPORT_WIDTH" : "GUI_PASTE_TOO_WIDE",
+                    {source, Number(number), Number(size), segment, Number(layout.width), Number(width < 0 ? layout.columns : width)});
+    }
+    for (long c = 0; c < size; ++c) {
+      const char ch = line[static_cast<std::size_t>(c)];
+      if (ValueAt(layout, format, first + c, ch) < 0) {
+        return Refuse(list, "GUI_IMPORT_CHARACTER",
+                      {source, Number(number), Dstring(1, ch), Number(c + 1),
+                       layout.digits ? Dstring(InfoOf(format).word) : "\"" + layout.coding + "\""});
+      }
+    }
+    lines.push_back(std::move(line));
+  }
+  if (in.bad()) return Refuse(list, "GUI_IMPORT_READ", {source, Dstring(std::strerror(errno))});
+  if (lines.empty()) return Refuse(list, "GUI_IMPORT_EMPTY", {source});
+  return 0;
+}
+
+// Writes `lines` with their first character at (vector, column), block by block.
+int Put(QenSegmentDs& ds, DataFormat format, const Layout& layout, const std::vector<std::string>& lines, long vector, long column,
+        ConditionList& list) {
+  const long last = vector + static_cast<long>(lines.size()) - 1;
+  return SegmentTextFile::ForEachBlock(
+      ds, true, vector, last,
+      [&](SegmentBuffer* buffer, long from, long to, ConditionList& l) {
+        for (long v = from; v < to; ++v) {
+          const std::string& line = lines[static_cast<std::size_t>(v - vector)];
+          for (long c = 0; c < static_cast<long>(line.size()); ++c) {
+            const long trace = (layout.columns - 1 - column - c) * layout.k;
+            const char ch = line[static_cast<std::size_t>(c)];
+            const int status = layout.digits ? ds.SetDigit(buffer, v, trace, format, ch, l) : ds.SetState(buffer, v, trace, ch, l);
+            if (status != 0) return status;
+          }
+        }
+        return 0;
+      },
+      list);
+}
+
+// The lines of an area, each ended by a newline.
+int Lines(QenSegmentDs& ds, DataFormat format, const Layout& layout, const StateRange& range, std::ostream& out,
+          ConditionList& list) {
+  std::string line;
+  const long firstColumn = ColumnOf(layout, range.GetLastTrace());
+  const long lastColumn = ColumnOf(layout, range.GetFirstTrace());
+  return SegmentTextFile::ForEachBlock(
+      ds, false, range.GetFirstVector(), range.GetLastVector(),
+      [&](SegmentBuffer* buffer, long from, long to, ConditionList& l) {
+        for (long v = from; v < to; ++v) {
+          line.clear();
+          for (long c = firstColumn; c <= lastColumn; ++c) {
+            const long trace = (layout.columns - 1 - c) * layout.k;
+            char ch = ' ';
+            const int status = layout.digits ? ds.DigitOf(buffer, v, trace, format, ch, l) : ds.GetState(buffer, v, trace, ch, l);
+            if (status != 0) return status;
+            line += ch;
+          }
+          out << line << '\n';
+        }
+        return 0;
+      },
+      list);
+}
+
 }  // namespace
 
-int SegmentTextFile::ForEachBlock(QenSegmentDs& ds, bool write, const Visit& visit, ConditionList& list) {
+int SegmentTextFile::ForEachBlock(QenSegmentDs& ds, bool write, long first, long last, const Visit& visit, ConditionList& list) {
   SegmentBuffer* buffer = nullptr;
   if (int status = ds.CreateBuffer(buffer, list)) return status;
   long length = 0, width = 0, bits = 0;
@@ -66,8 +147,9 @@ int SegmentTextFile::ForEachBlock(QenSegmentDs& ds, bool write, const Visit& vis
   if (status == 0) status = ds.GetWidth(width, list);
   if (status == 0) status = ds.GetStateWidth(bits, list);
   const long step = std::max(1L, SegmentBuffer::VectorsPerBlock(width, bits));
-  for (long from = 0; status == 0 && from < length && width > 0; from += step) {
-    const long to = std::min(length, from + step);
+  const long end = last < 0 ? length : std::min(length, last + 1);
+  for (long from = std::max(0L, first); status == 0 && from < end && width > 0; from += step) {
+    const long to = std::min(end, from + step);
     status = ds.SetBufferStartAndLength(buffer, from, to - from, list);
     if (status == 0) status = visit(buffer, from, to, list);
     if (status == 0 && write) status = ds.Write(buffer, list);
@@ -82,23 +164,16 @@ int SegmentTextFile::Write(QenSegmentDs& ds, DataFormat format, std::ostream& ou
   if (int status = LayoutOf(ds, format, layout, list)) return status;
   out << "# segment " << ds.GetName() << ": " << layout.length << " vectors of " << layout.width << " traces, coding \""
       << layout.coding << "\", " << (layout.digits ? InfoOf(format).word : "one state per trace") << ", vector 0 first\n";
-  std::string line;
-  return ForEachBlock(
-      ds, false,
-      [&](SegmentBuffer* buffer, long from, long to, ConditionList& l) {
-        for (long v = from; v < to; ++v) {
-          line.assign(static_cast<std::size_t>(layout.columns), ' ');
-          for (long c = 0; c < layout.columns; ++c) {
-            const long trace = (layout.columns - 1 - c) * layout.k;
-            char& ch = line[static_cast<std::size_t>(c)];
-            const int status = layout.digits ? ds.DigitOf(buffer, v, trace, format, ch, l) : ds.GetState(buffer, v, trace, ch, l);
-            if (status != 0) return status;
-          }
-          out << line << '\n';
-        }
-        return 0;
-      },
-      list);
+  return Lines(ds, format, layout, StateRange(0, 0, layout.width - 1, layout.length - 1), out, list);
+}
+
+int SegmentTextFile::RangeText(QenSegmentDs& ds, DataFormat format, const StateRange& range, Dstring& text, ConditionList& list) {
+  Layout layout;
+  if (int status = LayoutOf(ds, format, layout, list)) return status;
+  std::ostringstream out;
+  if (int status = Lines(ds, format, layout, range, out, list)) return status;
+  text = out.str();
+  return 0;
 }
 
 int SegmentTextFile::Export(QenSegmentDs& ds, DataFormat format, const Dstring& path, ConditionList& list) {
@@ -109,50 +184,13 @@ int SegmentTextFile::Read(QenSegmentDs& ds, DataFormat format, std::istream& in,
   Layout layout;
   if (int status = LayoutOf(ds, format, layout, list)) return status;
   if (layout.width == 0) return Refuse(list, "GUI_IMPORT_NO_TRACES", {ds.GetName()});
-  // The whole file is checked before the segment is touched.
   std::vector<std::string> lines;
-  std::string raw;
-  for (long number = 1; std::getline(in, raw); ++number) {
-    std::string line;
-    for (char c : raw) {
-      if (c != ' ' && c != '\t' && c != '_' && c != '\r') line += c;
-    }
-    if (line.empty() || line[0] == '#') continue;
-    if (static_cast<long>(line.size()) != layout.columns) {
-      return Refuse(list, "GUI_IMPORT_WIDTH",
-                    {source, Number(number), Number(static_cast<long>(line.size())), ds.GetName(), Number(layout.width),
-                     Number(layout.columns)});
-    }
-    for (long c = 0; c < layout.columns; ++c) {
-      if (ValueAt(layout, format, c, line[static_cast<std::size_t>(c)]) < 0) {
-        return Refuse(list, "GUI_IMPORT_CHARACTER",
-                      {source, Number(number), Dstring(1, line[static_cast<std::size_t>(c)]), Number(c + 1),
-                       layout.digits ? Dstring(InfoOf(format).word) : "\"" + layout.coding + "\""});
-      }
-    }
-    lines.push_back(std::move(line));
-  }
-  if (in.bad()) return Refuse(list, "GUI_IMPORT_READ", {source, Dstring(std::strerror(errno))});
-  if (lines.empty()) return Refuse(list, "GUI_IMPORT_EMPTY", {source});
+  if (int status = Parse(layout, format, in, source, ds.GetName(), 0, -1, lines, list)) return status;
   const long count = static_cast<long>(lines.size());
   if (count != layout.length) {
     if (int status = ds.SetLength(count, list)) return status;
   }
-  return ForEachBlock(
-      ds, true,
-      [&](SegmentBuffer* buffer, long from, long to, ConditionList& l) {
-        for (long v = from; v < to; ++v) {
-          const std::string& line = lines[static_cast<std::size_t>(v)];
-          for (long c = 0; c < layout.columns; ++c) {
-            const long trace = (layout.columns - 1 - c) * layout.k;
-            const char ch = line[static_cast<std::size_t>(c)];
-            const int status = layout.digits ? ds.SetDigit(buffer, v, trace, format, ch, l) : ds.SetState(buffer, v, trace, ch, l);
-            if (status != 0) return status;
-          }
-        }
-        return 0;
-      },
-      list);
+  return Put(ds, format, layout, lines, 0, 0, list);
 }
 
 int SegmentTextFile::Import(QenSegmentDs& ds, DataFormat format, const Dstring& path, ConditionList& list) {
@@ -160,4 +198,19 @@ int SegmentTextFile::Import(QenSegmentDs& ds, DataFormat format, const Dstring& 
   std::ifstream file(path, std::ios::binary);
   if (!file) return Refuse(list, "GUI_IMPORT_READ", {path, Dstring(std::strerror(errno != 0 ? errno : ENOENT))});
   return Read(ds, format, file, path, list);
+}
+
+int SegmentTextFile::Paste(QenSegmentDs& ds, DataFormat format, const Dstring& text, long vector, long trace, ConditionList& list) {
+  Layout layout;
+  if (int status = LayoutOf(ds, format, layout, list)) return status;
+  const long column = ColumnOf(layout, trace);
+  std::istringstream in(text);
+  std::vector<std::string> lines;
+  const Dstring source = "the clipboard";
+  if (int status = Parse(layout, format, in, source, ds.GetName(), column, layout.columns - column, lines, list)) return status;
+  if (vector + static_cast<long>(lines.size()) > layout.length) {
+    return Refuse(list, "GUI_PASTE_TOO_LONG",
+                  {Number(static_cast<long>(lines.size())), Number(vector), Number(layout.length - vector)});
+  }
+  return Put(ds, format, layout, lines, vector, column, list);
 }

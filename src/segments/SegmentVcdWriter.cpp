@@ -29,7 +29,7 @@ int SegmentVcdWriter::Write(QenSegmentDs& ds, std::ostream& out, ConditionList& 
   std::string last(static_cast<std::size_t>(width) + 1, '\0');
   long end = 0;
   const int status = SegmentTextFile::ForEachBlock(
-      ds, false,
+      ds, false, 0, -1,
       [&](SegmentBuffer* buffer, long from, long to, ConditionList& l) {
         Dstring changes;
         for (long v = from; v < to; ++v) {

@@ -1,6 +1,8 @@
 #include <gtest/gtest.h>
 
 #include <QAction>
+#include <QClipboard>
+#include <QGuiApplication>
 #include <QLabel>
 #include <QLineEdit>
 #include <QListWidget>
@@ -241,4 +243,29 @@ TEST_F(SegmentEditTest, ReshapingCommandsKeepTheGridInStep) {
   EXPECT_EQ(coding, "01X");
   EXPECT_EQ(Row(grid, 0).left(3), QStringLiteral("801"));
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}
+
+// Copy puts the selection on the system clipboard as text; Paste Text puts text at the cursor,
+// and text that does not fit from there is refused whole.
+TEST_F(SegmentEditTest, TheSystemClipboardCarriesDigitsBothWays) {
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("12ab34cd"));
+  ASSERT_EQ(grid->SetSelection(0, 0, 1, 1, 2, 0, mList), 0);
+  Trigger("Copy");
+  EXPECT_EQ(QGuiApplication::clipboard()->text(), QStringLiteral("2a\n4c\n"));
+  ASSERT_EQ(grid->GoToVectorTrace(10, 12, mList), 0);
+  Trigger("PasteText");
+  ExpectRows(grid, {{0, "12ab"}, {1, "34cd"}, {10, "2a00"}, {11, "4c00"}});
+
+  const std::pair<QString, const char*> refused[] = {{"12345\n", "room for 4"}, {"1\n2\n", "room for 1;"}};
+  ASSERT_EQ(grid->GoToVectorTrace(63, 12, mList), 0);
+  for (const auto& [text, expected] : refused) {
+    QGuiApplication::clipboard()->setText(text);
+    mAlerts.clear();
+    Trigger("PasteText");
+    QCoreApplication::processEvents();  // refusals are shown after the event
+    ASSERT_EQ(mAlerts.size(), 1u);
+    EXPECT_NE(mAlerts[0].find(expected), std::string::npos) << mAlerts[0];
+  }
+  ExpectRows(grid, {{0, "12ab"}, {1, "34cd"}, {10, "2a00"}, {11, "4c00"}});
 }

@@ -1,5 +1,7 @@
 #include "segments/ui/SegmentGridManager.h"
 
+#include <QClipboard>
+#include <QGuiApplication>
 #include <QKeyEvent>
 #include <QPainter>
 #include <algorithm>
@@ -371,7 +373,26 @@ int SegmentGridManager::ModifyMirror(MirrorMode mode, ConditionList& list) {
   return IsMirrorPossible() ? mDs->ModifyMirror(SelectedRange(), mode, list) : 0;
 }
 
-int SegmentGridManager::ModifyCopy(ConditionList& list) { return IsEditable() ? mDs->ModifyCopy(SelectedRange(), list) : 0; }
+int SegmentGridManager::ModifyCopy(ConditionList& list) {
+  if (!IsEditable()) return 0;
+  if (int status = mDs->ModifyCopy(SelectedRange(), list)) return status;
+  Dstring text;
+  if (int status = SegmentTextFile::RangeText(*mDs, mFormat, SelectedRange(), text, list)) return status;
+  QGuiApplication::clipboard()->setText(QString::fromStdString(text));
+  return 0;
+}
+
+int SegmentGridManager::PasteText(ConditionList& list) {
+  if (!IsEditable()) return 0;
+  if (int status = mDs->Write(list)) return status;
+  const long top = std::min(mCursorDigit * TracesPerDigit() + TracesPerDigit() - 1, mWidth - 1);
+  int status = SegmentTextFile::Paste(*mDs, mFormat, QGuiApplication::clipboard()->text().toStdString(), mCursorVector, top, list);
+  // The paste went through a buffer of its own: the grid's is read again.
+  if (int read = mDs->Read(mBuffer, list); status == 0) status = read;
+  Refresh();
+  emit StateChanged();
+  return status;
+}
 
 bool SegmentGridManager::IsPastePossible() {
   if (!IsEditable()) return false;

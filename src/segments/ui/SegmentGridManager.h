@@ -60,6 +60,9 @@ class SegmentGridManager : public GridManager {
   int ExportText(const Dstring& path, ConditionList& list);
   int ImportText(const Dstring& path, ConditionList& list);
   int ExportVcd(const Dstring& path, ConditionList& list);
+  // The system clipboard's text pasted at the cursor, in the text form of the export; Copy puts
+  // the selection there too, so patterns travel to and from other programs.
+  int PasteText(ConditionList& list);
 
   // The segment grid's own operations after the base's.
   virtual int ValidateSbDigit(ConditionList& list);

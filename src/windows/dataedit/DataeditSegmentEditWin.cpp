@@ -114,6 +114,8 @@ void DataeditSegmentEditWin::BuildMenus() {
       {"&Edit", "Copy", "&Copy", QKeySequence::Copy, [](G& g, ConditionList& l) { return g.ModifyCopy(l); },
        [](G& g) { return g.IsCopyPossible(); }},
       {"&Edit", "Paste", "&Paste", QKeySequence::Paste, [](G& g, ConditionList& l) { return g.ModifyPaste(l); }, nullptr},
+      {"&Edit", "PasteText", "Paste &Text", QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_V),
+       [](G& g, ConditionList& l) { return g.PasteText(l); }, editable},
       {"&Edit", "InsertVectors", "I&nsert Vectors…", QKeySequence(Qt::Key_Insert), nullptr,
        [](G& g) { return g.IsInsertPossible(); }},
       {"&Edit", "DeleteVectors", "&Delete Vectors", QKeySequence(Qt::Key_Delete), [](G& g, ConditionList& l) { return g.ModifyDelete(l); },
@@ -160,6 +162,7 @@ void DataeditSegmentEditWin::BuildMenus() {
     // not the segment. The others work anywhere in the window.
     const bool textKey = c.key == QKeySequence(QKeySequence::Copy) || c.key == QKeySequence(QKeySequence::Paste) ||
                          c.key == QKeySequence(QKeySequence::SelectAll) || c.key == QKeySequence(Qt::Key_Delete) ||
+                         c.key == QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_V) ||
                          c.key == QKeySequence(Qt::Key_Insert);
     action->setShortcutContext(textKey ? Qt::WidgetShortcut : Qt::WidgetWithChildrenShortcut);
     (textKey ? static_cast<QWidget*>(mGrid) : this)->addAction(action);
