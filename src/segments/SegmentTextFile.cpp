@@ -136,7 +136,18 @@ int Lines(QenSegmentDs& ds, DataFormat format, const Layout& layout, const State
       list);
 }
 
+SegmentTextFile::Progress& CurrentProgress() {
+  static SegmentTextFile::Progress progress;
+  return progress;
+}
+
 }  // namespace
+
+SegmentTextFile::ProgressScope::ProgressScope(Progress progress) : mOuter(std::move(CurrentProgress())) {
+  CurrentProgress() = std::move(progress);
+}
+
+SegmentTextFile::ProgressScope::~ProgressScope() { CurrentProgress() = std::move(mOuter); }
 
 int SegmentTextFile::ForEachBlock(QenSegmentDs& ds, bool write, long first, long last, const Visit& visit, ConditionList& list) {
   SegmentBuffer* buffer = nullptr;
@@ -148,11 +159,16 @@ int SegmentTextFile::ForEachBlock(QenSegmentDs& ds, bool write, long first, long
   if (status == 0) status = ds.GetStateWidth(bits, list);
   const long step = std::max(1L, SegmentBuffer::VectorsPerBlock(width, bits));
   const long end = last < 0 ? length : std::min(length, last + 1);
-  for (long from = std::max(0L, first); status == 0 && from < end && width > 0; from += step) {
+  const long start = std::max(0L, first);
+  const Progress& progress = CurrentProgress();
+  for (long from = start; status == 0 && from < end && width > 0; from += step) {
     const long to = std::min(end, from + step);
     status = ds.SetBufferStartAndLength(buffer, from, to - from, list);
     if (status == 0) status = visit(buffer, from, to, list);
     if (status == 0 && write) status = ds.Write(buffer, list);
+    if (status == 0 && progress && !progress(to - start, end - start)) {
+      status = Refuse(list, "GUI_TRANSFER_STOPPED", {Number(to - start), Number(end - start)});
+    }
   }
   ConditionList ignored;
   ds.DestroyBuffer(buffer, status == 0 ? list : ignored);

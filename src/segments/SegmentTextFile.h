@@ -37,6 +37,20 @@ class SegmentTextFile {
   // `vector` on.
   static int Paste(QenSegmentDs& ds, DataFormat format, const Dstring& text, long vector, long trace, ConditionList& list);
 
+  // Told after each block of a transfer how many of its vectors are done; false stops it with
+  // "GUI_TRANSFER_STOPPED". A scope installs one for the transfers run inside it (GUI thread).
+  using Progress = std::function<bool(long done, long total)>;
+  class ProgressScope {
+   public:
+    explicit ProgressScope(Progress progress);
+    ~ProgressScope();
+    ProgressScope(const ProgressScope&) = delete;
+    ProgressScope& operator=(const ProgressScope&) = delete;
+
+   private:
+    Progress mOuter;
+  };
+
   // Runs `visit(buffer, from, to)` over vectors [first, last] in slices of one data block each,
   // on a buffer of its own that is let go at the end; writes each slice back after `visit`
   // when `write` is set. Stops at the first failure. last < 0: to the end of the segment.

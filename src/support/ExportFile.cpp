@@ -1,6 +1,7 @@
 #include "support/ExportFile.h"
 
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 #include <fstream>
 
@@ -10,7 +11,12 @@ int ExportFile::Write(const Dstring& path, const std::function<int(std::ostream&
   errno = 0;
   std::ofstream file(path, std::ios::binary | std::ios::trunc);
   if (file) {
-    if (int status = write(file)) return status;
+    // A file left half-written would pass for a whole one.
+    if (int status = write(file)) {
+      file.close();
+      std::remove(path.c_str());
+      return status;
+    }
     file.flush();
   }
   if (file) return 0;

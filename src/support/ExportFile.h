@@ -7,7 +7,7 @@
 #include "support/Dstring.h"
 
 // A file the user exports to: replaced whole, and "GUI_EXPORT_FAILED" naming the path and the
-// system's reason when it cannot be written.
+// system's reason when it cannot be written. When the writer fails or is stopped, the file goes.
 class ExportFile {
  public:
   // Opens `path` for `write`, whose nonzero status is passed on as it is.

@@ -502,3 +502,28 @@ TEST_F(SegmentSimTest, TheValueChangeDumpHoldsEveryState) {
   ds->Close(mList);
   QenSegmentPool::FreeDs(ds);
 }
+
+// A long export reports each block, and stopping it leaves no file behind.
+TEST_F(SegmentSimTest, AStoppedExportLeavesNoFile) {
+  QenSegmentDs* ds = Make("Text/Long", "01", 40000, 64);
+  const Dstring path = mDir + "/long.txt";
+  std::vector<long> done;
+  {
+    const SegmentTextFile::ProgressScope scope([&done](long d, long total) {
+      EXPECT_EQ(total, 40000);
+      done.push_back(d);
+      return true;
+    });
+    ASSERT_EQ(SegmentTextFile::Export(*ds, DataFormat::kHex, path, mList), 0) << mList.ToText();
+  }
+  EXPECT_EQ(done, (std::vector<long>{12496, 24992, 37488, 40000}));
+  EXPECT_TRUE(std::filesystem::exists(path.c_str()));
+  {
+    const SegmentTextFile::ProgressScope scope([](long d, long) { return d < 20000; });
+    EXPECT_NE(SegmentTextFile::Export(*ds, DataFormat::kHex, path, mList), 0);
+  }
+  EXPECT_NE(mList.ToText().find("Stopped after 24992 of 40000 vectors"), std::string::npos) << mList.ToText();
+  EXPECT_FALSE(std::filesystem::exists(path.c_str()));
+  ds->Close(mList);
+  QenSegmentPool::FreeDs(ds);
+}

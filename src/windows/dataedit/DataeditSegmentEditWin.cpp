@@ -15,12 +15,14 @@
 #include <QMdiSubWindow>
 #include <QMenuBar>
 #include <QMessageBox>
+#include <QProgressDialog>
 #include <QPushButton>
 #include <QSpinBox>
 
 #include "params/ui/BoundControl.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
+#include "segments/SegmentTextFile.h"
 #include "segments/ui/SegmentGridManager.h"
 #include "support/FWBlocker.h"
 #include "toolkit/Toolkit.h"
@@ -352,14 +354,33 @@ void DataeditSegmentEditWin::HitFile(File what) {
   }
   if (path.isEmpty()) return;
   const Dstring file = path.toStdString();
-  Run([this, what, &file](ConditionList& l) {
-    switch (what) {
-      case File::kImportText: return mGrid->ImportText(file, l);
-      case File::kExportText: return mGrid->ExportText(file, l);
-      case File::kExportVcd: return mGrid->ExportVcd(file, l);
-    }
-    return 0;
+  // A long segment takes a while: the progress shows after half a second. An export can be
+  // stopped (its file goes); an import cannot, as it would leave the segment half replaced.
+  const bool import = what == File::kImportText;
+  QProgressDialog progress(import ? QStringLiteral("Importing…") : QStringLiteral("Exporting…"),
+                           QStringLiteral("Stop"), 0, 1000, this);
+  progress.setWindowModality(Qt::WindowModal);
+  progress.setMinimumDuration(500);
+  if (import) progress.setCancelButton(nullptr);
+  const SegmentTextFile::ProgressScope scope([&progress](long done, long total) {
+    progress.setValue(static_cast<int>(1000 * done / std::max(1L, total)));
+    return !progress.wasCanceled();
   });
+  ConditionList list;
+  mMessage->clear();
+  switch (what) {
+    case File::kImportText: mGrid->ImportText(file, list); break;
+    case File::kExportText: mGrid->ExportText(file, list); break;
+    case File::kExportVcd: mGrid->ExportVcd(file, list); break;
+  }
+  const bool stopped = progress.wasCanceled();
+  progress.reset();
+  ShowState();
+  if (stopped) {
+    mMessage->setText(QStringLiteral("The export was stopped; no file was written."));
+  } else {
+    BoundControl::Report(list);
+  }
 }
 
 void DataeditSegmentEditWin::HitInsert(VectorTrace what) {
