@@ -33,6 +33,10 @@ int LayoutOf(QenSegmentDs& ds, DataFormat format, Layout& layout, ConditionList&
   // Digits set traces to "0" and "1", so only that coding is written in digits.
   layout.digits = layout.coding == "01";
   layout.k = layout.digits ? InfoOf(format).tracesPerDigit : 1;
+  if (layout.k == 0) {
+    list.Add(1, "The data format is not one of binary, octal and hexadecimal.");
+    return 1;
+  }
   layout.columns = layout.width == 0 ? 0 : layout.digits ? QenSegmentDs::MaxDigitOf(format, layout.width) + 1 : layout.width;
   return 0;
 }

@@ -445,6 +445,7 @@ TEST_F(SegmentSimTest, AnImportThatDoesNotFitChangesNothing) {
     EXPECT_NE(list.ToText().find(expected), std::string::npos) << list.ToText();
   }
   ConditionList list;
+  EXPECT_NE(SegmentTextFile::Import(*ds, static_cast<DataFormat>(7), path, list), 0);
   EXPECT_NE(SegmentTextFile::Import(*ds, DataFormat::kHex, mDir + "/missing.txt", list), 0);
   EXPECT_NE(list.ToText().find("could not be read"), std::string::npos) << list.ToText();
   long length = 0;
