@@ -8,6 +8,7 @@
 #include "common/gui/GuiSimFixture.h"
 #include "core/uiapp.h"
 #include "data/BerSvr.h"
+#include "data/RunStopDs.h"
 #include "instrument/QenGuiInst.h"
 #include "segments/ui/GridDisp.h"
 #include "windows/errstate/ErrStateGridManager.h"
@@ -57,8 +58,9 @@ TEST_F(ErrStateWinTest, ChannelsAddUpToThePortsErrorsAndResetClearsThem) {
   }
   RunUntilErrors();
   Other(":SGEN:GLOB:INIT:CONT OFF");
-  // The poll reads only while running: the counts at the stop are read here.
-  ASSERT_EQ(uiapp::GetBerSvr()->UpdateFromFW(BerSvr::kReadResults, mList), 0) << mList.ToText();
+  // The poll reads only while running; told of the stop, the window reads the final counts.
+  for (int i = 0; i < 50 && uiapp::GetRunStopDs()->IsRunning(); ++i) Poll();
+  ASSERT_FALSE(uiapp::GetRunStopDs()->IsRunning());
   const BerSvr::PortResult& first = Results()[0];
   EXPECT_EQ(std::accumulate(first.channels.begin(), first.channels.end(), 0ull), first.errors);
   // The server agrees with what the grid shows.

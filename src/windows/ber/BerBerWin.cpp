@@ -19,6 +19,7 @@
 #include "params/ui/BoundControl.h"
 #include "support/ExportFile.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/BerAtStop.h"
 #include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
 
@@ -38,8 +39,9 @@ QTableWidgetItem* Cell(const QString& text, bool number) {
 class BerBerWin::View : public QenDsView {
  public:
   explicit View(BerBerWin& win) : mWin(win) {}
-  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
+  int NfyViewDataUpdated(QenDs* changed, ConditionList& list) override {
     mWin.ShowResults();
+    ReadBerAtStop(changed, list);
     return 0;
   }
 

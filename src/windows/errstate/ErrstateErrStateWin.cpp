@@ -9,13 +9,15 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/BerAtStop.h"
 #include "windows/errstate/ErrStateGridManager.h"
 
 class ErrstateErrStateWin::View : public QenDsView {
  public:
   explicit View(ErrstateErrStateWin& win) : mWin(win) {}
-  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
+  int NfyViewDataUpdated(QenDs* changed, ConditionList& list) override {
     mWin.ShowResults();
+    ReadBerAtStop(changed, list);
     return 0;
   }
 
