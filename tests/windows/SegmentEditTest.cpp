@@ -242,6 +242,10 @@ TEST_F(SegmentEditTest, ReshapingCommandsKeepTheGridInStep) {
   ASSERT_EQ(grid->GetSegmentDs()->GetCoding(coding, mList, true), 0);
   EXPECT_EQ(coding, "01X");
   EXPECT_EQ(Row(grid, 0).left(3), QStringLiteral("801"));
+  // A state letter is typed as it is: "X" sets every trace of the digit, shown as "?".
+  ASSERT_EQ(grid->GoToVectorTrace(1, 0, mList), 0);
+  QTest::keyClicks(grid, QStringLiteral("X"));
+  EXPECT_EQ(Row(grid, 1).left(3), QStringLiteral("00?"));
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
 }
 

@@ -582,7 +582,9 @@ void SegmentGridManager::keyPressEvent(QKeyEvent* event) {
     default: {
       const QString text = event->text();
       if (text.size() == 1 && text[0].isPrint() && !far) {
-        TypeDigit(text[0].toLower().toLatin1());
+        // Digits in either case; any other letter as typed, a state such as "X" or "Z".
+        const char lower = text[0].toLower().toLatin1();
+        TypeDigit(lower != '\0' && std::strchr(InfoOf(mFormat).digits, lower) != nullptr ? lower : text[0].toLatin1());
         break;
       }
       GridManager::keyPressEvent(event);
