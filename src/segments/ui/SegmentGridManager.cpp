@@ -581,7 +581,9 @@ void SegmentGridManager::keyPressEvent(QKeyEvent* event) {
     }
     default: {
       const QString text = event->text();
-      if (text.size() == 1 && text[0].isPrint() && !far) {
+      // Keys with Ctrl, Alt or Meta are commands (menus, shortcuts), never typed.
+      const bool command = (event->modifiers() & (Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier)) != 0;
+      if (text.size() == 1 && text[0].isPrint() && !command) {
         // Digits in either case; any other letter as typed, a state such as "X" or "Z".
         const char lower = text[0].toLower().toLatin1();
         TypeDigit(lower != '\0' && std::strchr(InfoOf(mFormat).digits, lower) != nullptr ? lower : text[0].toLatin1());

@@ -216,8 +216,12 @@ void DataeditSegmentEditWin::ShowState() {
 void DataeditSegmentEditWin::Run(const std::function<int(ConditionList&)>& operation) {
   ConditionList list;
   mMessage->clear();
+  // The server may take a while over a long segment: the pointer says so meanwhile.
+  Toolkit::Get().SetWaitCursor(true);
+  const int status = operation(list);
+  Toolkit::Get().SetWaitCursor(false);
   // A lock is a state, not an error: it adds no condition, so it is said here.
-  if (operation(list) == FWBlocker::kLocked) mMessage->setText(SegmentGridManager::LockedText());
+  if (status == FWBlocker::kLocked) mMessage->setText(SegmentGridManager::LockedText());
   ShowState();
   BoundControl::Report(list);
 }
@@ -362,9 +366,12 @@ void DataeditSegmentEditWin::HitFile(File what) {
   progress.setWindowModality(Qt::WindowModal);
   progress.setMinimumDuration(500);
   if (import) progress.setCancelButton(nullptr);
-  const SegmentTextFile::ProgressScope scope([&progress](long done, long total) {
+  // Only a stop the transfer itself saw counts: it is what ended it.
+  bool stopped = false;
+  const SegmentTextFile::ProgressScope scope([&progress, &stopped, import](long done, long total) {
     progress.setValue(static_cast<int>(1000 * done / std::max(1L, total)));
-    return !progress.wasCanceled();
+    stopped = !import && progress.wasCanceled();
+    return !stopped;
   });
   ConditionList list;
   mMessage->clear();
@@ -373,7 +380,6 @@ void DataeditSegmentEditWin::HitFile(File what) {
     case File::kExportText: mGrid->ExportText(file, list); break;
     case File::kExportVcd: mGrid->ExportVcd(file, list); break;
   }
-  const bool stopped = progress.wasCanceled();
   progress.reset();
   ShowState();
   if (stopped) {
