@@ -89,6 +89,9 @@ TEST_F(SegmentEditTest, EditsFindsAndSavesWhatAFreshWindowReadsBack) {
   QTest::keyClick(grid, Qt::Key_G);
   EXPECT_FALSE(mWin->MessageText().isEmpty());
   EXPECT_EQ(grid->CursorVector(), 1);
+  // With Alt a digit is a menu key, not typed.
+  QTest::keyClick(grid, Qt::Key_A, Qt::AltModifier);
+  EXPECT_EQ(grid->CursorDigit(), 3);
 
   ASSERT_EQ(grid->SetSelection(0, 2, 5, 1, 2, 0, mList), 0) << mList.ToText();
   Trigger("Fill1");
