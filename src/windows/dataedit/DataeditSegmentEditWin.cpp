@@ -3,10 +3,7 @@
 #include <QAction>
 #include <QCloseEvent>
 #include <QComboBox>
-#include <QDialog>
-#include <QDialogButtonBox>
 #include <QFileDialog>
-#include <QFormLayout>
 #include <QInputDialog>
 #include <QLabel>
 #include <QLayout>
@@ -27,6 +24,7 @@
 #include "support/FWBlocker.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/FormDialog.h"
 
 // A menu entry: its text and key, what it does, and when it is offered.
 struct DataeditSegmentEditWin::Command {
@@ -295,28 +293,18 @@ void DataeditSegmentEditWin::HitSegmentChosen() {
 }
 
 void DataeditSegmentEditWin::HitPButNew() {
-  QDialog dialog(this);
-  dialog.setWindowTitle(QStringLiteral("New Segment"));
-  auto* form = new QFormLayout(&dialog);
-  auto* name = new QLineEdit(&dialog);
-  auto* length = new QSpinBox(&dialog);
+  FormDialog dialog(this, QStringLiteral("New Segment"));
+  auto* name = dialog.Add(QStringLiteral("&Name"), new QLineEdit);
+  auto* length = dialog.Add(QStringLiteral("&Vectors"), new QSpinBox);
   length->setRange(1, 1 << 30);
   length->setValue(1024);
   length->setGroupSeparatorShown(true);
-  auto* width = new QSpinBox(&dialog);
+  auto* width = dialog.Add(QStringLiteral("&Traces"), new QSpinBox);
   width->setRange(1, 4096);
   width->setValue(16);
-  auto* coding = new QComboBox(&dialog);
+  auto* coding = dialog.Add(QStringLiteral("&Coding"), new QComboBox);
   coding->addItems(Codings());
-  form->addRow(QStringLiteral("&Name"), name);
-  form->addRow(QStringLiteral("&Vectors"), length);
-  form->addRow(QStringLiteral("&Traces"), width);
-  form->addRow(QStringLiteral("&Coding"), coding);
-  auto* buttons = new QDialogButtonBox(QDialogButtonBox::Ok | QDialogButtonBox::Cancel, &dialog);
-  form->addRow(buttons);
-  connect(buttons, &QDialogButtonBox::accepted, &dialog, &QDialog::accept);
-  connect(buttons, &QDialogButtonBox::rejected, &dialog, &QDialog::reject);
-  if (dialog.exec() != QDialog::Accepted || name->text().trimmed().isEmpty()) return;
+  if (!dialog.Ask() || name->text().trimmed().isEmpty()) return;
   SegmentProperties properties;
   properties.name = name->text().trimmed().toStdString();
   properties.length = length->value();
@@ -400,21 +388,13 @@ void DataeditSegmentEditWin::HitInsert(VectorTrace what) {
 }
 
 void DataeditSegmentEditWin::HitDeserialize() {
-  QDialog dialog(this);
-  dialog.setWindowTitle(QStringLiteral("Deserialise"));
-  auto* form = new QFormLayout(&dialog);
-  auto* width = new QSpinBox(&dialog);
+  FormDialog dialog(this, QStringLiteral("Deserialise"));
+  auto* width = dialog.Add(QStringLiteral("&Traces"), new QSpinBox);
   width->setRange(1, 4096);
   width->setValue(8);
-  auto* offset = new QSpinBox(&dialog);
+  auto* offset = dialog.Add(QStringLiteral("&From state"), new QSpinBox);
   offset->setRange(0, 1 << 30);
-  form->addRow(QStringLiteral("&Traces"), width);
-  form->addRow(QStringLiteral("&From state"), offset);
-  auto* buttons = new QDialogButtonBox(QDialogButtonBox::Ok | QDialogButtonBox::Cancel, &dialog);
-  form->addRow(buttons);
-  connect(buttons, &QDialogButtonBox::accepted, &dialog, &QDialog::accept);
-  connect(buttons, &QDialogButtonBox::rejected, &dialog, &QDialog::reject);
-  if (dialog.exec() != QDialog::Accepted) return;
+  if (!dialog.Ask()) return;
   Run([this, w = width->value(), o = offset->value()](ConditionList& l) { return mGrid->ModifyDeserialize(w, o, l); });
 }
 
