@@ -9,6 +9,7 @@
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
+#include "windows/smseqedit/SmseqeditWin.h"
 #include "windows/wavewin/WavewinWaveWin.h"
 
 namespace {
@@ -29,6 +30,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
   static const std::vector<Entry> kEntries = {
       {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>()},
       {"dataedit.SegmentEditWin", "Segment Editor", Maker<DataeditSegmentEditWin>()},
+      {"smseqedit.Win", "Simple Sequence", Maker<SmseqeditWin>()},
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},

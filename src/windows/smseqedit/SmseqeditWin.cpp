@@ -1,0 +1,221 @@
+#include "windows/smseqedit/SmseqeditWin.h"
+
+#include <QHeaderView>
+#include <QLabel>
+#include <QLayout>
+#include <QPushButton>
+#include <QTableWidget>
+
+#include "params/ui/BoundControl.h"
+#include "segments/QenSegmentPool.h"
+#include "sequences/CPortInfo.h"
+#include "sequences/CSequence.h"
+#include "sequences/CSequenceBlock.h"
+#include "sequences/CSequenceObserver.h"
+#include "toolkit/qt/ResourceLibrary.h"
+#include "windows/PlaceName.h"
+
+namespace {
+
+// The kinds a port's cell may name instead of a segment, as the sequence spells them.
+CSequence::SeqSegType KindOf(const QString& text) {
+  for (int type = CSequence::SEG_PAUSE; type <= CSequence::SEG_DONTCARE; ++type) {
+    const auto kind = static_cast<CSequence::SeqSegType>(type);
+    if (text.compare(QLatin1String(CSequence::CSequenceBlock::KeywordOf(kind)), Qt::CaseInsensitive) == 0) return kind;
+  }
+  return CSequence::SEG_NAMED;
+}
+
+}  // namespace
+
+// Every report of a read ends in the same table: it is filled again once the model is told.
+class SmseqeditWin::Observer : public CSequenceObserver {
+ public:
+  explicit Observer(SmseqeditWin& win) : mWin(win) {}
+  int NfySequence(ConditionList&) override { return Changed(); }
+  int NfyBlockInserted(unsigned long, ConditionList&) override { return Changed(); }
+  int NfyBlockDeleted(unsigned long, ConditionList&) override { return Changed(); }
+  int NfyBlockLabelChanged(unsigned long, ConditionList&) override { return Changed(); }
+  int NfyBlockLengthChanged(unsigned long, ConditionList&) override { return Changed(); }
+  int NfySegmentChanged(unsigned long, unsigned long, ConditionList&) override { return Changed(); }
+  int NfyUpdateLoops(ConditionList&) override { return Changed(); }
+
+ private:
+  int Changed() {
+    mWin.Rebuild();
+    return 0;
+  }
+  SmseqeditWin& mWin;
+};
+
+SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mObserver(std::make_unique<Observer>(*this)) {
+  setObjectName(QStringLiteral("SmseqeditWin"));
+}
+
+SmseqeditWin::~SmseqeditWin() {
+  if (CSequence* sequence = GetSequence()) sequence->RemoveObserver(mObserver.get());
+}
+
+CSequence* SmseqeditWin::GetSequence() { return CPortInfo::GetSequence(); }
+
+int SmseqeditWin::Load(ConditionList& list) {
+  if (int status = ResourceLibrary::LoadInto("smseqedit.Win", this, list)) return status;
+  mTable = findChild<QTableWidget*>(QStringLiteral("TableBlocks"));
+  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
+  auto* add = findChild<QPushButton*>(QStringLiteral("PButAdd"));
+  auto* remove = findChild<QPushButton*>(QStringLiteral("PButDelete"));
+  auto* up = findChild<QPushButton*>(QStringLiteral("PButUp"));
+  auto* down = findChild<QPushButton*>(QStringLiteral("PButDown"));
+  if (mTable == nullptr || mState == nullptr || add == nullptr || remove == nullptr || up == nullptr || down == nullptr ||
+      GetSequence() == nullptr) {
+    list.Add(1, "The window resource \"smseqedit.Win\" lacks its table or buttons, or there is no sequence.");
+    return 1;
+  }
+  connect(add, &QPushButton::clicked, this, [this] { Run(&SmseqeditWin::AddBlock); });
+  connect(remove, &QPushButton::clicked, this, [this] { Run(&SmseqeditWin::DeleteBlock); });
+  connect(up, &QPushButton::clicked, this, [this] {
+    ConditionList l;
+    MoveBlock(-1, l);
+    BoundControl::Report(l);
+  });
+  connect(down, &QPushButton::clicked, this, [this] {
+    ConditionList l;
+    MoveBlock(1, l);
+    BoundControl::Report(l);
+  });
+  layout()->setContentsMargins(8, 6, 8, 6);
+  setFocusProxy(mTable);
+  connect(mTable, &QTableWidget::cellChanged, this, &SmseqeditWin::HitCellChanged);
+  mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
+  GetSequence()->AddObserver(mObserver.get());
+  const int status = GetSequence()->ReadSequence(list, 0);
+  Rebuild();
+  return status;
+}
+
+bool SmseqeditWin::IsEditable() const { return GetSequence() != nullptr && GetSequence()->GetLoops().empty(); }
+
+unsigned long SmseqeditWin::CurrentBlock() const {
+  return mTable->currentRow() < 0 ? 0 : static_cast<unsigned long>(mTable->currentRow()) + 1;
+}
+
+void SmseqeditWin::Rebuild() {
+  const CSequence* sequence = GetSequence();
+  if (sequence == nullptr || mTable == nullptr) return;
+  mFilling = true;
+  const int current = mTable->currentRow();
+  const int column = std::max(0, mTable->currentColumn());
+  const unsigned long ports = sequence->GetNumPorts();
+  mTable->setColumnCount(kFirstPortColumn + static_cast<int>(ports));
+  mTable->setHorizontalHeaderItem(0, new QTableWidgetItem(QStringLiteral("Label")));
+  mTable->setHorizontalHeaderItem(1, new QTableWidgetItem(QStringLiteral("Length")));
+  // The sequence's ports are the data ports in the order of the configuration: a column each,
+  // headed by its place on two lines and its type.
+  unsigned long p = 0;
+  for (const CPortInfo::Port& port : CPortInfo::GetPorts()) {
+    if (port.portClass != "PDAT" || ++p > ports) continue;
+    QString place = PlaceName(port.path);
+    place.replace(place.lastIndexOf(QStringLiteral(" › ")), 3, QStringLiteral("\n"));
+    const QString kind = port.type == "OUTPUT_PORT"  ? QStringLiteral("generator")
+                         : port.type == "INPUT_PORT" ? QStringLiteral("analyser")
+                                                     : QString::fromStdString(port.type);
+    auto* header = new QTableWidgetItem(QStringLiteral("%1\n%2").arg(place, kind));
+    header->setToolTip(QStringLiteral("%1, %2").arg(PlaceName(port.path), QString::fromStdString(port.model)));
+    mTable->setHorizontalHeaderItem(kFirstPortColumn + static_cast<int>(p) - 1, header);
+  }
+  mTable->setRowCount(static_cast<int>(sequence->GetNumBlocks()));
+  const bool editable = IsEditable();
+  for (unsigned long b = 1; b <= sequence->GetNumBlocks(); ++b) {
+    const int row = static_cast<int>(b - 1);
+    QStringList texts = {QString::fromStdString(sequence->GetLabel(b)), QString::number(sequence->GetBlockLength(b))};
+    for (unsigned long p = 1; p <= ports; ++p) texts << QString::fromStdString(sequence->GetSegment(b, p));
+    // The cells are kept and their texts set: the table may be filled while a cell's edit is
+    // being told.
+    for (int c = 0; c < texts.size(); ++c) {
+      QTableWidgetItem* item = mTable->item(row, c);
+      if (item == nullptr) {
+        item = new QTableWidgetItem;
+        if (c == 1) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
+        mTable->setItem(row, c, item);
+      }
+      item->setText(texts[c]);
+      item->setFlags(editable ? item->flags() | Qt::ItemIsEditable : item->flags() & ~Qt::ItemIsEditable);
+    }
+  }
+  if (mTable->rowCount() > 0) {
+    mTable->setCurrentCell(std::clamp(current, 0, mTable->rowCount() - 1), std::min(column, mTable->columnCount() - 1));
+  }
+  mTable->resizeColumnsToContents();
+  mTable->setColumnWidth(0, std::max(mTable->columnWidth(0), 120));
+  mTable->setColumnWidth(1, std::max(mTable->columnWidth(1), 80));
+  mState->setText(editable ? QStringLiteral("%1 %2. A change goes to the instrument as it is made.")
+                                 .arg(mTable->rowCount())
+                                 .arg(mTable->rowCount() == 1 ? QStringLiteral("block") : QStringLiteral("blocks"))
+                           : QStringLiteral("This sequence has loops: it is shown here, but this editor changes only "
+                                            "sequences without loops."));
+  for (const char* name : {"PButAdd", "PButDelete", "PButUp", "PButDown"}) {
+    if (auto* button = findChild<QPushButton*>(QLatin1String(name))) button->setEnabled(editable);
+  }
+  mFilling = false;
+}
+
+void SmseqeditWin::HitCellChanged(int row, int column) {
+  if (mFilling || row < 0) return;
+  ConditionList list;
+  if (ApplyCell(static_cast<unsigned long>(row) + 1, column, mTable->item(row, column)->text().trimmed(), list) != 0) {
+    Rebuild();
+  }
+  BoundControl::Report(list);
+}
+
+int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list) {
+  CSequence* sequence = GetSequence();
+  if (column == 0) return sequence->SetLabel(block, text.toStdString(), list);
+  if (column == 1) {
+    bool number = false;
+    const unsigned long length = text.toULong(&number);
+    if (!number || length == 0) {
+      list.Add(1, Dstring::Format("\"%s\" is no block length: a whole number of vectors above 0.", text.toStdString().c_str()));
+      return 1;
+    }
+    return sequence->SetBlockLength(block, length, list);
+  }
+  const CSequence::SeqSegType kind = KindOf(text);
+  // The sequence takes any name; the instrument would only find out at the run.
+  if (kind == CSequence::SEG_NAMED) {
+    bool exists = false;
+    if (int status = QenSegmentPool::Exists(text.toStdString(), exists, list)) return status;
+    if (!exists) {
+      list.Add(1, Dstring::Format("There is no segment \"%s\" on the instrument: make it in the segment editor first.",
+                                  text.toStdString().c_str()));
+      return 1;
+    }
+  }
+  return sequence->SetSegment(block, static_cast<unsigned long>(column - kFirstPortColumn + 1), text.toStdString(), list, kind);
+}
+
+void SmseqeditWin::Run(int (SmseqeditWin::*command)(ConditionList&)) {
+  ConditionList list;
+  if ((this->*command)(list) != 0) Rebuild();
+  BoundControl::Report(list);
+}
+
+int SmseqeditWin::AddBlock(ConditionList& list) {
+  const unsigned long after = CurrentBlock();
+  if (int status = GetSequence()->AddBlockAfter(after, list)) return status;
+  mTable->setCurrentCell(static_cast<int>(after), std::max(0, mTable->currentColumn()));
+  return 0;
+}
+
+int SmseqeditWin::DeleteBlock(ConditionList& list) {
+  const unsigned long block = CurrentBlock();
+  return block == 0 ? 0 : GetSequence()->DeleteBlock(block, list);
+}
+
+int SmseqeditWin::MoveBlock(long distance, ConditionList& list) {
+  const unsigned long block = CurrentBlock();
+  if (block == 0) return 0;
+  if (int status = GetSequence()->MoveBlock(block, distance, list)) return status;
+  mTable->setCurrentCell(static_cast<int>(static_cast<long>(block) - 1 + distance), std::max(0, mTable->currentColumn()));
+  return 0;
+}

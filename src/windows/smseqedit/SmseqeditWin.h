@@ -1,0 +1,51 @@
+#pragma once
+
+#include <QWidget>
+#include <memory>
+
+#include "support/ConditionList.h"
+
+class CSequence;
+class QLabel;
+class QTableWidget;
+
+// The simple sequence editor ("smseqedit.Win"): the sequence as one list of blocks, a line each
+// with its label, its length and the segment of every port. Each change is an edit of the one
+// sequence model, written to the instrument and read back; a refusal is shown and the table
+// shows what the instrument holds. A change by another client reaches the table through the
+// model's reports. A sequence with loops is shown but not changed here.
+class SmseqeditWin : public QWidget {
+  Q_OBJECT
+
+ public:
+  explicit SmseqeditWin(QWidget* parent = nullptr);
+  ~SmseqeditWin() override;
+
+  int Load(ConditionList& list);
+  static CSequence* GetSequence();
+  QTableWidget* Table() const { return mTable; }
+  // The block of the current line, 1 the first; 0 with no line.
+  unsigned long CurrentBlock() const;
+  // Fills the table from the model again.
+  void Rebuild();
+
+  // The buttons' commands on the current block.
+  int AddBlock(ConditionList& list);
+  int DeleteBlock(ConditionList& list);
+  int MoveBlock(long distance, ConditionList& list);
+
+ private:
+  class Observer;
+  static constexpr int kFirstPortColumn = 2;
+
+  // An edited cell goes to the model; a refusal is shown and the line put back.
+  void HitCellChanged(int row, int column);
+  int ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list);
+  void Run(int (SmseqeditWin::*command)(ConditionList&));
+  bool IsEditable() const;
+
+  QTableWidget* mTable = nullptr;
+  QLabel* mState = nullptr;
+  std::unique_ptr<Observer> mObserver;
+  bool mFilling = false;
+};

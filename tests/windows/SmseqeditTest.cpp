@@ -1,0 +1,107 @@
+#include <gtest/gtest.h>
+
+#include <QCoreApplication>
+#include <QTableWidget>
+#include <memory>
+
+#include "common/gui/GuiSimFixture.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/SegmentProperties.h"
+#include "sequences/CSequence.h"
+#include "windows/smseqedit/SmseqeditWin.h"
+
+namespace {
+
+// The simple sequence editor against qensim, whose sequence starts as one block of 512 vectors.
+class SmseqeditTest : public GuiSimFixture {
+ protected:
+  void SetUp() override {
+    GuiSimFixture::SetUp();
+    Poll();
+    mWin = std::make_unique<SmseqeditWin>();
+    ASSERT_EQ(mWin->Load(mList), 0) << mList.ToText();
+    mWin->resize(1000, 400);
+    mWin->show();
+  }
+  void TearDown() override {
+    mWin.reset();
+    GuiSimFixture::TearDown();
+  }
+  QString Cell(int row, int column) const { return mWin->Table()->item(row, column)->text(); }
+  // A cell typed in, as the table's editor commits it.
+  void Type(int row, int column, const QString& text) {
+    mWin->Table()->setCurrentCell(row, column);
+    mWin->Table()->item(row, column)->setText(text);
+    QCoreApplication::processEvents();  // refusals are shown after the event
+  }
+  static int Count(const Dstring& text, const std::string& word) {
+    int n = 0;
+    for (std::size_t at = text.find(word); at != std::string::npos; at = text.find(word, at + 1)) ++n;
+    return n;
+  }
+
+  std::unique_ptr<SmseqeditWin> mWin;
+};
+
+}  // namespace
+
+TEST_F(SmseqeditTest, EditsReachTheInstrumentAndRefusalsShowWhatItHolds) {
+  ASSERT_EQ(mWin->Table()->rowCount(), 1);
+  ASSERT_GT(mWin->Table()->columnCount(), 2);
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("512"));
+
+  mWin->Table()->setCurrentCell(0, 0);
+  ASSERT_EQ(mWin->AddBlock(mList), 0) << mList.ToText();
+  EXPECT_EQ(mWin->Table()->rowCount(), 2);
+  EXPECT_EQ(Count(Other(":SGEN:GLOB:SEQ?"), "(BLOCK,"), 2);
+
+  Type(1, 1, QStringLiteral("1024"));
+  Type(1, 0, QStringLiteral("loop_me"));
+  const Dstring written = Other(":SGEN:GLOB:SEQ?");
+  EXPECT_NE(written.find(",1024,"), std::string::npos) << written;
+  EXPECT_NE(written.find("\"loop_me\""), std::string::npos) << written;
+
+  SegmentProperties segment;
+  segment.name = "Seq/A";
+  segment.length = 512;
+  segment.width = 1;
+  unsigned created = 0;
+  ASSERT_EQ(QenSegmentPool::Create(segment, created, mList), 0) << mList.ToText();
+  Type(0, 2, QStringLiteral("Seq/A"));
+  EXPECT_NE(Other(":SGEN:GLOB:SEQ?").find("\"Seq/A\""), std::string::npos);
+  mAlerts.clear();
+  Type(0, 3, QStringLiteral("Seq/Missing"));
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find("no segment \"Seq/Missing\""), std::string::npos) << mAlerts[0];
+  EXPECT_EQ(Cell(0, 3), QStringLiteral("PAUSE"));
+  EXPECT_EQ(Other(":SGEN:GLOB:SEQ?").find("Seq/Missing"), std::string::npos);
+  Type(0, 2, QStringLiteral("pause0"));
+  EXPECT_EQ(Cell(0, 2), QStringLiteral("PAUSE0"));
+
+  // A length that is no number is refused here; the cell shows the instrument's again.
+  mAlerts.clear();
+  Type(1, 1, QStringLiteral("lots"));
+  EXPECT_EQ(mAlerts.size(), 1u);
+  EXPECT_EQ(Cell(1, 1), QStringLiteral("1024"));
+  EXPECT_NE(Other(":SGEN:GLOB:SEQ?").find(",1024,"), std::string::npos);
+
+  mWin->Table()->setCurrentCell(1, 0);
+  ASSERT_EQ(mWin->MoveBlock(-1, mList), 0) << mList.ToText();
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("1024"));
+  EXPECT_EQ(mWin->CurrentBlock(), 1u);
+  ASSERT_EQ(mWin->DeleteBlock(mList), 0);
+  EXPECT_EQ(mWin->Table()->rowCount(), 1);
+  EXPECT_EQ(Count(Other(":SGEN:GLOB:SEQ?"), "(BLOCK,"), 1);
+  QenSegmentPool::Delete("Seq/A", mList);
+}
+
+// Another client's change reaches the table within the poll.
+TEST_F(SmseqeditTest, AnotherClientsChangeIsShown) {
+  Dstring text = Other(":SGEN:GLOB:SEQ?");
+  const std::size_t at = text.find(",512,");
+  ASSERT_NE(at, std::string::npos) << text;
+  text.replace(at, 5, ",4096,");
+  Other(":SGEN:GLOB:SEQ " + text);
+  for (int i = 0; i < 20 && Cell(0, 1) != QStringLiteral("4096"); ++i) Poll();
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("4096"));
+}
