@@ -71,18 +71,10 @@ int SmseqeditWin::Load(ConditionList& list) {
     list.Add(1, "The window resource \"smseqedit.Win\" lacks its table or buttons, or there is no sequence.");
     return 1;
   }
-  connect(add, &QPushButton::clicked, this, [this] { Run(&SmseqeditWin::AddBlock); });
-  connect(remove, &QPushButton::clicked, this, [this] { Run(&SmseqeditWin::DeleteBlock); });
-  connect(up, &QPushButton::clicked, this, [this] {
-    ConditionList l;
-    MoveBlock(-1, l);
-    BoundControl::Report(l);
-  });
-  connect(down, &QPushButton::clicked, this, [this] {
-    ConditionList l;
-    MoveBlock(1, l);
-    BoundControl::Report(l);
-  });
+  connect(add, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return AddBlock(l); }); });
+  connect(remove, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return DeleteBlock(l); }); });
+  connect(up, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(-1, l); }); });
+  connect(down, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(1, l); }); });
   layout()->setContentsMargins(8, 6, 8, 6);
   setFocusProxy(mTable);
   connect(mTable, &QTableWidget::cellChanged, this, &SmseqeditWin::HitCellChanged);
@@ -194,9 +186,9 @@ int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text
   return sequence->SetSegment(block, static_cast<unsigned long>(column - kFirstPortColumn + 1), text.toStdString(), list, kind);
 }
 
-void SmseqeditWin::Run(int (SmseqeditWin::*command)(ConditionList&)) {
+void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
-  if ((this->*command)(list) != 0) Rebuild();
+  if (command(list) != 0) Rebuild();
   BoundControl::Report(list);
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QWidget>
+#include <functional>
 #include <memory>
 
 #include "support/ConditionList.h"
@@ -41,7 +42,8 @@ class SmseqeditWin : public QWidget {
   // An edited cell goes to the model; a refusal is shown and the line put back.
   void HitCellChanged(int row, int column);
   int ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list);
-  void Run(int (SmseqeditWin::*command)(ConditionList&));
+  // Runs a button's command; a refusal is shown and the table filled from the model again.
+  void Run(const std::function<int(ConditionList&)>& command);
   bool IsEditable() const;
 
   QTableWidget* mTable = nullptr;
