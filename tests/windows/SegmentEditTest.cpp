@@ -198,6 +198,33 @@ TEST_F(SegmentEditTest, TextExportImportsBackAndAWrongWidthIsRefused) {
   EXPECT_NE(list.ToText().find("could not be written"), std::string::npos) << list.ToText();
 }
 
+// Choosing another segment with unsaved edits asks too: the instrument would forget them.
+TEST_F(SegmentEditTest, OpeningAnotherSegmentWithUnsavedEditsAsks) {
+  SegmentProperties other;
+  other.name = "Edit/Other";
+  other.length = 8;
+  other.width = 4;
+  unsigned created = 0;
+  ASSERT_EQ(QenSegmentPool::Create(other, created, mList), 0) << mList.ToText();
+  ASSERT_EQ(mWin->ReadCatalog(mList), 0);
+  QTest::keyClicks(mWin->Grid(), QStringLiteral("77"));
+  QListWidget* list = mWin->SegmentList();
+  const auto pick = [list](const char* name) {
+    list->setCurrentItem(list->findItems(QString::fromLatin1(name), Qt::MatchExactly).front());
+  };
+  mToolkit.QueueAnswer(ToolkitPort::kCancel);
+  pick("Edit/Other");
+  EXPECT_EQ(mWin->Grid()->GetSegmentDs()->GetName(), Dstring(kName));
+  EXPECT_EQ(list->currentItem()->text(), QString::fromLatin1(kName));
+  EXPECT_TRUE(mWin->Grid()->IsDirty());
+  mToolkit.QueueAnswer(ToolkitPort::kYes);
+  pick("Edit/Other");
+  EXPECT_EQ(mWin->Grid()->GetSegmentDs()->GetName(), Dstring("Edit/Other"));
+  ASSERT_EQ(mWin->OpenSegment(kName, mList), 0) << mList.ToText();
+  ExpectRows(mWin->Grid(), {{0, "7700"}});
+  QenSegmentPool::Delete("Edit/Other", mList);
+}
+
 // Closing with unsaved edits asks: going back keeps the window and the edits, saving saves them.
 TEST_F(SegmentEditTest, ClosingWithUnsavedEditsAsks) {
   QTest::keyClicks(mWin->Grid(), QStringLiteral("9e"));

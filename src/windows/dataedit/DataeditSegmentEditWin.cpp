@@ -266,18 +266,22 @@ int DataeditSegmentEditWin::DeleteSegment(const Dstring& name, ConditionList& li
   return status;
 }
 
-void DataeditSegmentEditWin::closeEvent(QCloseEvent* event) {
+// The instrument forgets a segment's unsaved changes when it is closed: before the editor lets
+// go of one, the user saves them, lets them go, or stays.
+bool DataeditSegmentEditWin::ConfirmLeave(const char* doing) {
+  if (!mGrid->IsDirty()) return true;
   Dstring name;
-  ConditionList list;
-  mGrid->GetSegmentName(0, 0, name, list);
-  if (!mGrid->IsDirty()) return QWidget::closeEvent(event);
+  ConditionList ignored;
+  mGrid->GetSegmentName(0, 0, name, ignored);
   const int answer = Toolkit::Get().AskYesNoCancel(
-      Dstring::Format("The segment \"%s\" has changes that are not saved. Save them before closing?", name.c_str()));
-  if (answer == ToolkitPort::kCancel) return event->ignore();
-  if (answer == ToolkitPort::kYes) {
-    Run([this](ConditionList& l) { return mGrid->SaveSegment(0, 0, l); });
-    if (mGrid->IsDirty()) return event->ignore();
-  }
+      Dstring::Format("The segment \"%s\" has changes that are not saved. Save them before %s?", name.c_str(), doing));
+  if (answer == ToolkitPort::kCancel) return false;
+  if (answer == ToolkitPort::kYes) Run([this](ConditionList& l) { return mGrid->SaveSegment(0, 0, l); });
+  return answer == ToolkitPort::kNo || !mGrid->IsDirty();
+}
+
+void DataeditSegmentEditWin::closeEvent(QCloseEvent* event) {
+  if (!ConfirmLeave("closing")) return event->ignore();
   QWidget::closeEvent(event);
 }
 
@@ -288,6 +292,13 @@ void DataeditSegmentEditWin::HitSegmentChosen() {
   ConditionList list;
   mGrid->GetSegmentName(0, 0, open, list);
   if (open == item->text().toStdString()) return;
+  if (!ConfirmLeave("opening another")) {
+    // The list goes back to the segment still open.
+    const QSignalBlocker quiet(mSegments);
+    const QList<QListWidgetItem*> shown = mSegments->findItems(QString::fromStdString(open), Qt::MatchExactly);
+    mSegments->setCurrentItem(shown.isEmpty() ? nullptr : shown.front());
+    return;
+  }
   OpenSegment(item->text().toStdString(), list);
   BoundControl::Report(list);
 }
@@ -304,7 +315,7 @@ void DataeditSegmentEditWin::HitPButNew() {
   width->setValue(16);
   auto* coding = dialog.Add(QStringLiteral("&Coding"), new QComboBox);
   coding->addItems(Codings());
-  if (!dialog.Ask() || name->text().trimmed().isEmpty()) return;
+  if (!dialog.Ask() || name->text().trimmed().isEmpty() || !ConfirmLeave("opening the new one")) return;
   SegmentProperties properties;
   properties.name = name->text().trimmed().toStdString();
   properties.length = length->value();

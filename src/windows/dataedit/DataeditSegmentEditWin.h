@@ -48,6 +48,8 @@ class DataeditSegmentEditWin : public QWidget {
   enum class File { kImportText, kExportText, kExportVcd };
 
   void BuildMenus();
+  // False when the user keeps the segment open; `doing` ends the question ("closing").
+  bool ConfirmLeave(const char* doing);
   // Enables every command as the grid says, and puts the name and dirty mark in the title.
   void ShowState();
   // Runs a grid operation and shows what it refused.
