@@ -5,6 +5,8 @@
 #include <QLineEdit>
 #include <QMdiArea>
 #include <QMdiSubWindow>
+#include <QPushButton>
+#include <QTableWidget>
 #include <QTest>
 #include <QTreeWidget>
 #include <memory>
@@ -16,10 +18,15 @@
 #include "params/ui/QenParEd.h"
 #include "params/ui/UnitLabel.h"
 #include "windows/MainWin.h"
+#include "segments/QenSegmentDs.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/ui/SegmentGridManager.h"
 #include "windows/StateStatusBar.h"
+#include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
+#include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
 
@@ -164,4 +171,32 @@ TEST_F(MainWinTest, ALineThatWouldBreakTheLanguageIsRefusedAndListed) {
   ConditionList list;
   EXPECT_NE(cmd->SaveTranscript(QStringLiteral("/nonexistent-dir/t.txt"), list), 0);
   EXPECT_FALSE(list.IsEmpty());
+}
+
+// A block's segment opens in the segment editor from the sequence; asking again raises that window.
+TEST_F(MainWinTest, TheSequenceOpensItsSegmentsInTheSegmentEditor) {
+  SegmentProperties segment;
+  segment.name = "Seq/Shown";
+  segment.length = 64;
+  segment.width = 8;
+  unsigned created = 0;
+  ASSERT_EQ(QenSegmentPool::Create(segment, created, mList), 0) << mList.ToText();
+  auto* sequence = Open<SmseqeditWin>("smseqedit.Win");
+  ASSERT_NE(sequence, nullptr);
+  auto* button = sequence->findChild<QPushButton*>(QStringLiteral("PButOpenSegment"));
+  sequence->Table()->setCurrentCell(0, 2);
+  EXPECT_FALSE(button->isEnabled());  // a word, PAUSE
+  sequence->Table()->item(0, 2)->setText(QStringLiteral("Seq/Shown"));
+  sequence->Table()->setCurrentCell(0, 3);
+  sequence->Table()->setCurrentCell(0, 2);
+  ASSERT_TRUE(button->isEnabled());
+  const qsizetype windows = mWin->Area()->subWindowList().size();
+  QTest::mouseClick(button, Qt::LeftButton);
+  auto* editor = qobject_cast<DataeditSegmentEditWin*>(mWin->Area()->activeSubWindow()->widget());
+  ASSERT_NE(editor, nullptr);
+  EXPECT_EQ(editor->Grid()->GetSegmentDs()->GetName(), Dstring("Seq/Shown"));
+  QTest::mouseClick(button, Qt::LeftButton);
+  EXPECT_EQ(mWin->Area()->subWindowList().size(), windows + 1);
+  editor->close();
+  QenSegmentPool::Delete("Seq/Shown", mList);
 }

@@ -285,21 +285,24 @@ void DataeditSegmentEditWin::closeEvent(QCloseEvent* event) {
   QWidget::closeEvent(event);
 }
 
+int DataeditSegmentEditWin::ShowSegment(const Dstring& name, ConditionList& list) {
+  Dstring open;
+  mGrid->GetSegmentName(0, 0, open, list);
+  int status = 0;
+  if (open != name && ConfirmLeave("opening another")) status = OpenSegment(name, list);
+  // The list marks the segment open now, whichever it is.
+  mGrid->GetSegmentName(0, 0, open, list);
+  const QSignalBlocker quiet(mSegments);
+  const QList<QListWidgetItem*> shown = mSegments->findItems(QString::fromStdString(open), Qt::MatchExactly);
+  mSegments->setCurrentItem(shown.isEmpty() ? nullptr : shown.front());
+  return status;
+}
+
 void DataeditSegmentEditWin::HitSegmentChosen() {
   QListWidgetItem* item = mSegments->currentItem();
   if (item == nullptr) return;
-  Dstring open;
   ConditionList list;
-  mGrid->GetSegmentName(0, 0, open, list);
-  if (open == item->text().toStdString()) return;
-  if (!ConfirmLeave("opening another")) {
-    // The list goes back to the segment still open.
-    const QSignalBlocker quiet(mSegments);
-    const QList<QListWidgetItem*> shown = mSegments->findItems(QString::fromStdString(open), Qt::MatchExactly);
-    mSegments->setCurrentItem(shown.isEmpty() ? nullptr : shown.front());
-    return;
-  }
-  OpenSegment(item->text().toStdString(), list);
+  ShowSegment(item->text().toStdString(), list);
   BoundControl::Report(list);
 }
 

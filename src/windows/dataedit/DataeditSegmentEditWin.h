@@ -35,6 +35,9 @@ class DataeditSegmentEditWin : public QWidget {
   int ReadCatalog(ConditionList& list);
   // Opens the named segment in the grid; the one open before is let go first.
   int OpenSegment(const Dstring& name, ConditionList& list);
+  // Opens the named segment as the user asks for it: unsaved changes of the one open are
+  // saved, let go or kept (then nothing opens), and the list marks what is open.
+  int ShowSegment(const Dstring& name, ConditionList& list);
   // Makes a segment of these properties and opens it.
   int CreateSegment(const SegmentProperties& properties, ConditionList& list);
   int DeleteSegment(const Dstring& name, ConditionList& list);

@@ -13,7 +13,9 @@
 #include "sequences/CSequenceBlock.h"
 #include "sequences/CSequenceObserver.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "windows/MainWin.h"
 #include "windows/PlaceName.h"
+#include "windows/dataedit/DataeditSegmentEditWin.h"
 
 namespace {
 
@@ -66,8 +68,9 @@ int SmseqeditWin::Load(ConditionList& list) {
   auto* remove = findChild<QPushButton*>(QStringLiteral("PButDelete"));
   auto* up = findChild<QPushButton*>(QStringLiteral("PButUp"));
   auto* down = findChild<QPushButton*>(QStringLiteral("PButDown"));
+  mOpenSegment = findChild<QPushButton*>(QStringLiteral("PButOpenSegment"));
   if (mTable == nullptr || mState == nullptr || add == nullptr || remove == nullptr || up == nullptr || down == nullptr ||
-      GetSequence() == nullptr) {
+      mOpenSegment == nullptr || GetSequence() == nullptr) {
     list.Add(1, "The window resource \"smseqedit.Win\" lacks its table or buttons, or there is no sequence.");
     return 1;
   }
@@ -78,6 +81,8 @@ int SmseqeditWin::Load(ConditionList& list) {
   layout()->setContentsMargins(8, 6, 8, 6);
   setFocusProxy(mTable);
   connect(mTable, &QTableWidget::cellChanged, this, &SmseqeditWin::HitCellChanged);
+  connect(mTable, &QTableWidget::currentCellChanged, this, [this] { mOpenSegment->setEnabled(!CurrentSegment().empty()); });
+  connect(mOpenSegment, &QPushButton::clicked, this, &SmseqeditWin::HitPButOpenSegment);
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   GetSequence()->AddObserver(mObserver.get());
   const int status = GetSequence()->ReadSequence(list, 0);
@@ -189,6 +194,26 @@ int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text
 void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
   if (command(list) != 0) Rebuild();
+  BoundControl::Report(list);
+}
+
+Dstring SmseqeditWin::CurrentSegment() const {
+  const int column = mTable->currentColumn();
+  const unsigned long block = CurrentBlock();
+  if (block == 0 || column < kFirstPortColumn) return {};
+  const auto port = static_cast<unsigned long>(column - kFirstPortColumn + 1);
+  return GetSequence()->GetType(block, port) == CSequence::SEG_NAMED ? GetSequence()->GetSegment(block, port) : Dstring();
+}
+
+// The segment editor of the main window shows the segment; asking again raises the same window.
+void SmseqeditWin::HitPButOpenSegment() {
+  const Dstring name = CurrentSegment();
+  auto* main = qobject_cast<MainWin*>(window());
+  if (name.empty() || main == nullptr) return;
+  auto* editor = qobject_cast<DataeditSegmentEditWin*>(main->OpenWindow(QStringLiteral("dataedit.SegmentEditWin")));
+  if (editor == nullptr) return;
+  ConditionList list;
+  editor->ShowSegment(name, list);
   BoundControl::Report(list);
 }
 

@@ -5,9 +5,11 @@
 #include <memory>
 
 #include "support/ConditionList.h"
+#include "support/Dstring.h"
 
 class CSequence;
 class QLabel;
+class QPushButton;
 class QTableWidget;
 
 // The simple sequence editor ("smseqedit.Win"): the sequence as one list of blocks, a line each
@@ -27,6 +29,8 @@ class SmseqeditWin : public QWidget {
   QTableWidget* Table() const { return mTable; }
   // The block of the current line, 1 the first; 0 with no line.
   unsigned long CurrentBlock() const;
+  // The segment named in the current cell; empty for a word (PAUSE …) or another column.
+  Dstring CurrentSegment() const;
   // Fills the table from the model again.
   void Rebuild();
 
@@ -45,9 +49,11 @@ class SmseqeditWin : public QWidget {
   // Runs a button's command; a refusal is shown and the table filled from the model again.
   void Run(const std::function<int(ConditionList&)>& command);
   bool IsEditable() const;
+  void HitPButOpenSegment();
 
   QTableWidget* mTable = nullptr;
   QLabel* mState = nullptr;
+  QPushButton* mOpenSegment = nullptr;
   std::unique_ptr<Observer> mObserver;
   bool mFilling = false;
 };
