@@ -175,12 +175,7 @@ TEST_F(MainWinTest, ALineThatWouldBreakTheLanguageIsRefusedAndListed) {
 
 // A block's segment opens in the segment editor from the sequence; asking again raises that window.
 TEST_F(MainWinTest, TheSequenceOpensItsSegmentsInTheSegmentEditor) {
-  SegmentProperties segment;
-  segment.name = "Seq/Shown";
-  segment.length = 64;
-  segment.width = 8;
-  unsigned created = 0;
-  ASSERT_EQ(QenSegmentPool::Create(segment, created, mList), 0) << mList.ToText();
+  MakeSegment("Seq/Shown", 64, 8);
   auto* sequence = Open<SmseqeditWin>("smseqedit.Win");
   ASSERT_NE(sequence, nullptr);
   auto* button = sequence->findChild<QPushButton*>(QStringLiteral("PButOpenSegment"));

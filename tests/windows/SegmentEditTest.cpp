@@ -200,12 +200,7 @@ TEST_F(SegmentEditTest, TextExportImportsBackAndAWrongWidthIsRefused) {
 
 // Choosing another segment with unsaved edits asks too: the instrument would forget them.
 TEST_F(SegmentEditTest, OpeningAnotherSegmentWithUnsavedEditsAsks) {
-  SegmentProperties other;
-  other.name = "Edit/Other";
-  other.length = 8;
-  other.width = 4;
-  unsigned created = 0;
-  ASSERT_EQ(QenSegmentPool::Create(other, created, mList), 0) << mList.ToText();
+  MakeSegment("Edit/Other", 8, 4);
   ASSERT_EQ(mWin->ReadCatalog(mList), 0);
   QTest::keyClicks(mWin->Grid(), QStringLiteral("77"));
   QListWidget* list = mWin->SegmentList();

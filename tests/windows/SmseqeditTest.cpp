@@ -6,7 +6,6 @@
 
 #include "common/gui/GuiSimFixture.h"
 #include "segments/QenSegmentPool.h"
-#include "segments/SegmentProperties.h"
 #include "sequences/CSequence.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
@@ -61,12 +60,7 @@ TEST_F(SmseqeditTest, EditsReachTheInstrumentAndRefusalsShowWhatItHolds) {
   EXPECT_NE(written.find(",1024,"), std::string::npos) << written;
   EXPECT_NE(written.find("\"loop_me\""), std::string::npos) << written;
 
-  SegmentProperties segment;
-  segment.name = "Seq/A";
-  segment.length = 512;
-  segment.width = 1;
-  unsigned created = 0;
-  ASSERT_EQ(QenSegmentPool::Create(segment, created, mList), 0) << mList.ToText();
+  MakeSegment("Seq/A", 512, 1);
   Type(0, 2, QStringLiteral("Seq/A"));
   EXPECT_NE(Other(":SGEN:GLOB:SEQ?").find("\"Seq/A\""), std::string::npos);
   mAlerts.clear();

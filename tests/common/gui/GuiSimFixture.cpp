@@ -11,6 +11,8 @@
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "params/ui/BoundControlClasses.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/SegmentProperties.h"
 #include "windows/GridClasses.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/WidgetClassTable.h"
@@ -71,6 +73,15 @@ void GuiSimFixture::TearDown() {
   uiapp::End(list);
   Toolkit::Install(nullptr);
   WidgetClassTable::UnregisterAll();
+}
+
+void GuiSimFixture::MakeSegment(const Dstring& name, long length, long width) {
+  SegmentProperties segment;
+  segment.name = name;
+  segment.length = length;
+  segment.width = width;
+  unsigned created = 0;
+  ASSERT_EQ(QenSegmentPool::Create(segment, created, mList), 0) << mList.ToText();
 }
 
 Dstring GuiSimFixture::Other(const Dstring& rest) {

@@ -27,6 +27,8 @@ class GuiSimFixture : public testing::Test {
   void Control(const Dstring& cmd);
   // One tick of the poll as the alarm and then the main loop run it.
   void Poll();
+  // A saved segment of coding "01" on the instrument, made through the segment pool.
+  void MakeSegment(const Dstring& name, long length, long width);
 
   static inline SimProcess* sSim = nullptr;
   static inline Dstring sDataDir;
