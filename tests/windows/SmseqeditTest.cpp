@@ -2,6 +2,7 @@
 
 #include <QCoreApplication>
 #include <QTableWidget>
+#include <QTest>
 #include <memory>
 
 #include "common/gui/GuiSimFixture.h"
@@ -16,6 +17,9 @@ class SmseqeditTest : public GuiSimFixture {
  protected:
   void SetUp() override {
     GuiSimFixture::SetUp();
+    // Every test starts from the sequence qensim starts with: one qensim serves the suite.
+    static const Dstring initial = Other(":SGEN:GLOB:SEQ?");
+    Other(":SGEN:GLOB:SEQ " + initial);
     Poll();
     mWin = std::make_unique<SmseqeditWin>();
     ASSERT_EQ(mWin->Load(mList), 0) << mList.ToText();
@@ -89,12 +93,30 @@ TEST_F(SmseqeditTest, EditsReachTheInstrumentAndRefusalsShowWhatItHolds) {
   QenSegmentPool::Delete("Seq/A", mList);
 }
 
+// Whole blocks are cut, copied and pasted on the table's keys.
+TEST_F(SmseqeditTest, BlocksAreCopiedCutAndPasted) {
+  Type(0, 1, QStringLiteral("777"));
+  mWin->Table()->setCurrentCell(0, 0);
+  mWin->Table()->setFocus();
+  QTest::keyClick(mWin->Table(), Qt::Key_C, Qt::ControlModifier);
+  QTest::keyClick(mWin->Table(), Qt::Key_V, Qt::ControlModifier);
+  ASSERT_EQ(mWin->Table()->rowCount(), 2);
+  EXPECT_EQ(Cell(1, 1), QStringLiteral("777"));
+  Type(1, 1, QStringLiteral("888"));
+  mWin->Table()->setCurrentCell(0, 0);
+  QTest::keyClick(mWin->Table(), Qt::Key_X, Qt::ControlModifier);
+  ASSERT_EQ(mWin->Table()->rowCount(), 1);
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("888"));
+  EXPECT_EQ(Count(Other(":SGEN:GLOB:SEQ?"), "(BLOCK,"), 1);
+}
+
 // Another client's change reaches the table within the poll.
 TEST_F(SmseqeditTest, AnotherClientsChangeIsShown) {
   Dstring text = Other(":SGEN:GLOB:SEQ?");
-  const std::size_t at = text.find(",512,");
+  const std::string length = "," + Cell(0, 1).toStdString() + ",";
+  const std::size_t at = text.find(length);
   ASSERT_NE(at, std::string::npos) << text;
-  text.replace(at, 5, ",4096,");
+  text.replace(at, length.size(), ",4096,");
   Other(":SGEN:GLOB:SEQ " + text);
   for (int i = 0; i < 20 && Cell(0, 1) != QStringLiteral("4096"); ++i) Poll();
   EXPECT_EQ(Cell(0, 1), QStringLiteral("4096"));

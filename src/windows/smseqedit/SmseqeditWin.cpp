@@ -1,5 +1,6 @@
 #include "windows/smseqedit/SmseqeditWin.h"
 
+#include <QAction>
 #include <QHeaderView>
 #include <QLabel>
 #include <QLayout>
@@ -83,6 +84,7 @@ int SmseqeditWin::Load(ConditionList& list) {
   connect(mTable, &QTableWidget::cellChanged, this, &SmseqeditWin::HitCellChanged);
   connect(mTable, &QTableWidget::currentCellChanged, this, [this] { mOpenSegment->setEnabled(!CurrentSegment().empty()); });
   connect(mOpenSegment, &QPushButton::clicked, this, &SmseqeditWin::HitPButOpenSegment);
+  AddBlockActions();
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   GetSequence()->AddObserver(mObserver.get());
   const int status = GetSequence()->ReadSequence(list, 0);
@@ -195,6 +197,35 @@ void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
   if (command(list) != 0) Rebuild();
   BoundControl::Report(list);
+}
+
+// Cut, copy and paste of whole blocks, on the table's keys and its context menu; the keys are
+// the table's own, so a cell being edited keeps them for its text.
+void SmseqeditWin::AddBlockActions() {
+  struct Entry {
+    const char* name;
+    const char* text;
+    QKeySequence key;
+    std::function<int(CSequence&, unsigned long, ConditionList&)> run;
+  };
+  const Entry entries[] = {
+      {"CutBlock", "Cu&t Block", QKeySequence::Cut, [](CSequence& s, unsigned long b, ConditionList& l) { return s.CutBlock(b, l); }},
+      {"CopyBlock", "&Copy Block", QKeySequence::Copy, [](CSequence& s, unsigned long b, ConditionList& l) { return s.CopyBlock(b, l); }},
+      {"PasteBlock", "&Paste Block After", QKeySequence::Paste,
+       [](CSequence& s, unsigned long b, ConditionList& l) { return s.PasteBlockAfter(b, l); }},
+  };
+  for (const Entry& e : entries) {
+    auto* action = new QAction(QString::fromUtf8(e.text), mTable);
+    action->setObjectName(QLatin1String(e.name));
+    action->setShortcut(e.key);
+    action->setShortcutContext(Qt::WidgetShortcut);
+    mTable->addAction(action);
+    connect(action, &QAction::triggered, this, [this, run = e.run] {
+      if (!IsEditable()) return;
+      Run([this, &run](ConditionList& l) { return CurrentBlock() == 0 ? 0 : run(*GetSequence(), CurrentBlock(), l); });
+    });
+  }
+  mTable->setContextMenuPolicy(Qt::ActionsContextMenu);
 }
 
 Dstring SmseqeditWin::CurrentSegment() const {

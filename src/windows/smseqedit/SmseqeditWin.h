@@ -49,6 +49,7 @@ class SmseqeditWin : public QWidget {
   // Runs a button's command; a refusal is shown and the table filled from the model again.
   void Run(const std::function<int(ConditionList&)>& command);
   bool IsEditable() const;
+  void AddBlockActions();
   void HitPButOpenSegment();
 
   QTableWidget* mTable = nullptr;
