@@ -110,6 +110,30 @@ TEST_F(SmseqeditTest, BlocksAreCopiedCutAndPasted) {
   EXPECT_EQ(Count(Other(":SGEN:GLOB:SEQ?"), "(BLOCK,"), 1);
 }
 
+// A step is taken back and done again on the instrument; another client's change forgets the steps.
+TEST_F(SmseqeditTest, StepsAreUndoneAndRedone) {
+  Type(0, 1, QStringLiteral("1000"));
+  Type(0, 0, QStringLiteral("first"));
+  mWin->Table()->setFocus();
+  QTest::keyClick(mWin->Table(), Qt::Key_Z, Qt::ControlModifier);
+  EXPECT_EQ(Cell(0, 0), QString());
+  EXPECT_EQ(Other(":SGEN:GLOB:SEQ?").find("first"), std::string::npos);
+  QTest::keyClick(mWin->Table(), Qt::Key_Z, Qt::ControlModifier);
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("512"));
+  EXPECT_EQ(Other(":SGEN:GLOB:SEQ?").find(",1000,"), std::string::npos);
+  QTest::keyClick(mWin->Table(), Qt::Key_Z, Qt::ControlModifier | Qt::ShiftModifier);
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("1000"));
+  EXPECT_NE(Other(":SGEN:GLOB:SEQ?").find(",1000,"), std::string::npos);
+  ASSERT_TRUE(mWin->CanUndo());
+
+  Dstring text = Other(":SGEN:GLOB:SEQ?");
+  text.replace(text.find(",1000,"), 6, ",2000,");
+  Other(":SGEN:GLOB:SEQ " + text);
+  for (int i = 0; i < 20 && Cell(0, 1) != QStringLiteral("2000"); ++i) Poll();
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("2000"));
+  EXPECT_FALSE(mWin->CanUndo());
+}
+
 // Another client's change reaches the table within the poll.
 TEST_F(SmseqeditTest, AnotherClientsChangeIsShown) {
   Dstring text = Other(":SGEN:GLOB:SEQ?");

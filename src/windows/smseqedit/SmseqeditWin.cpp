@@ -45,6 +45,8 @@ class SmseqeditWin::Observer : public CSequenceObserver {
 
  private:
   int Changed() {
+    // Another client's change makes the steps back meaningless: they would undo it too.
+    if (!mWin.mEditing) mWin.ForgetSteps();
     mWin.Rebuild();
     return 0;
   }
@@ -160,11 +162,8 @@ void SmseqeditWin::Rebuild() {
 
 void SmseqeditWin::HitCellChanged(int row, int column) {
   if (mFilling || row < 0) return;
-  ConditionList list;
-  if (ApplyCell(static_cast<unsigned long>(row) + 1, column, mTable->item(row, column)->text().trimmed(), list) != 0) {
-    Rebuild();
-  }
-  BoundControl::Report(list);
+  const QString text = mTable->item(row, column)->text().trimmed();
+  Run([this, row, column, &text](ConditionList& l) { return ApplyCell(static_cast<unsigned long>(row) + 1, column, text, l); });
 }
 
 int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list) {
@@ -195,8 +194,44 @@ int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text
 
 void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
-  if (command(list) != 0) Rebuild();
+  const Dstring before = GetSequence()->GetLastExpression();
+  mEditing = true;
+  const int status = command(list);
+  mEditing = false;
+  // A step that changed what the instrument holds can be taken back.
+  if (status == 0 && GetSequence()->GetLastExpression() != before && !before.empty()) {
+    mUndo.push_back(before);
+    if (mUndo.size() > kMaxSteps) mUndo.erase(mUndo.begin());
+    mRedo.clear();
+  }
+  if (status != 0) Rebuild();
   BoundControl::Report(list);
+}
+
+int SmseqeditWin::Undo(ConditionList& list) { return Step(mUndo, mRedo, list); }
+int SmseqeditWin::Redo(ConditionList& list) { return Step(mRedo, mUndo, list); }
+
+// The sequence as it was is written whole and read back; the text it replaces goes on the
+// other stack.
+int SmseqeditWin::Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& list) {
+  if (from.empty() || !IsEditable()) return 0;
+  CSequence* sequence = GetSequence();
+  const Dstring now = sequence->GetLastExpression();
+  mEditing = true;
+  int status = sequence->fromExpression(from.back(), list);
+  if (status == 0) status = sequence->WriteSequence(list);
+  mEditing = false;
+  if (status == 0) {
+    from.pop_back();
+    to.push_back(now);
+  }
+  Rebuild();
+  return status;
+}
+
+void SmseqeditWin::ForgetSteps() {
+  mUndo.clear();
+  mRedo.clear();
 }
 
 // Cut, copy and paste of whole blocks, on the table's keys and its context menu; the keys are
@@ -214,6 +249,21 @@ void SmseqeditWin::AddBlockActions() {
       {"PasteBlock", "&Paste Block After", QKeySequence::Paste,
        [](CSequence& s, unsigned long b, ConditionList& l) { return s.PasteBlockAfter(b, l); }},
   };
+  const bool undo[] = {true, false};
+  for (const bool back : undo) {
+    int (SmseqeditWin::*step)(ConditionList&) = back ? &SmseqeditWin::Undo : &SmseqeditWin::Redo;
+    auto* action = new QAction(back ? QStringLiteral("&Undo") : QStringLiteral("&Redo"), mTable);
+    action->setObjectName(back ? QStringLiteral("Undo") : QStringLiteral("Redo"));
+    // Every key the platform has for it (Redo is Ctrl+Shift+Z and Ctrl+Y).
+    action->setShortcuts(back ? QKeySequence::Undo : QKeySequence::Redo);
+    action->setShortcutContext(Qt::WidgetShortcut);
+    mTable->addAction(action);
+    connect(action, &QAction::triggered, this, [this, step = step] {
+      ConditionList l;
+      (this->*step)(l);
+      BoundControl::Report(l);
+    });
+  }
   for (const Entry& e : entries) {
     auto* action = new QAction(QString::fromUtf8(e.text), mTable);
     action->setObjectName(QLatin1String(e.name));

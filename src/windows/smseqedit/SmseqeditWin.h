@@ -3,6 +3,7 @@
 #include <QWidget>
 #include <functional>
 #include <memory>
+#include <vector>
 
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
@@ -38,10 +39,16 @@ class SmseqeditWin : public QWidget {
   int AddBlock(ConditionList& list);
   int DeleteBlock(ConditionList& list);
   int MoveBlock(long distance, ConditionList& list);
+  // Takes back the last step of this window (Ctrl+Z), or does it again (Ctrl+Shift+Z). Steps
+  // are forgotten when another client changes the sequence.
+  int Undo(ConditionList& list);
+  int Redo(ConditionList& list);
+  bool CanUndo() const { return !mUndo.empty(); }
 
  private:
   class Observer;
   static constexpr int kFirstPortColumn = 2;
+  static constexpr std::size_t kMaxSteps = 50;
 
   // An edited cell goes to the model; a refusal is shown and the line put back.
   void HitCellChanged(int row, int column);
@@ -50,6 +57,8 @@ class SmseqeditWin : public QWidget {
   void Run(const std::function<int(ConditionList&)>& command);
   bool IsEditable() const;
   void AddBlockActions();
+  int Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& list);
+  void ForgetSteps();
   void HitPButOpenSegment();
 
   QTableWidget* mTable = nullptr;
@@ -57,4 +66,7 @@ class SmseqeditWin : public QWidget {
   QPushButton* mOpenSegment = nullptr;
   std::unique_ptr<Observer> mObserver;
   bool mFilling = false;
+  bool mEditing = false;
+  std::vector<Dstring> mUndo;
+  std::vector<Dstring> mRedo;
 };
