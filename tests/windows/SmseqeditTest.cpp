@@ -134,6 +134,17 @@ TEST_F(SmseqeditTest, StepsAreUndoneAndRedone) {
   EXPECT_FALSE(mWin->CanUndo());
 }
 
+// Under another client's lock an edit reaches nothing, and the cell shows the instrument's value.
+TEST_F(SmseqeditTest, AnEditUnderALockLeavesTheSequence) {
+  const Dstring before = Other(":SGEN:GLOB:SEQ?");
+  Control(":TEST:LOCK ON");
+  Type(0, 1, QStringLiteral("1111"));
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("512"));
+  Control(":TEST:LOCK OFF");
+  EXPECT_EQ(Other(":SGEN:GLOB:SEQ?"), before);
+  EXPECT_FALSE(mWin->CanUndo());
+}
+
 // Another client's change reaches the table within the poll.
 TEST_F(SmseqeditTest, AnotherClientsChangeIsShown) {
   Dstring text = Other(":SGEN:GLOB:SEQ?");
