@@ -87,8 +87,8 @@ int SegmentGridManager::HookOn(long, long, const Dstring& segment, ConditionList
     mBuffer = nullptr;
     return status;
   }
+  // Reading the dimensions also moves the buffer over the lines shown.
   status = ReadDimensions(list);
-  if (status == 0) status = CoverShown(list);
   // The cursor starts on the first vector's most significant digit, where typing reads left to right.
   mCursorVector = 0;
   mCursorDigit = std::max(0L, mDigits - 1);

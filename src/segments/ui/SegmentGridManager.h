@@ -152,8 +152,6 @@ class SegmentGridManager : public GridManager {
   int CoverShown(ConditionList& list);
   void MoveCursor(long vector, long digit, bool extend);
   void TypeDigit(char digit);
-  // Runs a command that changes the segment and shows the outcome; refusals go to the dialog.
-  int Report(int status, ConditionList& list);
 
   QenSegmentDs* mDs = nullptr;
   SegmentBuffer* mBuffer = nullptr;

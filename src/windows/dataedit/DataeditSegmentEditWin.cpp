@@ -227,15 +227,22 @@ void DataeditSegmentEditWin::Run(const std::function<int(ConditionList&)>& opera
 int DataeditSegmentEditWin::ReadCatalog(ConditionList& list) {
   std::vector<Dstring> names;
   if (int status = QenSegmentPool::Catalog(names, list)) return status;
-  Dstring open;
-  mGrid->GetSegmentName(0, 0, open, list);
-  const QSignalBlocker quiet(mSegments);
-  mSegments->clear();
-  for (const Dstring& name : names) {
-    auto* item = new QListWidgetItem(QString::fromStdString(name), mSegments);
-    if (name == open) mSegments->setCurrentItem(item);
+  {
+    const QSignalBlocker quiet(mSegments);
+    mSegments->clear();
+    for (const Dstring& name : names) new QListWidgetItem(QString::fromStdString(name), mSegments);
   }
+  MarkOpen();
   return 0;
+}
+
+void DataeditSegmentEditWin::MarkOpen() {
+  Dstring open;
+  ConditionList ignored;
+  mGrid->GetSegmentName(0, 0, open, ignored);
+  const QSignalBlocker quiet(mSegments);
+  const QList<QListWidgetItem*> shown = mSegments->findItems(QString::fromStdString(open), Qt::MatchExactly);
+  mSegments->setCurrentItem(shown.isEmpty() ? nullptr : shown.front());
 }
 
 int DataeditSegmentEditWin::OpenSegment(const Dstring& name, ConditionList& list) {
@@ -248,8 +255,8 @@ int DataeditSegmentEditWin::OpenSegment(const Dstring& name, ConditionList& list
 int DataeditSegmentEditWin::CreateSegment(const SegmentProperties& properties, ConditionList& list) {
   unsigned created = 0;
   if (int status = QenSegmentPool::Create(properties, created, list)) return status;
-  if (int status = ReadCatalog(list)) return status;
   const int status = OpenSegment(properties.name, list);
+  // The list gains the new segment and marks it open.
   ReadCatalog(list);
   return status;
 }
@@ -291,10 +298,7 @@ int DataeditSegmentEditWin::ShowSegment(const Dstring& name, ConditionList& list
   int status = 0;
   if (open != name && ConfirmLeave("opening another")) status = OpenSegment(name, list);
   // The list marks the segment open now, whichever it is.
-  mGrid->GetSegmentName(0, 0, open, list);
-  const QSignalBlocker quiet(mSegments);
-  const QList<QListWidgetItem*> shown = mSegments->findItems(QString::fromStdString(open), Qt::MatchExactly);
-  mSegments->setCurrentItem(shown.isEmpty() ? nullptr : shown.front());
+  MarkOpen();
   return status;
 }
 

@@ -53,6 +53,8 @@ class DataeditSegmentEditWin : public QWidget {
   void BuildMenus();
   // False when the user keeps the segment open; `doing` ends the question ("closing").
   bool ConfirmLeave(const char* doing);
+  // Makes the open segment the list's current line, or none.
+  void MarkOpen();
   // Enables every command as the grid says, and puts the name and dirty mark in the title.
   void ShowState();
   // Runs a grid operation and shows what it refused.

@@ -6,6 +6,7 @@
 #include <QLayout>
 #include <QPushButton>
 #include <QTableWidget>
+#include <QTimer>
 
 #include "params/ui/BoundControl.h"
 #include "segments/QenSegmentPool.h"
@@ -31,7 +32,7 @@ CSequence::SeqSegType KindOf(const QString& text) {
 
 }  // namespace
 
-// Every report of a read ends in the same table: it is filled again once the model is told.
+// Every report of a read ends in the same table: it is filled again once, after the read.
 class SmseqeditWin::Observer : public CSequenceObserver {
  public:
   explicit Observer(SmseqeditWin& win) : mWin(win) {}
@@ -47,7 +48,7 @@ class SmseqeditWin::Observer : public CSequenceObserver {
   int Changed() {
     // Another client's change makes the steps back meaningless: they would undo it too.
     if (!mWin.mEditing) mWin.ForgetSteps();
-    mWin.Rebuild();
+    mWin.MarkStale();
     return 0;
   }
   SmseqeditWin& mWin;
@@ -100,8 +101,18 @@ unsigned long SmseqeditWin::CurrentBlock() const {
   return mTable->currentRow() < 0 ? 0 : static_cast<unsigned long>(mTable->currentRow()) + 1;
 }
 
+// A read may report many changes; the table is filled once, after the event that read.
+void SmseqeditWin::MarkStale() {
+  if (mStale) return;
+  mStale = true;
+  QTimer::singleShot(0, this, [this] {
+    if (mStale) Rebuild();
+  });
+}
+
 void SmseqeditWin::Rebuild() {
   const CSequence* sequence = GetSequence();
+  mStale = false;
   if (sequence == nullptr || mTable == nullptr) return;
   mFilling = true;
   const int current = mTable->currentRow();
@@ -204,7 +215,8 @@ void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
     if (mUndo.size() > kMaxSteps) mUndo.erase(mUndo.begin());
     mRedo.clear();
   }
-  if (status != 0) Rebuild();
+  // A refusal shows what the instrument holds; a step shows what it holds now.
+  if (status != 0 || mStale) Rebuild();
   BoundControl::Report(list);
 }
 

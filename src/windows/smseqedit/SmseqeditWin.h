@@ -35,10 +35,6 @@ class SmseqeditWin : public QWidget {
   // Fills the table from the model again.
   void Rebuild();
 
-  // The buttons' commands on the current block.
-  int AddBlock(ConditionList& list);
-  int DeleteBlock(ConditionList& list);
-  int MoveBlock(long distance, ConditionList& list);
   // Takes back the last step of this window (Ctrl+Z), or does it again (Ctrl+Shift+Z). Steps
   // are forgotten when another client changes the sequence.
   int Undo(ConditionList& list);
@@ -56,6 +52,11 @@ class SmseqeditWin : public QWidget {
   // Runs a button's command; a refusal is shown and the table filled from the model again.
   void Run(const std::function<int(ConditionList&)>& command);
   bool IsEditable() const;
+  // The buttons' commands on the current block.
+  int AddBlock(ConditionList& list);
+  int DeleteBlock(ConditionList& list);
+  int MoveBlock(long distance, ConditionList& list);
+  void MarkStale();
   void AddBlockActions();
   int Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& list);
   void ForgetSteps();
@@ -67,6 +68,7 @@ class SmseqeditWin : public QWidget {
   std::unique_ptr<Observer> mObserver;
   bool mFilling = false;
   bool mEditing = false;
+  bool mStale = false;
   std::vector<Dstring> mUndo;
   std::vector<Dstring> mRedo;
 };
