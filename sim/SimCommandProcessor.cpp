@@ -10,7 +10,9 @@
 #include "SimSettingStore.h"
 
 #include <cctype>
+#include <chrono>
 #include <climits>
+#include <thread>
 
 #include "support/ConditionList.h"
 #include "support/ParserExpression.h"
@@ -27,7 +29,7 @@ constexpr ErrorText kErrorTexts[] = {
     {-113, "Undefined header"},        {-200, "Execution error"}, {-221, "Settings conflict"},
     {-222, "Data out of range"},
     {-224, "Illegal parameter value"}, {-250, "Mass storage error"}, {-256, "File name not found"},
-    {-257, "File name error"},
+    {-257, "File name error"}, {SimContext::kCancelled, "Cancelled by the client"},
 };
 
 struct SwitchWord {
@@ -143,8 +145,9 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
   mModules.push_back(std::make_shared<SimChannelErrors>(ber, capture));
 }
 
-SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {
+SimReply SimCommandProcessor::Execute(int connection, std::string_view text, SimWorkListener* listener) {
   ResetFrame(connection);
+  mListener = listener;
   NoteStates(mGlobal.Advance(mClock.NowMs()), "");
   for (auto& module : mModules) module->Advance(*this);
   if (IsRefused(text)) return SimReply{"", -19, SimReplyAction::Send, 0};
@@ -159,7 +162,14 @@ SimReply SimCommandProcessor::Execute(int connection, std::string_view text) {
     RunBatch(text);
     RecordBatch(Dstring(text));
   }
+  mListener = nullptr;
   return FinishFrame(delayMs);
+}
+
+bool SimCommandProcessor::Step(long long done, long long total, int waitMs) {
+  if (mListener) return mListener->Step(done, total, waitMs);
+  if (waitMs > 0) std::this_thread::sleep_for(std::chrono::milliseconds(waitMs));
+  return true;
 }
 
 void SimCommandProcessor::Disconnect(int connection) {

@@ -17,6 +17,7 @@
 #include "SimParamTable.h"
 #include "SimReply.h"
 #include "SimSession.h"
+#include "SimWorkListener.h"
 #include "support/DataParcel.h"
 
 // The instrument's state and command language, without sockets: runs the command text of one
@@ -27,7 +28,8 @@ class SimCommandProcessor : public SimContext {
   // `dataDir` is where the modules keep their files (segments, settings); empty for none.
   SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl, Dstring dataDir = {});
 
-  SimReply Execute(int connection, std::string_view text);
+  // `listener`: the client follows long work (progress, cancel); null when it does not.
+  SimReply Execute(int connection, std::string_view text, SimWorkListener* listener = nullptr);
   // The connection has gone: its handles die and its lock is released.
   void Disconnect(int connection);
   // Frames of only queries from this connection run while another one holds the lock (a
@@ -47,6 +49,8 @@ class SimCommandProcessor : public SimContext {
   // Every handle is told that everything changed (after a whole setting is replaced).
   void MarkAllDirty() override;
   bool TestControl() const override { return mTestControl; }
+  bool Step(long long done, long long total, int waitMs) override;
+  bool IsFollowed() const override { return mListener != nullptr; }
 
  private:
   using Handler = void (SimCommandProcessor::*)(const SimCommand&);
@@ -126,6 +130,7 @@ class SimCommandProcessor : public SimContext {
   bool mDryRun = false;
   const SimClock& mClock;
   bool mTestControl;
+  SimWorkListener* mListener = nullptr;
   SimGlobalState mGlobal;
   std::map<Dstring, SimHandle> mHandles;
   std::map<int, SimSession> mSessions;

@@ -29,4 +29,11 @@ class SimContext {
   virtual void MarkAllDirty() = 0;
   // Whether the fault injection commands are on (--test-control).
   virtual bool TestControl() const = 0;
+  // Long work reports a step (done of total) that took `waitMs`; false when the client
+  // cancelled: the work puts back what it changed and ends with kCancelled.
+  virtual bool Step(long long done, long long total, int waitMs) = 0;
+  // Whether a client follows the command, so that it can be cancelled at all.
+  virtual bool IsFollowed() const = 0;
+  // The error a cancelled command ends with.
+  static constexpr int kCancelled = 301;
 };

@@ -18,15 +18,20 @@ bool Matches(char state, char bit) {
   return states.find(state) != std::string_view::npos;
 }
 
+constexpr long kNotFound = -1;
+constexpr long kStopped = -2;
+
 // Walks the positions 0 .. total-1 in the search order and gives the first that `hit` accepts.
-long Walk(long total, const Dstring& direction, long start, const std::function<bool(long)>& hit) {
-  if (total <= 0) return -1;
+long Walk(long total, const Dstring& direction, long start, const std::function<bool(long)>& hit,
+          const SimSegmentSearch::Step& progress) {
+  if (total <= 0) return kNotFound;
   start = std::clamp(start, 0L, total - 1);
   for (long step = 0; step < total; ++step) {
     long at = step;
     if (direction == "NEXT") at = (start + 1 + step) % total;
     if (direction == "PREV") at = ((start - 1 - step) % total + total) % total;
     if (hit(at)) return at;
+    if ((step + 1) % SimSegmentSearch::kStep == 0 && !progress(step + 1, total)) return kStopped;
   }
   return -1;
 }
@@ -50,9 +55,9 @@ bool SimSegmentSearch::ParsePattern(const Dstring& text, Dstring& bits) {
   return true;
 }
 
-void SimSegmentSearch::Find(const SimSegment& segment, const Dstring& bits, bool alongTraces,
+bool SimSegmentSearch::Find(const SimSegment& segment, const Dstring& bits, bool alongTraces,
                             const Dstring& direction, long trace, long vector, long& foundTrace,
-                            long& foundVector) {
+                            long& foundVector, const Step& step) {
   const long width = segment.GetWidth(), length = segment.GetLength();
   const long n = static_cast<long>(bits.size());
   const long inner = alongTraces ? length : width;
@@ -71,22 +76,26 @@ void SimSegmentSearch::Find(const SimSegment& segment, const Dstring& bits, bool
     return true;
   };
   const long start = alongTraces ? trace * inner + vector : vector * inner + trace;
-  const long at = Walk(width * length, direction, start, hit);
+  const long at = Walk(width * length, direction, start, hit, step);
   foundTrace = foundVector = -1;
   if (at >= 0) position(at, foundTrace, foundVector);
+  return at != kStopped;
 }
 
-void SimSegmentSearch::FindError(const SimSegment& segment, const Dstring& direction, long trace, long vector,
-                                 long& foundTrace, long& foundVector) {
+bool SimSegmentSearch::FindError(const SimSegment& segment, const Dstring& direction, long trace, long vector,
+                                 long& foundTrace, long& foundVector, const Step& step) {
   const long width = segment.GetWidth();
   foundTrace = foundVector = -1;
   if (segment.GetCoding().find_first_of(kErroredStates.data(), 0, kErroredStates.size()) == Dstring::npos)
-    return;
+    return true;
   auto hit = [&](long at) {
     return kErroredStates.find(segment.StateAt(at % width, at / width)) != std::string_view::npos;
   };
-  const long at = Walk(width * segment.GetLength(), direction, vector * width + trace, hit);
-  if (at < 0) return;
-  foundTrace = at % width;
-  foundVector = at / width;
+  const long at = Walk(width * segment.GetLength(), direction, vector * width + trace, hit, step);
+  if (at == kStopped) return false;
+  if (at >= 0) {
+    foundTrace = at % width;
+    foundVector = at / width;
+  }
+  return true;
 }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <functional>
+
 #include "SimSegment.h"
 #include "support/Dstring.h"
 
@@ -9,6 +11,10 @@
 // beginning.
 class SimSegmentSearch {
  public:
+  // Told how many positions of how many were looked at, every so many; false stops the search.
+  using Step = std::function<bool(long long done, long long total)>;
+  static constexpr long kStep = 1L << 20;
+
   // A pattern as written on the wire: digits with the radix suffix "H" (hexadecimal), "O"
   // (octal) or none (binary), "X" digits standing for don't-care bits. `bits` gets '0', '1'
   // or 'x' per bit, most significant first. False for anything else.
@@ -18,9 +24,10 @@ class SimSegmentSearch {
   // trace + n - 1 of one vector, its lowest bit on the lowest trace, and positions go vector
   // by vector. Along traces it is a run in time on one trace, its first bit first, and
   // positions go trace by trace. A don't-care state ("X") matches any bit.
-  static void Find(const SimSegment& segment, const Dstring& bits, bool alongTraces, const Dstring& direction,
-                   long trace, long vector, long& foundTrace, long& foundVector);
+  // Both searches give false when `step` stopped them.
+  static bool Find(const SimSegment& segment, const Dstring& bits, bool alongTraces, const Dstring& direction,
+                   long trace, long vector, long& foundTrace, long& foundVector, const Step& step);
   // The errored states ('k' and 'r', either case) of an analyser segment, vector by vector.
-  static void FindError(const SimSegment& segment, const Dstring& direction, long trace, long vector,
-                        long& foundTrace, long& foundVector);
+  static bool FindError(const SimSegment& segment, const Dstring& direction, long trace, long vector,
+                        long& foundTrace, long& foundVector, const Step& step);
 };

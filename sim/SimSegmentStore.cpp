@@ -8,6 +8,7 @@
 #include "SimReply.h"
 #include "SimSegmentFile.h"
 #include "SimSegmentSearch.h"
+#include "SimSegmentWork.h"
 #include "support/LispList.h"
 #include "support/ParserExpression.h"
 
@@ -44,6 +45,7 @@ const SimSegmentStore::StoreEntry SimSegmentStore::kStoreCommands[] = {
     {":EDIT:SEGM:CRE", &SimSegmentStore::Create, nullptr},
     {":EDIT:SEGM:EXIS", &SimSegmentStore::Exists, nullptr},
     {":EDIT:SEGM:CAT", &SimSegmentStore::Catalog, nullptr},
+    {":EDIT:SEGM:PACE", nullptr, &SimSegmentStore::Pace},
     {":EDIT:SEGM:DEL", nullptr, &SimSegmentStore::Delete},
     {":EDIT:SEGM:PATT:CLIP", &SimSegmentStore::ClipFilled, nullptr},
     {":EDIT:SEGM:PATT:CLIP:WIDT", &SimSegmentStore::ClipWidth, nullptr},
@@ -258,6 +260,14 @@ int SimSegmentStore::Catalog(const SimCommand&, SimContext& context) {
   return 0;
 }
 
+int SimSegmentStore::Pace(const SimCommand& cmd, SimContext& context) {
+  if (!context.TestControl()) return -113;
+  long ms = 0;
+  if (!cmd.GetArgs().ToLong(ms) || ms < 0 || ms > 60000) return -222;
+  mPaceMs = static_cast<int>(ms);
+  return 0;
+}
+
 int SimSegmentStore::Delete(const SimCommand& cmd, SimContext&) {
   Dstring name;
   std::filesystem::path path;
@@ -400,20 +410,20 @@ int SimSegmentStore::WriteData(unsigned, SimSegment& segment, const SimCommand& 
   return segment.WriteBlock(range[0], range[1], range[2], range[3], items[4].GetText());
 }
 
-int SimSegmentStore::Fill(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext&) {
+int SimSegmentStore::Fill(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext& context) {
   DataParcel items;
   long v[5];
   if (int rc = Args(cmd, items, 5, 5)) return rc;
   if (int rc = Longs(items, 0, 5, v)) return rc;
-  return segment.Fill(v[0], v[1], v[2], v[3], v[4]);
+  return SimSegmentWork(context, mPaceMs).Fill(segment, v[0], v[1], v[2], v[3], v[4]);
 }
 
-int SimSegmentStore::Invert(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext&) {
+int SimSegmentStore::Invert(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext& context) {
   DataParcel items;
   long v[4];
   if (int rc = Args(cmd, items, 4, 4)) return rc;
   if (int rc = Longs(items, 0, 4, v)) return rc;
-  return segment.Invert(v[0], v[1], v[2], v[3]);
+  return SimSegmentWork(context, mPaceMs).Invert(segment, v[0], v[1], v[2], v[3]);
 }
 
 int SimSegmentStore::Mirror(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext&) {
@@ -445,7 +455,7 @@ int SimSegmentStore::Paste(unsigned, SimSegment& segment, const SimCommand& cmd,
 }
 
 // position, VECT|TRAC, BEF|AFT, count
-int SimSegmentStore::Insert(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext&) {
+int SimSegmentStore::Insert(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext& context) {
   DataParcel items;
   long position = 0, count = 0;
   if (int rc = Args(cmd, items, 4, 4)) return rc;
@@ -453,7 +463,7 @@ int SimSegmentStore::Insert(unsigned, SimSegment& segment, const SimCommand& cmd
   if (int rc = Longs(items, 3, 1, &count)) return rc;
   const Dstring which = WordAt(items, 1), mode = WordAt(items, 2);
   if ((which != "VECT" && which != "TRAC") || (mode != "BEF" && mode != "AFT")) return -224;
-  return segment.Insert(position, which == "VECT", mode == "AFT", count);
+  return SimSegmentWork(context, mPaceMs).Insert(segment, position, which == "VECT", mode == "AFT", count);
 }
 
 // position, VECT|TRAC, count[, NORM|CLR]
@@ -505,7 +515,10 @@ int SimSegmentStore::Find(const SimSegment& segment, const SimCommand& cmd, cons
   if (!SimSegmentSearch::ParsePattern(Dstring(items[at].GetText()), bits)) return -224;
   if ((which != "VECT" && which != "TRAC") || WordAt(items, at + 2) != "RVS") return -224;
   long trace = -1, vector = -1;
-  SimSegmentSearch::Find(segment, bits, which == "TRAC", direction, start[0], start[1], trace, vector);
+  SimSegmentWork work(context, mPaceMs);
+  const auto step = [&work](long long done, long long total) { return work.Step(done, total); };
+  if (!SimSegmentSearch::Find(segment, bits, which == "TRAC", direction, start[0], start[1], trace, vector, step))
+    return SimContext::kCancelled;
   context.Reply(Position(trace, vector));
   return 0;
 }
@@ -532,7 +545,10 @@ int SimSegmentStore::FindErrorFrom(const SimSegment& segment, const SimCommand& 
   if (int rc = Longs(items, 0, at, start)) return rc;
   if (WordAt(items, at) != "RVS") return -224;
   long trace = -1, vector = -1;
-  SimSegmentSearch::FindError(segment, direction, start[0], start[1], trace, vector);
+  SimSegmentWork work(context, mPaceMs);
+  const auto step = [&work](long long done, long long total) { return work.Step(done, total); };
+  if (!SimSegmentSearch::FindError(segment, direction, start[0], start[1], trace, vector, step))
+    return SimContext::kCancelled;
   context.Reply(Position(trace, vector));
   return 0;
 }

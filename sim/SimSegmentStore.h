@@ -66,6 +66,8 @@ class SimSegmentStore : public SimCommandModule {
   int Delete(const SimCommand& cmd, SimContext& context);
   int FileInfo(const SimCommand& cmd, SimContext& context);
   int ClipFilled(const SimCommand& cmd, SimContext& context);
+  // (test control) The time each step of long work takes.
+  int Pace(const SimCommand& cmd, SimContext& context);
   int ClipWidth(const SimCommand& cmd, SimContext& context);
   int ClipLength(const SimCommand& cmd, SimContext& context);
   int ClipCoding(const SimCommand& cmd, SimContext& context);
@@ -106,4 +108,5 @@ class SimSegmentStore : public SimCommandModule {
   std::map<unsigned, OpenSegment> mOpen;
   unsigned mNextNumber = 1;
   SimSegmentClip mClip;
+  int mPaceMs = 0;
 };

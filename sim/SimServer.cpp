@@ -13,6 +13,8 @@
 #include <cstdio>
 #include <cstring>
 
+#include "SimFrameFollower.h"
+
 namespace {
 
 constexpr std::size_t kMaxConnections = 256;
@@ -182,12 +184,16 @@ void SimServer::HandleFrames(SimConnection& connection) {
   FrameHeader header;
   std::string payload;
   while (!connection.IsClosed() && !mDie && connection.Decoder().Next(header, payload)) {
+    // A cancel that comes after its command ended has nothing left to stop.
+    if (header.type == FrameHeader::kCancel) continue;
     if (header.type != FrameHeader::kRequest) {
       Log("frame is not a request, connection closed", connection.GetId());
       connection.Close();
       return;
     }
-    SimReply reply = mProcessor.Execute(connection.GetId(), payload);
+    SimFrameFollower follower(connection, header.id);
+    const bool followed = (header.flags & FrameHeader::kFlagProgress) != 0;
+    SimReply reply = mProcessor.Execute(connection.GetId(), payload, followed ? &follower : nullptr);
     if (reply.action == SimReplyAction::Die) mDie = true;
     if (reply.action != SimReplyAction::Send) {
       connection.Close();

@@ -21,7 +21,7 @@ const char* FrameErrorText(FrameError error) {
     case FrameError::None: return "no error";
     case FrameError::BadMagic: return "frame does not start with \"QN\"";
     case FrameError::BadType: return "unknown frame type";
-    case FrameError::BadFlags: return "nonzero frame flags";
+    case FrameError::BadFlags: return "unknown frame flags";
     case FrameError::TooLarge: return "frame payload over 16 MiB";
   }
   return "unknown frame error";
@@ -44,8 +44,8 @@ FrameError DecodeFrameHeader(const unsigned char* in, FrameHeader& header) {
   header.id = GetU32(in + 4);
   header.status = static_cast<std::int32_t>(GetU32(in + 8));
   header.length = GetU32(in + 12);
-  if (header.type != FrameHeader::kRequest && header.type != FrameHeader::kReply) return FrameError::BadType;
-  if (header.flags != 0) return FrameError::BadFlags;
+  if (header.type < FrameHeader::kRequest || header.type > FrameHeader::kCancel) return FrameError::BadType;
+  if ((header.flags & ~FrameHeader::kFlagProgress) != 0) return FrameError::BadFlags;
   if (header.length > FrameHeader::kMaxPayload) return FrameError::TooLarge;
   return FrameError::None;
 }
@@ -73,4 +73,17 @@ bool FrameDecoder::Next(FrameHeader& header, std::string& payload) {
     mStart = 0;
   }
   return true;
+}
+
+bool FrameDecoder::Holds(std::uint8_t type, std::uint32_t id) const {
+  if (mError != FrameError::None) return false;
+  FrameHeader header;
+  for (std::size_t at = mStart; mBuffer.size() - at >= FrameHeader::kSize;) {
+    const auto* base = reinterpret_cast<const unsigned char*>(mBuffer.data()) + at;
+    if (DecodeFrameHeader(base, header) != FrameError::None) return false;
+    if (mBuffer.size() - at < FrameHeader::kSize + header.length) return false;
+    if (header.type == type && header.id == id) return true;
+    at += FrameHeader::kSize + header.length;
+  }
+  return false;
 }

@@ -12,6 +12,12 @@ struct FrameHeader {
   static constexpr std::uint32_t kMaxPayload = 16u * 1024u * 1024u;
   static constexpr std::uint8_t kRequest = 1;
   static constexpr std::uint8_t kReply = 2;
+  // While a long command runs, the server says how far it is ("DONE,TOTAL"), under the
+  // request's id, to a client that asked for it with kFlagProgress.
+  static constexpr std::uint8_t kProgress = 3;
+  // The client asks the server to stop the running request of that id.
+  static constexpr std::uint8_t kCancel = 4;
+  static constexpr std::uint8_t kFlagProgress = 0x01;
 
   std::uint8_t type = kRequest;
   std::uint8_t flags = 0;
@@ -41,6 +47,8 @@ class FrameDecoder {
   bool Next(FrameHeader& header, std::string& payload);
   FrameError GetError() const { return mError; }
   std::size_t Buffered() const { return mBuffer.size() - mStart; }
+  // Whether a complete frame of this type and id is among the bytes not yet taken.
+  bool Holds(std::uint8_t type, std::uint32_t id) const;
 
  private:
   std::string mBuffer;

@@ -18,6 +18,7 @@ constexpr StatusText kStatusTexts[] = {
     {QenStatus::kProtocolError, "The instrument server sent a malformed message"},
     {QenStatus::kBadCommand, "The command cannot be sent"},
     {QenStatus::kCommError, "Communication with the instrument server failed"},
+    {QenStatus::kCallBusy, "Another command is still waiting for the instrument server"},
     {QenStatus::kServerTerminated, "Server terminated"},
     {QenStatus::kLocked, "The instrument is locked by another client"},
 };

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "instrument/CallProgress.h"
 #include "support/Dstring.h"
 #include "support/DstringList.h"
 
@@ -13,6 +14,9 @@ class QenInstrument {
   virtual int Disconnect() = 0;
   virtual bool IsConnected() const = 0;
   virtual int Call(const Dstring& cmd, Dstring& reply) = 0;
+  // The follower of the calls from now on; null for none. Not owned. A connection that
+  // cannot report progress ignores it.
+  virtual void SetCallProgress(CallProgress*) {}
 
   // The text of a client status as an error-queue entry: code,"text".
   static Dstring GetErrMessage(int status);

@@ -1,8 +1,10 @@
 #include "instrument/QenTcpInstrument.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <chrono>
 #include <csignal>
+#include <cstdio>
 #include <fcntl.h>
 #include <netdb.h>
 #include <netinet/in.h>
@@ -118,6 +120,12 @@ int QenTcpInstrument::ReadReply(std::uint32_t id, Dstring& reply, long long dead
   std::string payload;
   for (;;) {
     while (mReceived.Next(header, payload)) {
+      if (header.type == FrameHeader::kProgress) {
+        // Progress of a call that timed out is old news.
+        if (header.id != id || !mProgress) continue;
+        if (int status = TakeProgress(id, payload, deadline); status != QenStatus::kOk) return status;
+        continue;
+      }
       if (header.type != FrameHeader::kReply) return Drop(QenStatus::kProtocolError);
       if (header.id != id) continue;  // the late answer to a call that timed out
       reply.assign(std::move(payload));
@@ -125,7 +133,7 @@ int QenTcpInstrument::ReadReply(std::uint32_t id, Dstring& reply, long long dead
     }
     if (mReceived.GetError() == FrameError::TooLarge) return Drop(QenStatus::kFrameTooLarge);
     if (mReceived.GetError() != FrameError::None) return Drop(QenStatus::kProtocolError);
-    if (int status = WaitFor(POLLIN, deadline); status != QenStatus::kOk) return status;
+    if (int status = WaitForReply(id, deadline); status != QenStatus::kOk) return status;
     ssize_t n = recv(mFd, chunk, sizeof chunk, 0);
     if (n > 0) {
       mReceived.Feed(chunk, static_cast<std::size_t>(n));
@@ -135,14 +143,50 @@ int QenTcpInstrument::ReadReply(std::uint32_t id, Dstring& reply, long long dead
   }
 }
 
+int QenTcpInstrument::WaitForReply(std::uint32_t id, long long& deadline) {
+  if (!mProgress) return WaitFor(POLLIN, deadline);
+  for (;;) {
+    const int status = WaitFor(POLLIN, std::min(deadline, NowMs() + kTickMs));
+    if (status != QenStatus::kTimeOut || NowMs() >= deadline) return status;
+    if (int asked = Ask(id, deadline); asked != QenStatus::kOk) return asked;
+  }
+}
+
+int QenTcpInstrument::TakeProgress(std::uint32_t id, const std::string& payload, long long& deadline) {
+  long long done = -1, total = -1;
+  char comma = 0;
+  // A progress text of another shape says only that the server is alive.
+  if (std::sscanf(payload.c_str(), "%lld%c%lld", &done, &comma, &total) != 3 || comma != ',' || done < 0 ||
+      total < done) {
+    done = total = -1;
+  }
+  mDone = done;
+  mTotal = total;
+  // Once cancelled, the reply must come within the ordinary time.
+  if (!mCancelSent) deadline = NowMs() + mReplyTimeoutMs;
+  return Ask(id, deadline);
+}
+
+int QenTcpInstrument::Ask(std::uint32_t id, long long deadline) {
+  if (!mProgress->Tick(mDone, mTotal) || mCancelSent) return QenStatus::kOk;
+  mCancelSent = true;
+  return SendAll(EncodeFrame(FrameHeader{FrameHeader::kCancel, 0, id, 0, 0}, {}), deadline);
+}
+
 int QenTcpInstrument::Call(const Dstring& cmd, Dstring& reply) {
   LgsDebug trace("QenTcpInstrument::Call ", "qenguiinst,wire");
   reply.clear();
   if (mFd < 0) return mLost ? QenStatus::kServerTerminated : QenStatus::kNotConnected;
+  // A follower that lets events run could start another call on the same stream.
+  if (mInCall) return QenStatus::kCallBusy;
   if (cmd.size() > FrameHeader::kMaxPayload) return QenStatus::kFrameTooLarge;
+  const InCall scope(mInCall);
   FrameHeader header;
   header.type = FrameHeader::kRequest;
+  header.flags = mProgress ? FrameHeader::kFlagProgress : 0;
   header.id = mNextId++;
+  mCancelSent = false;
+  mDone = mTotal = -1;
   const long long deadline = NowMs() + mReplyTimeoutMs;
   if (int status = SendAll(EncodeFrame(header, cmd), deadline); status != QenStatus::kOk) return status;
   int status = ReadReply(header.id, reply, deadline);

@@ -9,6 +9,7 @@
 // The instrument client over TCP (docs/protocol.md). Blocking calls, each bounded by a
 // time-out: a reply that does not arrive in time gives QenStatus::kTimeOut and the
 // connection stays up; the late reply is recognised by its id and dropped on the next call.
+// With a follower set, a request asks for progress frames and may be cancelled.
 class QenTcpInstrument : public QenInstrument {
  public:
   static constexpr unsigned short kDefaultPort = 7130;
@@ -22,6 +23,7 @@ class QenTcpInstrument : public QenInstrument {
   int Disconnect() override;
   bool IsConnected() const override { return mFd >= 0; }
   int Call(const Dstring& cmd, Dstring& reply) override;
+  void SetCallProgress(CallProgress* progress) override { mProgress = progress; }
 
   void SetConnectTimeoutMs(int ms) { mConnectTimeoutMs = ms; }
   void SetReplyTimeoutMs(int ms) { mReplyTimeoutMs = ms; }
@@ -30,7 +32,23 @@ class QenTcpInstrument : public QenInstrument {
  private:
   int SendAll(const std::string& bytes, long long deadline);
   int ReadReply(std::uint32_t id, Dstring& reply, long long deadline);
+  // Tells the follower how far the server is; sends the cancel once it asks for it.
+  int Ask(std::uint32_t id, long long deadline);
   int WaitFor(short events, long long deadline);
+  // Waits for reply bytes; with a follower, in slices so it is told of the wait and can
+  // cancel the request.
+  int WaitForReply(std::uint32_t id, long long& deadline);
+  // A progress frame of the running request: the server is alive, so the wait starts anew.
+  int TakeProgress(std::uint32_t id, const std::string& payload, long long& deadline);
+
+  struct InCall {
+    explicit InCall(bool& flag) : mFlag(flag) { mFlag = true; }
+    ~InCall() { mFlag = false; }
+    InCall(const InCall&) = delete;
+    InCall& operator=(const InCall&) = delete;
+    bool& mFlag;
+  };
+  static constexpr int kTickMs = 100;
   int Drop(int status);
 
   int mFd = -1;
@@ -42,4 +60,9 @@ class QenTcpInstrument : public QenInstrument {
   std::uint32_t mNextId = 1;
   int mConnectTimeoutMs = 5000;
   int mReplyTimeoutMs = 30000;
+  CallProgress* mProgress = nullptr;
+  bool mCancelSent = false;
+  bool mInCall = false;
+  long long mDone = -1;
+  long long mTotal = -1;
 };

@@ -6,6 +6,7 @@ namespace {
 
 FWBlocker::LockProbe* gProbe = nullptr;
 const FWBlocker* gInnermost = nullptr;
+int gWaiting = 0;
 
 constexpr std::string_view kNestingByDesign[] = {"QenDs::Update", "Dte::Write"};
 
@@ -28,6 +29,10 @@ int FWBlocker::Block() {
   if (mAsked) return mResult;
   mAsked = true;
   if (gProbe && gProbe->IsInstrumentLocked()) return mResult = kLocked;
+  if (gWaiting > 0) {
+    ConditionListLoader::ConditionToken(mList, "GUI_INSTRUMENT_BUSY", {Dstring(mName)}, kBusy);
+    return mResult = kBusy;
+  }
   if (NestsByDesign(mName)) return mResult = 0;
   for (const FWBlocker* outer = mOuter; outer; outer = outer->mOuter) {
     if (outer->mName == mName) {
@@ -39,3 +44,7 @@ int FWBlocker::Block() {
 }
 
 void FWBlocker::SetLockProbe(LockProbe* probe) { gProbe = probe; }
+
+FWBlocker::WaitScope::WaitScope() { ++gWaiting; }
+
+FWBlocker::WaitScope::~WaitScope() { --gWaiting; }

@@ -16,8 +16,10 @@
 //  3. Except for the names that nest by design: "QenDs::Update" (a notification may update
 //     other sources, each its own pass) and "Dte::Write" (a view may write while being told of
 //     a write; the engine takes its batch before sending).
-//  4. Block() asks once; later calls on the same guard give the same answer. Rule 1 is checked
-//     before rule 2. Guards are for the GUI thread only.
+//  4. While a long command waits for the server and lets events run (a WaitScope is open),
+//     every operation an event or timer starts is not run: kBusy, "GUI_INSTRUMENT_BUSY".
+//  5. Block() asks once; later calls on the same guard give the same answer. Rule 1 is checked
+//     before rules 2 and 4. Guards are for the GUI thread only.
 class FWBlocker {
  public:
   static constexpr int kLocked = -19;
@@ -40,6 +42,15 @@ class FWBlocker {
 
   // The probe of rule 1; null removes it. Not owned.
   static void SetLockProbe(LockProbe* probe);
+
+  // Rule 4, for the time events run while a command waits.
+  class WaitScope {
+   public:
+    WaitScope();
+    ~WaitScope();
+    WaitScope(const WaitScope&) = delete;
+    WaitScope& operator=(const WaitScope&) = delete;
+  };
 
  private:
   std::string_view mName;

@@ -76,10 +76,34 @@ TEST_P(FrameBadHeader, BreaksTheStreamForGood) {
 INSTANTIATE_TEST_SUITE_P(
     Table, FrameBadHeader,
     testing::Values(BadHeaderCase{Bytes({'Q', 'X', 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0}), FrameError::BadMagic},
-                    BadHeaderCase{Bytes({'Q', 'N', 3, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0}), FrameError::BadType},
-                    BadHeaderCase{Bytes({'Q', 'N', 2, 1, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0}), FrameError::BadFlags},
+                    BadHeaderCase{Bytes({'Q', 'N', 5, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0}), FrameError::BadType},
+                    BadHeaderCase{Bytes({'Q', 'N', 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0}), FrameError::BadType},
+                    BadHeaderCase{Bytes({'Q', 'N', 2, 2, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0}), FrameError::BadFlags},
                     BadHeaderCase{Bytes({'Q', 'N', 2, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0x01, 0x00, 0x00, 0x01}),
                                   FrameError::TooLarge}));
+
+TEST(Frame, ProgressAndCancelTravelUnderTheRequestId) {
+  FrameHeader request;
+  request.flags = FrameHeader::kFlagProgress;
+  request.id = 9;
+  FrameHeader progress{FrameHeader::kProgress, 0, 9, 0, 0};
+  FrameHeader cancel{FrameHeader::kCancel, 0, 7, 0, 0};
+  EXPECT_EQ(EncodeFrame(request, "x").substr(0, 8), Bytes({'Q', 'N', 1, 1, 0, 0, 0, 9}));
+  FrameDecoder decoder;
+  const std::string bytes = EncodeFrame(progress, "1048576,16777216") + EncodeFrame(cancel, "");
+  decoder.Feed(bytes.data(), bytes.size() - 1);
+  EXPECT_TRUE(decoder.Holds(FrameHeader::kProgress, 9));
+  EXPECT_FALSE(decoder.Holds(FrameHeader::kCancel, 7)) << "an incomplete frame is not there yet";
+  decoder.Feed(bytes.data() + bytes.size() - 1, 1);
+  EXPECT_TRUE(decoder.Holds(FrameHeader::kCancel, 7));
+  EXPECT_FALSE(decoder.Holds(FrameHeader::kCancel, 9));
+  FrameHeader h;
+  std::string body;
+  ASSERT_TRUE(decoder.Next(h, body));
+  EXPECT_EQ(h.type, FrameHeader::kProgress);
+  EXPECT_EQ(body, "1048576,16777216");
+  EXPECT_TRUE(decoder.Holds(FrameHeader::kCancel, 7)) << "looking takes nothing";
+}
 
 TEST(Frame, SixteenMebibytesIsTheLargestAcceptedPayload) {
   unsigned char raw[16];

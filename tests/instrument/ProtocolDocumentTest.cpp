@@ -10,6 +10,7 @@
 
 #include <cstdint>
 #include <string>
+#include <vector>
 
 #include "common/SimProcess.h"
 
@@ -29,22 +30,32 @@ class DocumentClient {
   bool IsConnected() const { return mConnected; }
 
   // Sends one request; returns the reply's status and sets `payload`. -1000 for a broken reply.
-  int Request(const std::string& command, std::string& payload) {
+  // With `progress`, the request asks for progress frames and their texts are kept there.
+  int Request(const std::string& command, std::string& payload, std::vector<std::string>* progress = nullptr) {
     const std::uint32_t id = ++mId;
-    std::string frame = {'Q', 'N', 1, 0};
-    PutU32(frame, id);
-    PutU32(frame, 0);
-    PutU32(frame, static_cast<std::uint32_t>(command.size()));
-    frame += command;
-    if (send(mFd, frame.data(), frame.size(), MSG_NOSIGNAL) != static_cast<ssize_t>(frame.size())) return -1000;
+    if (!Send(1, progress ? 1 : 0, id, command)) return -1000;
     std::string header;
-    if (!ReadBytes(16, header) || header.compare(0, 2, "QN") != 0 || header[2] != 2 || header[3] != 0) return -1000;
-    if (GetU32(header, 4) != id) return -1000;
-    if (!ReadBytes(GetU32(header, 12), payload)) return -1000;
-    return static_cast<std::int32_t>(GetU32(header, 8));
+    for (;;) {
+      if (!ReadBytes(16, header) || header.compare(0, 2, "QN") != 0 || header[3] != 0) return -1000;
+      if (GetU32(header, 4) != id || !ReadBytes(GetU32(header, 12), payload)) return -1000;
+      if (header[2] == 2) return static_cast<std::int32_t>(GetU32(header, 8));
+      if (header[2] != 3 || !progress) return -1000;
+      progress->push_back(payload);
+    }
   }
+  // Asks the server to stop the request `id`.
+  bool Cancel(std::uint32_t id) { return Send(4, 0, id, ""); }
+  std::uint32_t LastId() const { return mId; }
 
  private:
+  bool Send(char type, char flags, std::uint32_t id, const std::string& payload) {
+    std::string frame = {'Q', 'N', type, flags};
+    PutU32(frame, id);
+    PutU32(frame, 0);
+    PutU32(frame, static_cast<std::uint32_t>(payload.size()));
+    frame += payload;
+    return send(mFd, frame.data(), frame.size(), MSG_NOSIGNAL) == static_cast<ssize_t>(frame.size());
+  }
   static void PutU32(std::string& out, std::uint32_t v) {
     for (int shift = 24; shift >= 0; shift -= 8) out += static_cast<char>((v >> shift) & 0xFF);
   }
@@ -100,4 +111,23 @@ TEST(ProtocolDocument, HandleParametersErrorQueueAndLock) {
   ASSERT_EQ(other.Request(":TEST:LOCK OFF", reply), 0);
   EXPECT_EQ(client.Request(":_QEN1X:TRIG:MODE?", reply), 0);
   EXPECT_EQ(client.Request(":QEN:INST:HAND:DEST _QEN1X", reply), 0);
+}
+
+TEST(ProtocolDocument, ProgressFramesComeBeforeTheReplyAndALateCancelIsIgnored) {
+  SimProcess sim;
+  ASSERT_NE(sim.Port(), 0);
+  DocumentClient client(sim.Port());
+  std::string reply;
+  ASSERT_EQ(client.Request(":QEN:INST:HAND:CRE? _QEN1X,\"PSX\",\"QEN1\"", reply), 0);
+  ASSERT_EQ(client.Request(":_QEN1X:EDIT:SEGM:CRE? \"Long\",MEM", reply), 0);
+  const std::string segment = ":_QEN1X:EDIT:SEGM" + reply + ":PATT:MOD:INS 0,";
+  ASSERT_EQ(client.Request(segment + "TRAC,BEF,1", reply), 0);
+  std::vector<std::string> progress;
+  EXPECT_EQ(client.Request(segment + "VECT,BEF,3145728", reply, &progress), 0);
+  ASSERT_FALSE(progress.empty());
+  EXPECT_EQ(progress.front(), "1048576,3145728");
+  EXPECT_EQ(progress.back(), "3145728,3145728");
+  ASSERT_TRUE(client.Cancel(client.LastId()));
+  EXPECT_EQ(client.Request(":_QEN1X:EDIT:SEGM1:PATT:LENG?", reply), 0);
+  EXPECT_EQ(reply, "3145728");
 }

@@ -94,7 +94,8 @@ TEST_F(SimServerTest, BrokenStreamsCloseOnlyTheirOwnConnection) {
       {"oversized header", {FrameHeader::kRequest, 0, 1, 0, FrameHeader::kMaxPayload + 1}, "", "QN"},
       {"bad magic", {FrameHeader::kRequest, 0, 1, 0, 4}, "abcd", "XY"},
       {"reply type", {FrameHeader::kReply, 0, 1, 0, 0}, "", "QN"},
-      {"nonzero flags", {FrameHeader::kRequest, 1, 1, 0, 0}, "", "QN"},
+      {"unknown flags", {FrameHeader::kRequest, 2, 1, 0, 0}, "", "QN"},
+      {"progress from a client", {FrameHeader::kProgress, 0, 1, 0, 0}, "", "QN"},
   };
   for (const Case& c : cases) {
     std::string bytes(FrameHeader::kSize, '\0');

@@ -64,3 +64,23 @@ TEST_F(FWBlockerTest, NotificationAndWriteNestByDesignButStillSeeTheLock) {
   EXPECT_EQ(lockedUpdate.Block(), -19);
   EXPECT_TRUE(mList.IsEmpty());
 }
+
+TEST_F(FWBlockerTest, WhileACommandWaitsEveryOperationIsBusyButTheLockStillWins) {
+  FWBlocker running("QenSegmentDs::ModifyFill", mList);
+  ASSERT_EQ(running.Block(), 0);
+  {
+    const FWBlocker::WaitScope waiting;
+    FWBlocker poll("uiapp::AsyncTimeOut", mList);
+    EXPECT_EQ(poll.Block(), FWBlocker::kBusy);
+    FWBlocker update("QenDs::Update", mList);
+    EXPECT_EQ(update.Block(), FWBlocker::kBusy);
+    mProbe.mLocked = true;
+    FWBlocker locked("uiapp::Run", mList);
+    EXPECT_EQ(locked.Block(), -19);
+    mProbe.mLocked = false;
+  }
+  ASSERT_EQ(mList.Size(), 2u);
+  EXPECT_EQ(mList[0].GetKey(), "GUI_INSTRUMENT_BUSY");
+  FWBlocker after("uiapp::AsyncTimeOut", mList);
+  EXPECT_EQ(after.Block(), 0);
+}

@@ -6,7 +6,10 @@
 #include <QLabel>
 #include <QLineEdit>
 #include <QListWidget>
+#include <QProgressDialog>
+#include <QPushButton>
 #include <QTest>
+#include <QTimer>
 #include <fstream>
 #include <map>
 #include <memory>
@@ -297,4 +300,48 @@ TEST_F(SegmentEditTest, TheSystemClipboardCarriesDigitsBothWays) {
     EXPECT_NE(mAlerts[0].find(expected), std::string::npos) << mAlerts[0];
   }
   ExpectRows(grid, {{0, "12ab"}, {1, "34cd"}, {10, "2a00"}, {11, "4c00"}});
+}
+
+// A fill over millions of vectors shows how far the instrument is; Cancel has it put the
+// segment back, edits typed before included, and the window says so instead of an error.
+TEST_F(SegmentEditTest, ALongFillShowsItsProgressAndCancelLeavesTheSegmentAsItWas) {
+  constexpr long kLength = 4L << 20;
+  SegmentProperties properties;
+  properties.name = "Edit/Huge";
+  properties.length = kLength;
+  properties.width = 8;
+  properties.coding = "01";
+  ASSERT_EQ(mWin->CreateSegment(properties, mList), 0) << mList.ToText();
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("a5"));
+  Trigger("SelectAll");
+  Other(":EDIT:SEGM:PACE 200");
+  bool sawProgress = false;
+  QTimer cancel;
+  QObject::connect(&cancel, &QTimer::timeout, [&] {
+    auto* dialog = mWin->findChild<QProgressDialog*>(QStringLiteral("ServerWorkProgress"));
+    auto* button = dialog && dialog->isVisible() ? dialog->findChild<QPushButton*>() : nullptr;
+    if (button && button->isEnabled()) {
+      sawProgress = true;
+      QTest::mouseClick(button, Qt::LeftButton);
+    }
+  });
+  cancel.start(10);
+  Trigger("Fill1");
+  cancel.stop();
+  Other(":EDIT:SEGM:PACE 0");
+  EXPECT_TRUE(sawProgress);
+  EXPECT_TRUE(mWin->MessageText().startsWith(QStringLiteral("Cancelled"))) << mWin->MessageText().toStdString();
+  EXPECT_TRUE(mAlerts.empty());
+  const GridDisp* digits = grid->findChild<GridDisp*>(QStringLiteral("digits"));
+  for (long vector : {0L, kLength - 1}) {
+    ASSERT_EQ(grid->SetVectorOffset(0, vector, mList), 0) << mList.ToText();
+    const QString row = grid->DispCell(*digits, vector, 0).text + grid->DispCell(*digits, vector, 1).text;
+    EXPECT_EQ(row, vector == 0 ? QStringLiteral("a5") : QStringLiteral("00")) << "vector " << vector;
+  }
+  Dstring number = Other(":EDIT:SEGM:OPEN? \"Edit/Huge\"");
+  EXPECT_EQ(Other(":EDIT:SEGM" + number + ":PATT:DATA? 0,0,7,0,BIN"), Dstring(std::string("#500008\x80\0\x80\0\0\x80\0\x80", 15)));
+  Other(":EDIT:SEGM" + number + ":CLOS");
+  ASSERT_EQ(grid->Release(mList), 0);
+  QenSegmentPool::Delete("Edit/Huge", mList);
 }

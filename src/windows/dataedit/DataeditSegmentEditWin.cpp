@@ -16,6 +16,8 @@
 #include <QPushButton>
 #include <QSpinBox>
 
+#include "instrument/CallProgressScope.h"
+#include "instrument/QenStatus.h"
 #include "params/ui/BoundControl.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
@@ -25,6 +27,7 @@
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/FormDialog.h"
+#include "windows/ServerWorkProgress.h"
 
 // A menu entry: its text and key, what it does, and when it is offered.
 struct DataeditSegmentEditWin::Command {
@@ -214,12 +217,29 @@ void DataeditSegmentEditWin::ShowState() {
 void DataeditSegmentEditWin::Run(const std::function<int(ConditionList&)>& operation) {
   ConditionList list;
   mMessage->clear();
-  // The server may take a while over a long segment: the pointer says so meanwhile.
+  // The server may take a while over a long segment: the pointer says so meanwhile, and
+  // after half a second a dialog shows how far it is and can cancel the work.
   Toolkit::Get().SetWaitCursor(true);
-  const int status = operation(list);
+  ServerWorkProgress progress(this, QStringLiteral("The instrument is working on the segment…"));
+  int status = 0;
+  {
+    const CallProgressScope following(&progress);
+    status = operation(list);
+  }
   Toolkit::Get().SetWaitCursor(false);
-  // A lock is a state, not an error: it adds no condition, so it is said here.
+  // A lock is a state, not an error: it adds no condition, so it is said here; so is a
+  // cancel the user asked for.
   if (status == FWBlocker::kLocked) mMessage->setText(SegmentGridManager::LockedText());
+  if (progress.WasCancelled()) {
+    ConditionList rest;
+    for (const Condition& c : list) {
+      if (c.GetCode() != QenStatus::kCancelledError) rest.Add(c);
+    }
+    if (rest.Size() < list.Size()) {
+      list = rest;
+      mMessage->setText(QStringLiteral("Cancelled: the instrument left the segment as it was."));
+    }
+  }
   ShowState();
   BoundControl::Report(list);
 }
