@@ -327,6 +327,17 @@ int SimSegment::WriteBlock(long t0, long v0, long t1, long v1, std::string_view 
   return 0;
 }
 
+int SimSegment::Keep(long t0, long v0, long t1, long v1, std::string& states) const {
+  if (int rc = CheckMemory()) return rc;
+  if (int rc = CheckRange(t0, v0, t1, v1)) return rc;
+  states = mRows.ReadBlock(t0, v0, t1, v1);
+  return 0;
+}
+
+void SimSegment::PutBack(long t0, long v0, long t1, long v1, const std::string& states) {
+  mRows.WriteBlock(t0, v0, t1, v1, states);
+}
+
 int SimSegment::Fill(long t0, long v0, long t1, long v1, long state) {
   if (int rc = CheckMemory()) return rc;
   if (int rc = CheckRange(t0, v0, t1, v1)) return rc;

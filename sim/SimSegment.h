@@ -40,6 +40,10 @@ class SimSegment {
 
   int ReadBlock(long t0, long v0, long t1, long v1, std::string& block) const;
   int WriteBlock(long t0, long v0, long t1, long v1, std::string_view block);
+  // The states of a memory data range, whatever its size, to be put back after work that
+  // was cancelled; PutBack takes only what Keep gave for the same range.
+  int Keep(long t0, long v0, long t1, long v1, std::string& states) const;
+  void PutBack(long t0, long v0, long t1, long v1, const std::string& states);
   int Fill(long t0, long v0, long t1, long v1, long state);
   int Invert(long t0, long v0, long t1, long v1);
   int Mirror(long t0, long v0, long t1, long v1, bool traces);

@@ -15,15 +15,19 @@ int SimSegmentWork::Invert(SimSegment& segment, long t0, long v0, long t1, long 
 int SimSegmentWork::OverVectors(SimSegment& segment, long t0, long v0, long t1, long v1,
                                 const std::function<int(long from, long to)>& op) {
   if (v1 < v0 || v1 - v0 < kStep || segment.IsGenerated()) return op(v0, v1);
+  // Only a client that follows the work can cancel it; part way, nothing else can fail.
+  const bool keep = mContext.IsFollowed();
   std::string before;
-  if (int rc = segment.ReadBlock(t0, v0, t1, v1, before)) return rc;
+  if (keep) {
+    if (int rc = segment.Keep(t0, v0, t1, v1, before)) return rc;
+  }
   const long long total = v1 - v0 + 1LL;
   for (long from = v0; from <= v1; from += kStep) {
     const long to = std::min(v1, from + kStep - 1);
     int rc = op(from, to);
     if (rc == 0 && !Step(to - v0 + 1LL, total)) rc = SimContext::kCancelled;
     if (rc != 0) {
-      segment.WriteBlock(t0, v0, t1, v1, before);
+      if (keep) segment.PutBack(t0, v0, t1, v1, before);
       return rc;
     }
   }

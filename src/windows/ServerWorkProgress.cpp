@@ -3,6 +3,7 @@
 #include <QCoreApplication>
 #include <QProgressDialog>
 #include <QPushButton>
+#include <QWidget>
 
 #include "support/FWBlocker.h"
 
@@ -16,6 +17,7 @@ ServerWorkProgress::~ServerWorkProgress() = default;
 void ServerWorkProgress::Show() {
   mDialog = std::make_unique<QProgressDialog>(mLabel, QStringLiteral("Cancel"), 0, 0, mParent);
   mDialog->setObjectName(QStringLiteral("ServerWorkProgress"));
+  mDialog->setWindowTitle(mParent ? mParent->window()->windowTitle() : QString());
   mDialog->setWindowModality(Qt::WindowModal);
   mDialog->setMinimumDuration(0);
   mDialog->setAutoReset(false);
