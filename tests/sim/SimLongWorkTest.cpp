@@ -89,8 +89,8 @@ TEST_P(SimLongWorkCancel, CancelledWorkLeavesTheSegmentAsItWas) {
   ASSERT_FALSE(cancelAtFirstNews.mTicks.empty());
   EXPECT_GT(cancelAtFirstNews.mTicks.back().first, 0);
   EXPECT_LT(cancelAtFirstNews.mTicks.back().first, cancelAtFirstNews.mTicks.back().second);
-  ASSERT_EQ(Call(mSegment + ":LENG?"), 0);
-  EXPECT_EQ(mReply, Dstring::Format("%ld", kVectors));
+  ASSERT_EQ(Call(mSegment + ":LENG?;" + mSegment + ":WIDT?"), 0);
+  EXPECT_EQ(mReply, Dstring::Format("%ld;%ld", kVectors, kTraces));
   EXPECT_TRUE(Contents() == before) << "the cancelled work was not put back";
 }
 
@@ -98,6 +98,7 @@ INSTANTIATE_TEST_SUITE_P(
     Commands, SimLongWorkCancel,
     ::testing::Values(LongCommand{"Fill", ":MOD:FILL 0,0,39,4194303,0"}, LongCommand{"Invert", ":MOD:INV 0,0,39,4194303"},
                       LongCommand{"InsertVectors", ":MOD:INS 100,VECT,AFT,4194304"},
+                      LongCommand{"InsertTraces", ":MOD:INS 3,TRAC,BEF,3"},
                       LongCommand{"Find", ":FIND:FIRS? \"FFH\", VECT, RVS"}),
     [](const ::testing::TestParamInfo<LongCommand>& info) { return info.param.name; });
 
