@@ -359,6 +359,11 @@ int SimSegment::Invert(long t0, long v0, long t1, long v1) {
     }
     map.push_back(static_cast<unsigned>(to));
   }
+  // Two one-bit states that swap: the bits of the rows flip a byte at a time.
+  if (mRows.GetStateWidth() == 1 && map == std::vector<unsigned>{1, 0}) {
+    for (long t = t0; t <= t1; ++t) mRows.FlipBits(t, v0, v1 - v0 + 1);
+    return 0;
+  }
   for (long t = t0; t <= t1; ++t) {
     for (long v = v0; v <= v1; ++v)
       mRows.Set(t, v, map[std::min<std::size_t>(mRows.Get(t, v), map.size() - 1)]);

@@ -56,6 +56,15 @@ void SimSegmentRows::Set(long trace, long vector, unsigned value) {
   for (int i = mStateWidth - 1; i >= 0; --i) PutBit(row, bit++, (value >> i) & 1u);
 }
 
+void SimSegmentRows::FlipBits(long trace, long vector, long count) {
+  std::uint8_t* row = Row(trace).data();
+  auto bit = static_cast<std::size_t>(vector);
+  const std::size_t end = bit + static_cast<std::size_t>(count);
+  for (; bit < end && (bit & 7) != 0; ++bit) row[bit >> 3] ^= static_cast<std::uint8_t>(0x80u >> (bit & 7));
+  for (; bit + 8 <= end; bit += 8) row[bit >> 3] = static_cast<std::uint8_t>(~row[bit >> 3]);
+  for (; bit < end; ++bit) row[bit >> 3] ^= static_cast<std::uint8_t>(0x80u >> (bit & 7));
+}
+
 void SimSegmentRows::Fill(long trace, long vector, long count, unsigned value) {
   // Two-state rows fill whole bytes at once; the ends go state by state.
   if (mStateWidth == 1) {

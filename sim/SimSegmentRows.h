@@ -26,6 +26,8 @@ class SimSegmentRows {
   void Set(long trace, long vector, unsigned value);
   // States `count` from `vector` of one trace set to `value`.
   void Fill(long trace, long vector, long count, unsigned value);
+  // One-bit states `count` from `vector` of one trace turned to the other state.
+  void FlipBits(long trace, long vector, long count);
 
   // The block of traces t0..t1 and vectors v0..v1: one padded row per trace, in trace order.
   std::string ReadBlock(long t0, long v0, long t1, long v1) const;

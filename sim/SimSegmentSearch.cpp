@@ -1,8 +1,10 @@
 #include "SimSegmentSearch.h"
 
 #include <algorithm>
-#include <functional>
+#include <array>
+#include <cstdint>
 #include <string_view>
+#include <vector>
 
 namespace {
 
@@ -12,18 +14,53 @@ constexpr std::string_view kDontCareStates = "xX";
 constexpr std::string_view kErroredStates = "kKrR";
 constexpr std::string_view kDigits = "0123456789abcdef";
 
-bool Matches(char state, char bit) {
-  if (bit == 'x' || kDontCareStates.find(state) != std::string_view::npos) return true;
-  const std::string_view& states = bit == '1' ? kOneStates : kZeroStates;
-  return states.find(state) != std::string_view::npos;
+// What a state matches: a 0 bit, a 1 bit, any bit (don't-care) or none (Z).
+enum Match : std::uint8_t { kZero = 0, kOne = 1, kAny = 2, kNone = 3 };
+
+Match MatchOf(char state) {
+  if (kDontCareStates.find(state) != std::string_view::npos) return kAny;
+  if (kOneStates.find(state) != std::string_view::npos) return kOne;
+  return kZeroStates.find(state) != std::string_view::npos ? kZero : kNone;
 }
+
+// The states of a segment as the searches see them, read straight from the rows of memory
+// data (the search looks at up to a billion positions).
+class StateReader {
+ public:
+  explicit StateReader(const SimSegment& segment)
+      : mSegment(segment), mRows(segment.GetRows()), mMemory(!segment.IsGenerated()) {
+    for (std::size_t n = 0; n < mMatch.size(); ++n) {
+      const char state = n < segment.GetCoding().size() ? segment.GetCoding()[n] : '?';
+      mMatch[n] = MatchOf(state);
+      mErrored[n] = kErroredStates.find(state) != std::string_view::npos;
+    }
+  }
+  Match MatchAt(long trace, long vector) const {
+    return mMemory ? mMatch[Index(trace, vector)] : MatchOf(mSegment.StateAt(trace, vector));
+  }
+  bool IsErroredAt(long trace, long vector) const {
+    return mMemory ? mErrored[Index(trace, vector)]
+                   : kErroredStates.find(mSegment.StateAt(trace, vector)) != std::string_view::npos;
+  }
+
+ private:
+  std::size_t Index(long trace, long vector) const {
+    return std::min<std::size_t>(mRows.Get(trace, vector), mMatch.size() - 1);
+  }
+  const SimSegment& mSegment;
+  const SimSegmentRows& mRows;
+  bool mMemory;
+  // A state number has at most four bits.
+  std::array<Match, 16> mMatch{};
+  std::array<bool, 16> mErrored{};
+};
 
 constexpr long kNotFound = -1;
 constexpr long kStopped = -2;
 
 // Walks the positions 0 .. total-1 in the search order and gives the first that `hit` accepts.
-long Walk(long total, const Dstring& direction, long start, const std::function<bool(long)>& hit,
-          const SimSegmentSearch::Step& progress) {
+template <typename Hit>
+long Walk(long total, const Dstring& direction, long start, const Hit& hit, const SimSegmentSearch::Step& progress) {
   if (total <= 0) return kNotFound;
   start = std::clamp(start, 0L, total - 1);
   for (long step = 0; step < total; ++step) {
@@ -65,13 +102,17 @@ bool SimSegmentSearch::Find(const SimSegment& segment, const Dstring& bits, bool
     t = alongTraces ? at / inner : at % inner;
     v = alongTraces ? at % inner : at / inner;
   };
+  std::vector<Match> pattern;
+  for (char bit : bits) pattern.push_back(bit == 'x' ? kAny : bit == '1' ? kOne : kZero);
+  const StateReader states(segment);
   auto hit = [&](long at) {
     long t = 0, v = 0;
     position(at, t, v);
     if (alongTraces ? v + n > length : t + n > width) return false;
     for (long i = 0; i < n; ++i) {
-      const char state = alongTraces ? segment.StateAt(t, v + i) : segment.StateAt(t + i, v);
-      if (!Matches(state, bits[static_cast<std::size_t>(alongTraces ? i : n - 1 - i)])) return false;
+      const Match want = pattern[static_cast<std::size_t>(alongTraces ? i : n - 1 - i)];
+      const Match state = alongTraces ? states.MatchAt(t, v + i) : states.MatchAt(t + i, v);
+      if (want != kAny && state != kAny && state != want) return false;
     }
     return true;
   };
@@ -88,9 +129,8 @@ bool SimSegmentSearch::FindError(const SimSegment& segment, const Dstring& direc
   foundTrace = foundVector = -1;
   if (segment.GetCoding().find_first_of(kErroredStates.data(), 0, kErroredStates.size()) == Dstring::npos)
     return true;
-  auto hit = [&](long at) {
-    return kErroredStates.find(segment.StateAt(at % width, at / width)) != std::string_view::npos;
-  };
+  const StateReader states(segment);
+  auto hit = [&](long at) { return states.IsErroredAt(at % width, at / width); };
   const long at = Walk(width * segment.GetLength(), direction, vector * width + trace, hit, step);
   if (at == kStopped) return false;
   if (at >= 0) {
