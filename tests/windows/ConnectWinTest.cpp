@@ -3,6 +3,7 @@
 #include <QCoreApplication>
 #include <QFile>
 #include <QTest>
+#include <QWheelEvent>
 #include <QXmlStreamReader>
 #include <memory>
 
@@ -33,7 +34,6 @@ class ConnectWinTest : public GuiSimFixture {
     ASSERT_EQ(mWin->Load(mList), 0) << mList.ToText();
     mWin->resize(1000, 700);
     mWin->show();
-    mWin->View()->Fit();
     QCoreApplication::processEvents();
   }
   void TearDown() override {
@@ -88,9 +88,39 @@ TEST_F(ConnectWinTest, DrawsTheRackAndItsConnections) {
   EXPECT_LT(gen.x(), ana.x());
 }
 
+TEST_F(ConnectWinTest, ZoomsWithKeysAndTheWheelAndFits) {
+  SchemeView* view = mWin->View();
+  const QRect whole = view->mapFromScene(view->scene()->sceneRect()).boundingRect();
+  EXPECT_TRUE(view->viewport()->rect().adjusted(-2, -2, 2, 2).contains(whole)) << "fitted at the start";
+  const double fitted = view->Zoom();
+  QTest::keyClick(view, Qt::Key_Plus, Qt::ControlModifier);
+  EXPECT_NEAR(view->Zoom(), fitted * 1.25, 1e-9);
+  QTest::keyClick(view, Qt::Key_Minus, Qt::ControlModifier);
+  QTest::keyClick(view, Qt::Key_Minus, Qt::ControlModifier);
+  EXPECT_NEAR(view->Zoom(), fitted / 1.25, 1e-9);
+  const QPoint middle = view->viewport()->rect().center();
+  auto wheel = [&](Qt::KeyboardModifiers modifiers) {
+    QWheelEvent event(middle, view->viewport()->mapToGlobal(middle), {}, {0, 240}, Qt::NoButton, modifiers,
+                      Qt::NoScrollPhase, false);
+    QCoreApplication::sendEvent(view->viewport(), &event);
+  };
+  wheel(Qt::ControlModifier);
+  EXPECT_NEAR(view->Zoom(), fitted / 1.25 * 1.15 * 1.15, 1e-9);
+  wheel(Qt::NoModifier);
+  EXPECT_NEAR(view->Zoom(), fitted / 1.25 * 1.15 * 1.15, 1e-9) << "the plain wheel scrolls";
+  // Zoomed by hand, a new size keeps the zoom; Ctrl+0 fits again.
+  mWin->resize(900, 600);
+  QCoreApplication::processEvents();
+  EXPECT_NEAR(view->Zoom(), fitted / 1.25 * 1.15 * 1.15, 1e-9);
+  QTest::keyClick(view, Qt::Key_0, Qt::ControlModifier);
+  EXPECT_TRUE(view->viewport()->rect().adjusted(-2, -2, 2, 2).contains(view->mapFromScene(view->scene()->sceneRect()).boundingRect()));
+}
+
 TEST_F(ConnectWinTest, ARemovedAndADrawnConnectionReachTheOtherClient) {
   // Select the line and press Delete.
   ASSERT_TRUE(mWin->View()->SelectConnection({kGen1, kAna1}));
+  EXPECT_EQ(mWin->StateText(),
+            QStringLiteral("Selected: CGR1 MOD1 CONN1 drives CGR1 MOD3 CONN1. Delete removes the connection."));
   QTest::keyClick(mWin->View(), Qt::Key_Delete);
   QCoreApplication::processEvents();
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
@@ -106,8 +136,8 @@ TEST_F(ConnectWinTest, ARemovedAndADrawnConnectionReachTheOtherClient) {
             "(\":CGR1:MOD2:CONN1\",\":CGR1:MOD3:CONN1\"),(\":CGR1:MOD1:CONN2\",\":CGR1:MOD3:CONN2\"),"
             "(\":CGR2:MOD1:CONN1\",\":CGR2:MOD2:CONN1\"),(\":CGR2:MOD1:CONN2\",\":CGR2:MOD2:CONN2\")");
   EXPECT_EQ(mWin->View()->NumLines(), 4);
-  EXPECT_TRUE(mWin->View()->SelectConnection({kGen2, kAna1}));
   EXPECT_EQ(mWin->StateText(), QStringLiteral("Connected CGR1 MOD2 CONN1 to CGR1 MOD3 CONN1."));
+  EXPECT_TRUE(mWin->View()->SelectConnection({kGen2, kAna1}));
 
   // Dragged backwards, from the analyser, it means the same.
   ASSERT_EQ(mWin->Disconnect(kGen2, kAna1, mList), 0) << mList.ToText();

@@ -103,6 +103,8 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
   mRubber = nullptr;
   scene()->clear();
   mAnchors.clear();
+  // A connected port's circle is filled.
+  std::map<Dstring, QGraphicsEllipseItem*> anchors;
   double top = 0;
   for (const CFrontendInfo::Group& g : groups) {
     double heights[2] = {0, 0};
@@ -149,8 +151,11 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
         const double anchorX = m.generator ? kModuleWidth : 0;
         auto* anchor = new QGraphicsEllipseItem(anchorX - kAnchor, kRow / 2 - kAnchor, 2 * kAnchor, 2 * kAnchor, row);
         anchor->setPen(QPen(data ? kLineColour : QColor(0x90, 0x90, 0x90), 1.5));
-        anchor->setBrush(data ? QBrush(m.generator ? kGeneratorColour : kAnalyserColour) : QBrush(Qt::white));
-        anchor->setZValue(3);
+        anchor->setBrush(Qt::white);
+        anchors[p.path] = anchor;
+        row->setToolTip(!data ? QStringLiteral("%1: a clock output; it is not connected here").arg(QString::fromStdString(p.path))
+                        : m.generator ? QStringLiteral("%1: drag to an analyser port to connect").arg(QString::fromStdString(p.path))
+                                      : QStringLiteral("%1: drag to a generator port to connect").arg(QString::fromStdString(p.path)));
         mAnchors[p.path] = row->mapToScene(anchorX, kRow / 2);
         rowTop += kRow;
       }
@@ -162,7 +167,11 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
     auto from = mAnchors.find(c.generator);
     auto to = mAnchors.find(c.analyser);
     if (from == mAnchors.end() || to == mAnchors.end()) continue;
-    auto* line = new LineItem(from->second, to->second);
+    for (const Dstring& port : {c.generator, c.analyser}) {
+      if (QGraphicsEllipseItem* anchor = anchors[port]) anchor->setBrush(kLineColour);
+    }
+    // From the rim of one port's circle to the other's.
+    auto* line = new LineItem(from->second + QPointF(kAnchor, 0), to->second - QPointF(kAnchor, 0));
     line->setData(kRoleKind, kLine);
     line->setData(kRoleFirst, QString::fromStdString(c.generator));
     line->setData(kRoleSecond, QString::fromStdString(c.analyser));
@@ -171,6 +180,7 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
   }
   scene()->setSceneRect(scene()->itemsBoundingRect().adjusted(-kPad, -kPad, kPad, kPad));
   if (hadSelection) SelectConnection(selected);
+  if (mFitting) Fit();
 }
 
 void SchemeView::SetReadOnly(bool readOnly) {
@@ -219,12 +229,19 @@ int SchemeView::NumLines() const {
 void SchemeView::ZoomBy(double factor) {
   const double zoom = std::clamp(Zoom() * factor, kMinZoom, kMaxZoom);
   scale(zoom / Zoom(), zoom / Zoom());
+  mFitting = false;
 }
 
 void SchemeView::Fit() {
+  mFitting = true;
   fitInView(scene()->sceneRect(), Qt::KeepAspectRatio);
   // A small rack is shown at its natural size rather than blown up.
   if (Zoom() > 1) setTransform(QTransform());
+}
+
+void SchemeView::resizeEvent(QResizeEvent* event) {
+  QGraphicsView::resizeEvent(event);
+  if (mFitting) Fit();
 }
 
 QGraphicsItem* SchemeView::PortAt(const QPoint& pos) const {

@@ -18,7 +18,8 @@ class QGraphicsLineItem;
 // The view only draws and asks: dragging from a port to another asks for a connection, Delete
 // (or the context menu) on a selected line asks for its removal; the owner sends them and
 // draws what the server then holds. Ctrl+wheel, Ctrl+plus and Ctrl+minus zoom, Ctrl+0 fits;
-// dragging empty space or the scroll bars pan. Read-only, it asks for nothing.
+// dragging empty space or the scroll bars pan. Until the user zooms, the scheme is fitted to the
+// view whenever its size changes. Read-only, it asks for nothing.
 class SchemeView : public QGraphicsView {
   Q_OBJECT
 
@@ -58,6 +59,7 @@ class SchemeView : public QGraphicsView {
   void mouseReleaseEvent(QMouseEvent* event) override;
   void keyPressEvent(QKeyEvent* event) override;
   void contextMenuEvent(QContextMenuEvent* event) override;
+  void resizeEvent(QResizeEvent* event) override;
 
  private:
   // The port (its row) under a view position, null when none.
@@ -70,6 +72,7 @@ class SchemeView : public QGraphicsView {
 
   std::map<Dstring, QPointF> mAnchors;  // by port path
   bool mReadOnly = false;
+  bool mFitting = true;  // follows the window's size until the user zooms
   QGraphicsItem* mDragFrom = nullptr;
   QGraphicsLineItem* mRubber = nullptr;
 };

@@ -1,6 +1,7 @@
 #include "windows/bconnect/BconnectConnectWin.h"
 
 #include <QFileDialog>
+#include <QGraphicsScene>
 #include <QLabel>
 #include <QLayout>
 #include <QPushButton>
@@ -46,6 +47,8 @@ BconnectConnectWin::BconnectConnectWin(QWidget* parent) : QWidget(parent), mLock
 }
 
 BconnectConnectWin::~BconnectConnectWin() {
+  // The view and its scene die after this window's part of the object: no more news from them.
+  if (mView != nullptr) mView->scene()->disconnect(this);
   ConditionList list;
   if (mRegistered) uiapp::GetDirtyFlagDs()->UnregisterProc(&DirtyFlagProc, &DirtyFlagMatch, this);
   if (uiapp::GetGuiLockDs() != nullptr) uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
@@ -83,13 +86,13 @@ int BconnectConnectWin::Load(ConditionList& list) {
     Disconnect(generator.toStdString(), analyser.toStdString(), l);
     BoundControl::Report(l);
   });
+  connect(mView->scene(), &QGraphicsScene::selectionChanged, this, &BconnectConnectWin::ShowSelection);
   if (DirtyFlagDs* dirty = uiapp::GetDirtyFlagDs()) {
     dirty->RegisterProc(&DirtyFlagProc, &DirtyFlagMatch, this);
     mRegistered = true;
   }
   if (uiapp::GetGuiLockDs() != nullptr) uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
   const int status = Refresh(list);
-  mView->Fit();
   ShowLock();
   return status == FWBlocker::kLocked ? 0 : status;
 }
@@ -146,9 +149,20 @@ int BconnectConnectWin::Disconnect(const Dstring& generator, const Dstring& anal
 }
 
 void BconnectConnectWin::ShowLock() {
-  const bool locked = IsLocked();
-  mView->SetReadOnly(locked);
-  Say(locked ? kLocked : kHint);
+  mView->SetReadOnly(IsLocked());
+  ShowSelection();
+}
+
+void BconnectConnectWin::ShowSelection() {
+  CPortConnections::Connection selected;
+  if (IsLocked()) {
+    Say(kLocked);
+  } else if (mView->SelectedConnection(selected)) {
+    Say(QStringLiteral("Selected: %1 drives %2. Delete removes the connection.")
+            .arg(PortName(selected.generator), PortName(selected.analyser)));
+  } else {
+    Say(kHint);
+  }
 }
 
 void BconnectConnectWin::Say(const QString& text) { mState->setText(text); }

@@ -46,6 +46,8 @@ class BconnectConnectWin : public QWidget {
   int RunEdit(const char* guard, const QString& done, Edit edit, ConditionList& list);
   void Draw();
   void ShowLock();
+  // What the user can do now: the selected connection, else how to draw one, or the lock.
+  void ShowSelection();
   void Say(const QString& text);
   void HitPButExport(bool svg);
 
