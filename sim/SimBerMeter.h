@@ -8,7 +8,8 @@
 // The bit error rate of every analyser data port (":CGR<n>:MOD<m>:CONN<k>:BER?", replied
 // as "compared,errors,ratio"). Counting starts afresh with every start of the instrument and
 // stops with it; each port compares one bit per clock of its group and sees errors at a ratio
-// of its own, so that the figures differ between ports and grow believably while it runs.
+// of its own, so that the figures differ between ports and grow believably while it runs; a
+// port that no generator drives (SimConnections) compares nothing.
 // "<port>:BER:RES" starts a port's counts afresh; with test control, "<port>:BER:INJ RATIO"
 // sets the ratio its errors come at (0 goes back to the port's own).
 class SimConnections;
