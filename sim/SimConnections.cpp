@@ -7,7 +7,9 @@ namespace {
 
 constexpr std::string_view kStem = ":CONF:CONN";
 
-bool IsData(const SimRack::Place& place) { return place.port->type == "PDAT"; }
+bool IsData(const SimRack::Place& place) {
+  return place.port->type == "PDAT";
+}
 
 }  // namespace
 
@@ -20,7 +22,8 @@ SimConnections::SimConnections(const SimRack& rack) : mRack(rack) {
       }
     }
     for (std::size_t k = 0; k < analysers.size() && k < generators.size(); ++k) {
-      if (Refusal(generators[k], analysers[k]).empty()) mDrivers[analysers[k].port->path] = generators[k].port->path;
+      if (Refusal(generators[k], analysers[k]).empty())
+        mDrivers[analysers[k].port->path] = generators[k].port->path;
     }
   }
 }

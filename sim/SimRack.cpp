@@ -1,8 +1,12 @@
 #include "SimRack.h"
 
-void SimRack::AddModule(const Module& module) { mGroups.back().modules.push_back(module); }
+void SimRack::AddModule(const Module& module) {
+  mGroups.back().modules.push_back(module);
+}
 
-void SimRack::AddPort(const Port& port) { mGroups.back().modules.back().ports.push_back(port); }
+void SimRack::AddPort(const Port& port) {
+  mGroups.back().modules.back().ports.push_back(port);
+}
 
 bool SimRack::Find(const Dstring& path, Place& place) const {
   const Dstring wanted = path.ToUpper();
@@ -25,7 +29,8 @@ Dstring SimRack::Format() const {
     if (!out.empty()) out += ",";
     out += Dstring::Format("(%ld", g.number);
     for (const Module& m : g.modules) {
-      out += Dstring::Format(",(\"%s\",\"%s\",%s,%ld", m.path.c_str(), m.model.c_str(), m.generator ? "GEN" : "ANA", m.slot);
+      out += Dstring::Format(",(\"%s\",\"%s\",%s,%ld", m.path.c_str(), m.model.c_str(),
+                             m.generator ? "GEN" : "ANA", m.slot);
       for (const Port& p : m.ports) {
         out += Dstring::Format(",(\"%s\",\"%s\",%ld)", p.path.c_str(), p.type.c_str(), p.terminals);
       }

@@ -33,6 +33,15 @@ bool IsBelow(const Dstring& path, const Dstring& within, std::string_view elemen
   return true;
 }
 
+// A model name is shown as it is: something to show, and no control characters.
+bool IsShowable(const Dstring& text) {
+  if (text.empty()) return false;
+  for (char c : text) {
+    if (static_cast<unsigned char>(c) < 0x20 || c == 0x7f) return false;
+  }
+  return true;
+}
+
 bool ReadPort(const LispList& e, const Dstring& module, CFrontendInfo::Port& port) {
   return e.IsList() && e.Size() == 3 && Text(e[0], port.path) && IsBelow(port.path, module, ":CONN") &&
          Text(e[1], port.portClass) && (port.portClass == "PDAT" || port.portClass == "PCLK") &&
@@ -42,8 +51,8 @@ bool ReadPort(const LispList& e, const Dstring& module, CFrontendInfo::Port& por
 bool ReadModule(const LispList& e, const Dstring& group, CFrontendInfo::Module& module) {
   Dstring kind;
   if (!(e.IsList() && e.Size() >= 4 && Text(e[0], module.path) && IsBelow(module.path, group, ":MOD") &&
-        Text(e[1], module.model) && !module.model.empty() && Text(e[2], kind) && (kind == "GEN" || kind == "ANA") &&
-        Positive(e[3], module.slot))) {
+        Text(e[1], module.model) && IsShowable(module.model) && Text(e[2], kind) &&
+        (kind == "GEN" || kind == "ANA") && Positive(e[3], module.slot))) {
     return false;
   }
   module.generator = kind == "GEN";
@@ -59,7 +68,8 @@ bool ReadGroup(const LispList& e, std::set<long>& slots, CFrontendInfo::Group& g
   const Dstring path = Dstring::Format(":CGR%ld", group.number);
   for (std::size_t i = 1; i < e.Size(); ++i) {
     group.modules.emplace_back();
-    if (!ReadModule(e[i], path, group.modules.back()) || !slots.insert(group.modules.back().slot).second) return false;
+    if (!ReadModule(e[i], path, group.modules.back()) || !slots.insert(group.modules.back().slot).second)
+      return false;
   }
   return true;
 }

@@ -52,8 +52,8 @@ int CPortConnections::Change(const char* verb, const Dstring& generator, const D
   if (int status = CommandText::CheckArgument(generator, cond)) return status;
   if (int status = CommandText::CheckArgument(analyser, cond)) return status;
   Dstring reply;
-  const Dstring cmd = Dstring::Format("%s:CONF:CONN:%s \"%s\",\"%s\"", QenGuiInst::GetAppHandle().c_str(), verb,
-                                      generator.c_str(), analyser.c_str());
+  const Dstring cmd = Dstring::Format("%s:CONF:CONN:%s \"%s\",\"%s\"", QenGuiInst::GetAppHandle().c_str(),
+                                      verb, generator.c_str(), analyser.c_str());
   const int status = QenGuiInst::Call(cmd, reply, cond);
   if (status == QenStatus::kLocked) return status;
   // A refused change may still follow another client's: show what the server holds.

@@ -10,11 +10,13 @@
 namespace {
 
 constexpr const char* kRack =
-    "(1,(\":CGR1:MOD1\",\"K2268A\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8),(\":CGR1:MOD1:CONN3\",\"PCLK\",1)),"
+    "(1,(\":CGR1:MOD1\",\"K2268A\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8),(\":CGR1:MOD1:CONN3\",\"PCLK\",1))"
+    ","
     "(\":CGR1:MOD3\",\"K2270A\",ANA,3,(\":CGR1:MOD3:CONN1\",\"PDAT\",8))),(2)";
 constexpr const char* kPorts =
     "\"PATT\",\"\",(\":CGR1:MOD1:CONN1\",\"PDAT\",\"OUTPUT_PORT\",\"K2268A\"),"
-    "(\":CGR1:MOD1:CONN3\",\"PCLK\",\"OUTPUT_PORT\",\"K2268A\"),(\":CGR1:MOD3:CONN1\",\"PDAT\",\"INPUT_PORT\",\"K2270A\")";
+    "(\":CGR1:MOD1:CONN3\",\"PCLK\",\"OUTPUT_PORT\",\"K2268A\"),(\":CGR1:MOD3:CONN1\",\"PDAT\",\"INPUT_"
+    "PORT\",\"K2270A\")";
 
 class FrontendInfoTest : public InstrumentFixture {
  protected:
@@ -58,24 +60,25 @@ TEST_F(FrontendInfoTest, ReadsGroupsModulesAndPorts) {
 TEST_F(FrontendInfoTest, AMalformedReplyIsRefusedWholeAndTheOldOneKept) {
   ASSERT_EQ(CFrontendInfo::SetFrontend(kRack, mList), 0);
   const char* const bad[] = {
-      "1",                                                                      // a group that is no list
-      "()",                                                                     // no number
-      "(0)",                                                                    // group 0
-      "(\"1\")",                                                                // number as text
-      "(1,(\":CGR1:MOD1\",\"K\",GEN))",                                         // no slot
-      "(1,(\":CGR1:MOD1\",\"K\",BOTH,1))",                                      // kind
-      "(1,(\":CGR1:MOD1\",\"\",GEN,1))",                                        // no model
-      "(1,(\":CGR2:MOD1\",\"K\",GEN,1))",                                       // module of another group
-      "(1,(\":CGR1:MODX\",\"K\",GEN,1))",                                       // module number
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,0))",                                       // slot 0
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1),(\":CGR1:MOD2\",\"K\",ANA,1))",          // one slot twice
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD2:CONN1\",\"PDAT\",8)))",     // port of another module
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PXXX\",8)))",     // class
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",0)))",     // no terminals
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8.5)))",   // terminals not whole
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\")))",       // too short
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8,1)))",   // too long
-      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8)",       // cut short
+      "1",                                                                     // a group that is no list
+      "()",                                                                    // no number
+      "(0)",                                                                   // group 0
+      "(\"1\")",                                                               // number as text
+      "(1,(\":CGR1:MOD1\",\"K\",GEN))",                                        // no slot
+      "(1,(\":CGR1:MOD1\",\"K\",BOTH,1))",                                     // kind
+      "(1,(\":CGR1:MOD1\",\"\",GEN,1))",                                       // no model
+      "(1,(\":CGR1:MOD1\",\"K\n\",GEN,1))",                                    // a control character
+      "(1,(\":CGR2:MOD1\",\"K\",GEN,1))",                                      // module of another group
+      "(1,(\":CGR1:MODX\",\"K\",GEN,1))",                                      // module number
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,0))",                                      // slot 0
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1),(\":CGR1:MOD2\",\"K\",ANA,1))",         // one slot twice
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD2:CONN1\",\"PDAT\",8)))",    // port of another module
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PXXX\",8)))",    // class
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",0)))",    // no terminals
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8.5)))",  // terminals not whole
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\")))",      // too short
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8,1)))",  // too long
+      "(1,(\":CGR1:MOD1\",\"K\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8)",      // cut short
   };
   for (const char* reply : bad) {
     mList.Clear();
@@ -95,7 +98,8 @@ TEST_F(FrontendInfoTest, ReadOnceAndAgainWhenThePortInformationChanges) {
   Inst().Expect("_H:SGEN:GLOB:CONF?", Dstring(kPorts).replace(1, 4, "CAPT"));
   ASSERT_EQ(CPortInfo::Update(mList), 0);
   ASSERT_EQ(CFrontendInfo::Update(mList), 0);
-  Inst().Expect("_H:SGEN:GLOB:CONF?", "\"PATT\",\"\",(\":CGR1:MOD1:CONN1\",\"PDAT\",\"OUTPUT_PORT\",\"K2268A\")");
+  Inst().Expect("_H:SGEN:GLOB:CONF?",
+                "\"PATT\",\"\",(\":CGR1:MOD1:CONN1\",\"PDAT\",\"OUTPUT_PORT\",\"K2268A\")");
   ASSERT_EQ(CPortInfo::Update(mList), 0);
   Inst().Expect("_H:CONF:FRON?", "(1,(\":CGR1:MOD1\",\"K2268A\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8)))");
   ASSERT_EQ(CFrontendInfo::Update(mList), 0);
@@ -114,9 +118,10 @@ TEST_F(FrontendInfoTest, ReadOnceAndAgainWhenThePortInformationChanges) {
 
 TEST_F(FrontendInfoTest, ConnectionListsGoodAndMalformed) {
   CPortConnections connections;
-  ASSERT_EQ(connections.SetConnections("(\":CGR1:MOD1:CONN1\",\":CGR1:MOD3:CONN1\"),(\":CGR1:MOD1:CONN2\",\":CGR1:MOD3:CONN2\")",
-                                       mList),
-            0);
+  ASSERT_EQ(
+      connections.SetConnections(
+          "(\":CGR1:MOD1:CONN1\",\":CGR1:MOD3:CONN1\"),(\":CGR1:MOD1:CONN2\",\":CGR1:MOD3:CONN2\")", mList),
+      0);
   ASSERT_EQ(connections.Get().size(), 2u);
   EXPECT_EQ(connections.Get()[1], (CPortConnections::Connection{":CGR1:MOD1:CONN2", ":CGR1:MOD3:CONN2"}));
   const char* const bad[] = {

@@ -33,14 +33,19 @@ class SimConnectionsTest : public SimFixture {
 };
 
 TEST_F(SimConnectionsTest, FrontendOfTheBuiltInRack) {
-  EXPECT_EQ(Text(":_H:CONF:FRON?"),
-            "(1,(\":CGR1:MOD1\",\"K2268A\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8),(\":CGR1:MOD1:CONN2\",\"PDAT\",8),"
-            "(\":CGR1:MOD1:CONN3\",\"PCLK\",1)),"
-            "(\":CGR1:MOD2\",\"K2269B\",GEN,2,(\":CGR1:MOD2:CONN1\",\"PDAT\",8),(\":CGR1:MOD2:CONN2\",\"PDAT\",8)),"
-            "(\":CGR1:MOD3\",\"K2270A\",ANA,3,(\":CGR1:MOD3:CONN1\",\"PDAT\",8),(\":CGR1:MOD3:CONN2\",\"PDAT\",8))),"
-            "(2,(\":CGR2:MOD1\",\"K2268B\",GEN,4,(\":CGR2:MOD1:CONN1\",\"PDAT\",8),(\":CGR2:MOD1:CONN2\",\"PDAT\",8),"
-            "(\":CGR2:MOD1:CONN3\",\"PCLK\",1)),"
-            "(\":CGR2:MOD2\",\"K2270A\",ANA,5,(\":CGR2:MOD2:CONN1\",\"PDAT\",8),(\":CGR2:MOD2:CONN2\",\"PDAT\",8)))");
+  EXPECT_EQ(
+      Text(":_H:CONF:FRON?"),
+      "(1,(\":CGR1:MOD1\",\"K2268A\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8),(\":CGR1:MOD1:CONN2\",\"PDAT\","
+      "8),"
+      "(\":CGR1:MOD1:CONN3\",\"PCLK\",1)),"
+      "(\":CGR1:MOD2\",\"K2269B\",GEN,2,(\":CGR1:MOD2:CONN1\",\"PDAT\",8),(\":CGR1:MOD2:CONN2\",\"PDAT\",8)),"
+      "(\":CGR1:MOD3\",\"K2270A\",ANA,3,(\":CGR1:MOD3:CONN1\",\"PDAT\",8),(\":CGR1:MOD3:CONN2\",\"PDAT\",8)))"
+      ","
+      "(2,(\":CGR2:MOD1\",\"K2268B\",GEN,4,(\":CGR2:MOD1:CONN1\",\"PDAT\",8),(\":CGR2:MOD1:CONN2\",\"PDAT\","
+      "8),"
+      "(\":CGR2:MOD1:CONN3\",\"PCLK\",1)),"
+      "(\":CGR2:MOD2\",\"K2270A\",ANA,5,(\":CGR2:MOD2:CONN1\",\"PDAT\",8),(\":CGR2:MOD2:CONN2\",\"PDAT\",8))"
+      ")");
   EXPECT_EQ(Refusal(":_H:CONF:FRON 1"), std::make_pair(1, std::string("-200,\"Execution error\"")));
 }
 
@@ -69,14 +74,18 @@ TEST_F(SimConnectionsTest, RefusesWhatARackForbidsAndKeepsTheTable) {
        "-221,\"Settings conflict; :CGR1:MOD3:CONN1 is driven by :CGR1:MOD1:CONN1 already\""},
       {Add(":CGR1:MOD1:CONN1", ":CGR1:MOD3:CONN2"),
        "-221,\"Settings conflict; :CGR1:MOD1:CONN1 drives :CGR1:MOD3:CONN1 already\""},
-      {Add(":CGR2:MOD1:CONN1", ":CGR1:MOD3:CONN2"), "-221,\"Settings conflict; the ports are in different clock groups\""},
+      {Add(":CGR2:MOD1:CONN1", ":CGR1:MOD3:CONN2"),
+       "-221,\"Settings conflict; the ports are in different clock groups\""},
       {Add(":CGR1:MOD1:CONN3", ":CGR1:MOD3:CONN2"),
        "-221,\"Settings conflict; :CGR1:MOD1:CONN3 is a clock port; only data ports are connected\""},
       {Add(":CGR1:MOD3:CONN1", ":CGR1:MOD3:CONN2"),
-       "-221,\"Settings conflict; :CGR1:MOD3:CONN1 is an analyser port; a connection starts at a generator port\""},
+       "-221,\"Settings conflict; :CGR1:MOD3:CONN1 is an analyser port; a connection starts at a generator "
+       "port\""},
       {Add(":CGR1:MOD2:CONN2", ":CGR1:MOD2:CONN1"),
-       "-221,\"Settings conflict; :CGR1:MOD2:CONN1 is a generator port; a connection ends at an analyser port\""},
-      {Add(":CGR9:MOD1:CONN1", ":CGR1:MOD3:CONN2"), "-224,\"Illegal parameter value; the rack has no port :CGR9:MOD1:CONN1\""},
+       "-221,\"Settings conflict; :CGR1:MOD2:CONN1 is a generator port; a connection ends at an analyser "
+       "port\""},
+      {Add(":CGR9:MOD1:CONN1", ":CGR1:MOD3:CONN2"),
+       "-224,\"Illegal parameter value; the rack has no port :CGR9:MOD1:CONN1\""},
       {Add("a\"\"b", ":CGR1:MOD3:CONN2"), "-224,\"Illegal parameter value; the rack has no port a\"\"b\""},
       {Del(":CGR1:MOD2:CONN1", ":CGR1:MOD3:CONN1"),
        "-224,\"Illegal parameter value; :CGR1:MOD2:CONN1 does not drive :CGR1:MOD3:CONN1\""},
@@ -94,10 +103,11 @@ TEST_F(SimConnectionsTest, RefusesWhatARackForbidsAndKeepsTheTable) {
 }
 
 TEST_F(SimConnectionsTest, PortsOfDifferentWidthsAreNotConnected) {
-  SimCommandProcessor sim(Load("model G generator terminals=16\nmodel N generator terminals=4\nmodel A analyser terminals=16\n"
-                               "template port\nparam {port}:OUTP bool OFF\nend\n"
-                               "group 1\nmodule 1 G slot=7\nport 1 PDAT\nmodule 2 N\nport 1 PDAT\nmodule 3 A\nport 1 PDAT\n"),
-                          mClock, false);
+  SimCommandProcessor sim(
+      Load("model G generator terminals=16\nmodel N generator terminals=4\nmodel A analyser terminals=16\n"
+           "template port\nparam {port}:OUTP bool OFF\nend\n"
+           "group 1\nmodule 1 G slot=7\nport 1 PDAT\nmodule 2 N\nport 1 PDAT\nmodule 3 A\nport 1 PDAT\n"),
+      mClock, false);
   sim.Execute(kConn, ":QEN:INST:HAND:CRE? _H,\"PSX\",\"SIM\"");
   EXPECT_EQ(sim.Execute(kConn, ":_H:CONF:FRON?").text,
             "(1,(\":CGR1:MOD1\",\"G\",GEN,7,(\":CGR1:MOD1:CONN1\",\"PDAT\",16)),"

@@ -113,14 +113,18 @@ TEST_F(ConnectWinTest, ZoomsWithKeysAndTheWheelAndFits) {
   QCoreApplication::processEvents();
   EXPECT_NEAR(view->Zoom(), fitted / 1.25 * 1.15 * 1.15, 1e-9);
   QTest::keyClick(view, Qt::Key_0, Qt::ControlModifier);
-  EXPECT_TRUE(view->viewport()->rect().adjusted(-2, -2, 2, 2).contains(view->mapFromScene(view->scene()->sceneRect()).boundingRect()));
+  EXPECT_TRUE(view->viewport()
+                  ->rect()
+                  .adjusted(-2, -2, 2, 2)
+                  .contains(view->mapFromScene(view->scene()->sceneRect()).boundingRect()));
 }
 
 TEST_F(ConnectWinTest, ARemovedAndADrawnConnectionReachTheOtherClient) {
   // Select the line and press Delete.
   ASSERT_TRUE(mWin->View()->SelectConnection({kGen1, kAna1}));
-  EXPECT_EQ(mWin->StateText(),
-            QStringLiteral("Selected: CGR1 MOD1 CONN1 drives CGR1 MOD3 CONN1. Delete removes the connection."));
+  EXPECT_EQ(
+      mWin->StateText(),
+      QStringLiteral("Selected: CGR1 MOD1 CONN1 drives CGR1 MOD3 CONN1. Delete removes the connection."));
   QTest::keyClick(mWin->View(), Qt::Key_Delete);
   QCoreApplication::processEvents();
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
@@ -148,8 +152,10 @@ TEST_F(ConnectWinTest, ARemovedAndADrawnConnectionReachTheOtherClient) {
 TEST_F(ConnectWinTest, AnImpossibleConnectionIsRefusedAndNothingWritten) {
   Drag(kGen2, kAna1);  // driven already
   ASSERT_EQ(mAlerts.size(), 1u);
-  EXPECT_NE(mAlerts[0].find(":CGR1:MOD3:CONN1 is driven by :CGR1:MOD1:CONN1 already"), std::string::npos) << mAlerts[0];
-  EXPECT_TRUE(mWin->StateText().startsWith(QStringLiteral("Refused: Settings conflict; :CGR1:MOD3:CONN1 is driven by")))
+  EXPECT_NE(mAlerts[0].find(":CGR1:MOD3:CONN1 is driven by :CGR1:MOD1:CONN1 already"), std::string::npos)
+      << mAlerts[0];
+  EXPECT_TRUE(mWin->StateText().startsWith(
+      QStringLiteral("Refused: Settings conflict; :CGR1:MOD3:CONN1 is driven by")))
       << mWin->StateText().toStdString();
   EXPECT_EQ(Other(":CONF:CONN?"), kDefault);
   EXPECT_EQ(mWin->View()->NumLines(), 4);
@@ -225,7 +231,8 @@ TEST_F(ConnectWinTest, ExportsAValidPngAndAnSvgThatNamesTheModules) {
   }
   ASSERT_FALSE(xml.hasError()) << xml.errorString().toStdString();
   EXPECT_TRUE(root);
-  for (const char* model : {"K2268A", "K2269B", "K2270A", "K2268B"}) EXPECT_TRUE(text.contains(QLatin1String(model))) << model;
+  for (const char* model : {"K2268A", "K2269B", "K2270A", "K2268B"})
+    EXPECT_TRUE(text.contains(QLatin1String(model))) << model;
 
   EXPECT_EQ(mWin->ExportPng("/nonexistent/dir/x.png", mList), 1);
   EXPECT_EQ(mList.Last().GetKey(), "GUI_SCHEME_EXPORT_FAILED");

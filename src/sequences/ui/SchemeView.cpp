@@ -46,7 +46,9 @@ QString Tail(const Dstring& path) {
   return QString::fromStdString(path.substr(at == Dstring::npos ? 0 : at + 1));
 }
 
-QString Text(const QGraphicsItem* item, int role) { return item->data(role).toString(); }
+QString Text(const QGraphicsItem* item, int role) {
+  return item->data(role).toString();
+}
 
 // A connection: a curve from a generator port to an analyser port that is easy to hit and
 // shows its selection in its own colour.
@@ -72,7 +74,8 @@ class LineItem : public QGraphicsPathItem {
   }
 };
 
-QGraphicsSimpleTextItem* Label(const QString& text, QGraphicsItem* parent, const QPointF& at, bool bold = false) {
+QGraphicsSimpleTextItem* Label(const QString& text, QGraphicsItem* parent, const QPointF& at,
+                               bool bold = false) {
   auto* label = new QGraphicsSimpleTextItem(text, parent);
   QFont font = label->font();
   font.setBold(bold);
@@ -81,7 +84,9 @@ QGraphicsSimpleTextItem* Label(const QString& text, QGraphicsItem* parent, const
   return label;
 }
 
-double ModuleHeight(const CFrontendInfo::Module& m) { return kHeader + kRow * static_cast<double>(m.ports.size()); }
+double ModuleHeight(const CFrontendInfo::Module& m) {
+  return kHeader + kRow * static_cast<double>(m.ports.size());
+}
 
 }  // namespace
 
@@ -108,10 +113,11 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
   double top = 0;
   for (const CFrontendInfo::Group& g : groups) {
     double heights[2] = {0, 0};
-    for (const CFrontendInfo::Module& m : g.modules) heights[m.generator ? 0 : 1] += ModuleHeight(m) + kModuleGap;
+    for (const CFrontendInfo::Module& m : g.modules)
+      heights[m.generator ? 0 : 1] += ModuleHeight(m) + kModuleGap;
     const double height = kGroupTitle + std::max({heights[0], heights[1], kRow}) + kPad;
-    auto* frame = scene()->addRect(0, 0, 2 * kPad + 2 * kModuleWidth + kColumnGap, height, QPen(QColor(0x80, 0x80, 0x80), 1.5),
-                                   QColor(0xfc, 0xfc, 0xfc));
+    auto* frame = scene()->addRect(0, 0, 2 * kPad + 2 * kModuleWidth + kColumnGap, height,
+                                   QPen(QColor(0x80, 0x80, 0x80), 1.5), QColor(0xfc, 0xfc, 0xfc));
     frame->setPos(0, top);
     Label(QStringLiteral("Clock group %1").arg(g.number), frame, {kPad, 6}, true);
     double y[2] = {kGroupTitle, kGroupTitle};
@@ -125,7 +131,9 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
       header->setPen(Qt::NoPen);
       header->setBrush(m.generator ? kGeneratorColour : kAnalyserColour);
       Label(QStringLiteral("%1   %2").arg(Tail(m.path), QString::fromStdString(m.model)), box, {8, 4}, true);
-      Label(QStringLiteral("Slot %1 · %2").arg(m.slot).arg(m.generator ? QStringLiteral("generator") : QStringLiteral("analyser")),
+      Label(QStringLiteral("Slot %1 · %2")
+                .arg(m.slot)
+                .arg(m.generator ? QStringLiteral("generator") : QStringLiteral("analyser")),
             box, {8, 22});
       double rowTop = kHeader;
       for (const CFrontendInfo::Port& p : m.ports) {
@@ -135,9 +143,14 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
         row->setPos(0, rowTop);
         row->setData(kRoleKind, kPort);
         row->setData(kRoleFirst, QString::fromStdString(p.path));
-        row->setData(kRoleSecond, !data ? QStringLiteral("CLOCK") : m.generator ? QStringLiteral("GEN") : QStringLiteral("ANA"));
+        row->setData(kRoleSecond, !data         ? QStringLiteral("CLOCK")
+                                  : m.generator ? QStringLiteral("GEN")
+                                                : QStringLiteral("ANA"));
         const double textX = m.generator ? 10 : 18;
-        Label(data ? QStringLiteral("%1  data · %2 terminal%3").arg(Tail(p.path)).arg(p.terminals).arg(p.terminals == 1 ? "" : "s")
+        Label(data ? QStringLiteral("%1  data · %2 terminal%3")
+                         .arg(Tail(p.path))
+                         .arg(p.terminals)
+                         .arg(p.terminals == 1 ? "" : "s")
                    : QStringLiteral("%1  clock").arg(Tail(p.path)),
               row, {textX, 7});
         const int ticks = static_cast<int>(std::min<long>(p.terminals, kMaxTicks));
@@ -149,13 +162,17 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
           tick->setPos(tickRight - (ticks - t) * 5.0, 10);
         }
         const double anchorX = m.generator ? kModuleWidth : 0;
-        auto* anchor = new QGraphicsEllipseItem(anchorX - kAnchor, kRow / 2 - kAnchor, 2 * kAnchor, 2 * kAnchor, row);
+        auto* anchor =
+            new QGraphicsEllipseItem(anchorX - kAnchor, kRow / 2 - kAnchor, 2 * kAnchor, 2 * kAnchor, row);
         anchor->setPen(QPen(data ? kLineColour : QColor(0x90, 0x90, 0x90), 1.5));
         anchor->setBrush(Qt::white);
         anchors[p.path] = anchor;
-        row->setToolTip(!data ? QStringLiteral("%1: a clock output; it is not connected here").arg(QString::fromStdString(p.path))
-                        : m.generator ? QStringLiteral("%1: drag to an analyser port to connect").arg(QString::fromStdString(p.path))
-                                      : QStringLiteral("%1: drag to a generator port to connect").arg(QString::fromStdString(p.path)));
+        row->setToolTip(!data ? QStringLiteral("%1: a clock output; it is not connected here")
+                                    .arg(QString::fromStdString(p.path))
+                        : m.generator ? QStringLiteral("%1: drag to an analyser port to connect")
+                                            .arg(QString::fromStdString(p.path))
+                                      : QStringLiteral("%1: drag to a generator port to connect")
+                                            .arg(QString::fromStdString(p.path)));
         mAnchors[p.path] = row->mapToScene(anchorX, kRow / 2);
         rowTop += kRow;
       }
@@ -175,9 +192,11 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
     line->setData(kRoleKind, kLine);
     line->setData(kRoleFirst, QString::fromStdString(c.generator));
     line->setData(kRoleSecond, QString::fromStdString(c.analyser));
-    line->setToolTip(QStringLiteral("%1 → %2").arg(QString::fromStdString(c.generator), QString::fromStdString(c.analyser)));
+    line->setToolTip(QStringLiteral("%1 → %2").arg(QString::fromStdString(c.generator),
+                                                   QString::fromStdString(c.analyser)));
     scene()->addItem(line);
   }
+  if (groups.empty()) scene()->addSimpleText(QStringLiteral("The instrument reports no modules."));
   scene()->setSceneRect(scene()->itemsBoundingRect().adjusted(-kPad, -kPad, kPad, kPad));
   if (hadSelection) SelectConnection(selected);
   if (mFitting) Fit();
@@ -222,8 +241,8 @@ bool SchemeView::SelectConnection(const CPortConnections::Connection& connection
 
 int SchemeView::NumLines() const {
   const QList<QGraphicsItem*> all = scene()->items();
-  return static_cast<int>(
-      std::count_if(all.begin(), all.end(), [](const QGraphicsItem* item) { return Text(item, kRoleKind) == kLine; }));
+  return static_cast<int>(std::count_if(
+      all.begin(), all.end(), [](const QGraphicsItem* item) { return Text(item, kRoleKind) == kLine; }));
 }
 
 void SchemeView::ZoomBy(double factor) {
@@ -271,7 +290,8 @@ void SchemeView::wheelEvent(QWheelEvent* event) {
 
 void SchemeView::mousePressEvent(QMouseEvent* event) {
   QGraphicsItem* port = event->button() == Qt::LeftButton && !mReadOnly ? PortAt(event->pos()) : nullptr;
-  if (port == nullptr || Text(port, kRoleSecond) == QStringLiteral("CLOCK")) return QGraphicsView::mousePressEvent(event);
+  if (port == nullptr || Text(port, kRoleSecond) == QStringLiteral("CLOCK"))
+    return QGraphicsView::mousePressEvent(event);
   mDragFrom = port;
   QPointF from;
   PortAnchor(Text(port, kRoleFirst).toStdString(), from);
@@ -296,7 +316,8 @@ void SchemeView::mouseReleaseEvent(QMouseEvent* event) {
   event->accept();
   if (to == nullptr || to == from) return;
   // Dragged the other way round, it still means the generator drives the analyser.
-  const bool reversed = Text(from, kRoleSecond) == QStringLiteral("ANA") && Text(to, kRoleSecond) == QStringLiteral("GEN");
+  const bool reversed =
+      Text(from, kRoleSecond) == QStringLiteral("ANA") && Text(to, kRoleSecond) == QStringLiteral("GEN");
   const QString a = Text(from, kRoleFirst);
   const QString b = Text(to, kRoleFirst);
   emit ConnectRequested(reversed ? b : a, reversed ? a : b);
@@ -325,10 +346,15 @@ void SchemeView::contextMenuEvent(QContextMenuEvent* event) {
   if (line != nullptr) {
     scene()->clearSelection();
     line->setSelected(true);
-    QAction* remove = menu.addAction(QStringLiteral("Remove Connection %1 → %2")
-                                         .arg(Text(line, kRoleFirst).mid(1), Text(line, kRoleSecond).mid(1)));
+    // A poll may draw the scheme anew while the menu is open: the action keeps the names.
+    const QString generator = Text(line, kRoleFirst);
+    const QString analyser = Text(line, kRoleSecond);
+    QAction* remove =
+        menu.addAction(QStringLiteral("Remove Connection %1 → %2").arg(generator.mid(1), analyser.mid(1)));
     remove->setEnabled(!mReadOnly);
-    connect(remove, &QAction::triggered, this, [this, line] { AskRemove(line); });
+    connect(remove, &QAction::triggered, this, [this, generator, analyser] {
+      if (!mReadOnly) emit RemoveRequested(generator, analyser);
+    });
     menu.addSeparator();
   }
   menu.addAction(QStringLiteral("Zoom In\tCtrl++"), this, [this] { ZoomBy(1.25); });

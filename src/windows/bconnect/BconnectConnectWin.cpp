@@ -5,6 +5,7 @@
 #include <QLabel>
 #include <QLayout>
 #include <QPushButton>
+#include <functional>
 
 #include "core/uiapp.h"
 #include "data/DirtyFlagDs.h"
@@ -20,13 +21,18 @@
 namespace {
 
 const QString kHint = QStringLiteral(
-    "Drag from a generator port to an analyser port to connect them; select a line and press Delete to remove it.");
+    "Drag from a generator port to an analyser port to connect them; select a line and press Delete to "
+    "remove it.");
 const QString kLocked = QStringLiteral(
     "Read-only: another client holds the instrument. The scheme shows the connections as last read.");
 
-bool IsLocked() { return uiapp::GetGuiLockDs() != nullptr && uiapp::GetGuiLockDs()->IsLocked(); }
+bool IsLocked() {
+  return uiapp::GetGuiLockDs() != nullptr && uiapp::GetGuiLockDs()->IsLocked();
+}
 
-QString PortName(const Dstring& path) { return QString::fromStdString(path).mid(1).replace(QLatin1Char(':'), QLatin1Char(' ')); }
+QString PortName(const Dstring& path) {
+  return QString::fromStdString(path).mid(1).replace(QLatin1Char(':'), QLatin1Char(' '));
+}
 
 }  // namespace
 
@@ -42,7 +48,8 @@ class BconnectConnectWin::LockView : public QenDsView {
   BconnectConnectWin& mWin;
 };
 
-BconnectConnectWin::BconnectConnectWin(QWidget* parent) : QWidget(parent), mLockView(std::make_unique<LockView>(*this)) {
+BconnectConnectWin::BconnectConnectWin(QWidget* parent)
+    : QWidget(parent), mLockView(std::make_unique<LockView>(*this)) {
   setObjectName(QStringLiteral("BconnectConnectWin"));
 }
 
@@ -50,7 +57,8 @@ BconnectConnectWin::~BconnectConnectWin() {
   // The view and its scene die after this window's part of the object: no more news from them.
   if (mView != nullptr) mView->scene()->disconnect(this);
   ConditionList list;
-  if (mRegistered) uiapp::GetDirtyFlagDs()->UnregisterProc(&DirtyFlagProc, &DirtyFlagMatch, this);
+  if (mRegistered && uiapp::GetDirtyFlagDs() != nullptr)
+    uiapp::GetDirtyFlagDs()->UnregisterProc(&DirtyFlagProc, &DirtyFlagMatch, this);
   if (uiapp::GetGuiLockDs() != nullptr) uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
 }
 
@@ -76,16 +84,18 @@ int BconnectConnectWin::Load(ConditionList& list) {
   for (const auto& [name, hit] : buttons) {
     if (auto* b = findChild<QPushButton*>(QLatin1String(name))) connect(b, &QPushButton::clicked, this, hit);
   }
-  connect(mView, &SchemeView::ConnectRequested, this, [this](const QString& generator, const QString& analyser) {
-    ConditionList l;
-    Connect(generator.toStdString(), analyser.toStdString(), l);
-    BoundControl::Report(l);
-  });
-  connect(mView, &SchemeView::RemoveRequested, this, [this](const QString& generator, const QString& analyser) {
-    ConditionList l;
-    Disconnect(generator.toStdString(), analyser.toStdString(), l);
-    BoundControl::Report(l);
-  });
+  connect(mView, &SchemeView::ConnectRequested, this,
+          [this](const QString& generator, const QString& analyser) {
+            ConditionList l;
+            Connect(generator.toStdString(), analyser.toStdString(), l);
+            BoundControl::Report(l);
+          });
+  connect(mView, &SchemeView::RemoveRequested, this,
+          [this](const QString& generator, const QString& analyser) {
+            ConditionList l;
+            Disconnect(generator.toStdString(), analyser.toStdString(), l);
+            BoundControl::Report(l);
+          });
   connect(mView->scene(), &QGraphicsScene::selectionChanged, this, &BconnectConnectWin::ShowSelection);
   if (DirtyFlagDs* dirty = uiapp::GetDirtyFlagDs()) {
     dirty->RegisterProc(&DirtyFlagProc, &DirtyFlagMatch, this);
@@ -101,7 +111,8 @@ int BconnectConnectWin::Refresh(ConditionList& list) {
   int status = CFrontendInfo::Update(list);
   if (status == 0) status = mConnections.Read(list);
   Draw();
-  if (status != 0 && status != FWBlocker::kLocked) Say(QStringLiteral("The scheme could not be read; see the error list."));
+  if (status != 0 && status != FWBlocker::kLocked)
+    Say(QStringLiteral("The scheme could not be read; see the error list."));
   return status;
 }
 
@@ -113,8 +124,10 @@ void BconnectConnectWin::Draw() {
       for (const CFrontendInfo::Port& p : m.ports) analysers += !m.generator && p.portClass == "PDAT";
     }
   }
-  mSummary->setText(analysers == 0 ? QStringLiteral("No analyser ports.")
-                                   : QStringLiteral("%1 of %2 analyser ports driven").arg(mConnections.Get().size()).arg(analysers));
+  mSummary->setText(
+      analysers == 0
+          ? QStringLiteral("No analyser ports.")
+          : QStringLiteral("%1 of %2 analyser ports driven").arg(mConnections.Get().size()).arg(analysers));
 }
 
 template <class Edit>
@@ -137,15 +150,17 @@ int BconnectConnectWin::RunEdit(const char* guard, const QString& done, Edit edi
 }
 
 int BconnectConnectWin::Connect(const Dstring& generator, const Dstring& analyser, ConditionList& list) {
-  return RunEdit("BconnectConnectWin::Connect",
-                 QStringLiteral("Connected %1 to %2.").arg(PortName(generator), PortName(analyser)),
-                 [&] { return mConnections.Add(generator, analyser, list); }, list);
+  return RunEdit(
+      "BconnectConnectWin::Connect",
+      QStringLiteral("Connected %1 to %2.").arg(PortName(generator), PortName(analyser)),
+      [&] { return mConnections.Add(generator, analyser, list); }, list);
 }
 
 int BconnectConnectWin::Disconnect(const Dstring& generator, const Dstring& analyser, ConditionList& list) {
-  return RunEdit("BconnectConnectWin::Disconnect",
-                 QStringLiteral("Removed the connection %1 to %2.").arg(PortName(generator), PortName(analyser)),
-                 [&] { return mConnections.Remove(generator, analyser, list); }, list);
+  return RunEdit(
+      "BconnectConnectWin::Disconnect",
+      QStringLiteral("Removed the connection %1 to %2.").arg(PortName(generator), PortName(analyser)),
+      [&] { return mConnections.Remove(generator, analyser, list); }, list);
 }
 
 void BconnectConnectWin::ShowLock() {
@@ -165,12 +180,22 @@ void BconnectConnectWin::ShowSelection() {
   }
 }
 
-void BconnectConnectWin::Say(const QString& text) { mState->setText(text); }
-QString BconnectConnectWin::StateText() const { return mState->text(); }
-QString BconnectConnectWin::SummaryText() const { return mSummary->text(); }
+void BconnectConnectWin::Say(const QString& text) {
+  mState->setText(text);
+}
+QString BconnectConnectWin::StateText() const {
+  return mState->text();
+}
+QString BconnectConnectWin::SummaryText() const {
+  return mSummary->text();
+}
 
-int BconnectConnectWin::ExportPng(const Dstring& path, ConditionList& list) { return mView->ExportPng(path, list); }
-int BconnectConnectWin::ExportSvg(const Dstring& path, ConditionList& list) { return mView->ExportSvg(path, list); }
+int BconnectConnectWin::ExportPng(const Dstring& path, ConditionList& list) {
+  return mView->ExportPng(path, list);
+}
+int BconnectConnectWin::ExportSvg(const Dstring& path, ConditionList& list) {
+  return mView->ExportSvg(path, list);
+}
 
 void BconnectConnectWin::HitPButExport(bool svg) {
   const QString path = QFileDialog::getSaveFileName(
