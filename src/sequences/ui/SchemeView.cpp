@@ -396,6 +396,8 @@ int SchemeView::ExportSvg(const Dstring& path, ConditionList& list) {
   svg.setFileName(QString::fromStdString(path));
   svg.setSize(rect.size().toSize());
   svg.setViewBox(QRectF(QPointF(0, 0), rect.size()));
+  // Texts in points come out the size they have on the screen.
+  svg.setResolution(logicalDpiY());
   svg.setTitle(QStringLiteral("System scheme"));
   svg.setDescription(QStringLiteral("The modules, ports and connections of the rack."));
   bool ok = false;
