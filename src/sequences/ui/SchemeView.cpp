@@ -105,6 +105,7 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
   CPortConnections::Connection selected;
   const bool hadSelection = SelectedConnection(selected);
   mDragFrom = nullptr;
+  mHover = nullptr;
   mRubber = nullptr;
   scene()->clear();
   mAnchors.clear();
@@ -208,6 +209,7 @@ void SchemeView::SetReadOnly(bool readOnly) {
     delete mRubber;
     mRubber = nullptr;
   }
+  Hover(nullptr);
   mDragFrom = nullptr;
 }
 
@@ -303,13 +305,23 @@ void SchemeView::mousePressEvent(QMouseEvent* event) {
 void SchemeView::mouseMoveEvent(QMouseEvent* event) {
   if (mRubber == nullptr) return QGraphicsView::mouseMoveEvent(event);
   mRubber->setLine(QLineF(mRubber->line().p1(), mapToScene(event->pos())));
+  QGraphicsItem* port = PortAt(event->pos());
+  Hover(port != mDragFrom && port != nullptr && Text(port, kRoleSecond) != QStringLiteral("CLOCK") ? port : nullptr);
   event->accept();
+}
+
+void SchemeView::Hover(QGraphicsItem* port) {
+  if (port == mHover) return;
+  if (auto* row = static_cast<QGraphicsRectItem*>(mHover)) row->setBrush(Qt::NoBrush);
+  if (auto* row = static_cast<QGraphicsRectItem*>(port)) row->setBrush(QColor(0xfd, 0xe8, 0xd0));
+  mHover = port;
 }
 
 void SchemeView::mouseReleaseEvent(QMouseEvent* event) {
   if (mRubber == nullptr) return QGraphicsView::mouseReleaseEvent(event);
   delete mRubber;
   mRubber = nullptr;
+  Hover(nullptr);
   const QGraphicsItem* from = mDragFrom;
   mDragFrom = nullptr;
   const QGraphicsItem* to = PortAt(event->pos());

@@ -73,6 +73,10 @@ class SchemeView : public QGraphicsView {
   std::map<Dstring, QPointF> mAnchors;  // by port path
   bool mReadOnly = false;
   bool mFitting = true;  // follows the window's size until the user zooms
+  // Marks the port a drag would connect to (null: none).
+  void Hover(QGraphicsItem* port);
+
   QGraphicsItem* mDragFrom = nullptr;
+  QGraphicsItem* mHover = nullptr;
   QGraphicsLineItem* mRubber = nullptr;
 };
