@@ -109,98 +109,103 @@ void SchemeView::SetScheme(const std::vector<CFrontendInfo::Group>& groups,
   mRubber = nullptr;
   scene()->clear();
   mAnchors.clear();
-  // A connected port's circle is filled.
-  std::map<Dstring, QGraphicsEllipseItem*> anchors;
   double top = 0;
-  for (const CFrontendInfo::Group& g : groups) {
-    double heights[2] = {0, 0};
-    for (const CFrontendInfo::Module& m : g.modules)
-      heights[m.generator ? 0 : 1] += ModuleHeight(m) + kModuleGap;
-    const double height = kGroupTitle + std::max({heights[0], heights[1], kRow}) + kPad;
-    auto* frame = scene()->addRect(0, 0, 2 * kPad + 2 * kModuleWidth + kColumnGap, height,
-                                   QPen(QColor(0x80, 0x80, 0x80), 1.5), QColor(0xfc, 0xfc, 0xfc));
-    frame->setPos(0, top);
-    Label(QStringLiteral("Clock group %1").arg(g.number), frame, {kPad, 6}, true);
-    double y[2] = {kGroupTitle, kGroupTitle};
-    for (const CFrontendInfo::Module& m : g.modules) {
-      const int column = m.generator ? 0 : 1;
-      auto* box = new QGraphicsRectItem(0, 0, kModuleWidth, ModuleHeight(m), frame);
-      box->setPen(QPen(QColor(0x60, 0x60, 0x60)));
-      box->setBrush(Qt::white);
-      box->setPos(kPad + column * (kModuleWidth + kColumnGap), y[column]);
-      auto* header = new QGraphicsRectItem(0, 0, kModuleWidth, kHeader, box);
-      header->setPen(Qt::NoPen);
-      header->setBrush(m.generator ? kGeneratorColour : kAnalyserColour);
-      Label(QStringLiteral("%1   %2").arg(Tail(m.path), QString::fromStdString(m.model)), box, {8, 4}, true);
-      Label(QStringLiteral("Slot %1 · %2")
-                .arg(m.slot)
-                .arg(m.generator ? QStringLiteral("generator") : QStringLiteral("analyser")),
-            box, {8, 22});
-      double rowTop = kHeader;
-      for (const CFrontendInfo::Port& p : m.ports) {
-        const bool data = p.portClass == "PDAT";
-        auto* row = new QGraphicsRectItem(0, 0, kModuleWidth, kRow, box);
-        row->setPen(QPen(QColor(0xe0, 0xe0, 0xe0)));
-        row->setPos(0, rowTop);
-        row->setData(kRoleKind, kPort);
-        row->setData(kRoleFirst, QString::fromStdString(p.path));
-        row->setData(kRoleSecond, !data         ? QStringLiteral("CLOCK")
-                                  : m.generator ? QStringLiteral("GEN")
-                                                : QStringLiteral("ANA"));
-        const double textX = m.generator ? 10 : 18;
-        Label(data ? QStringLiteral("%1  data · %2 terminal%3")
-                         .arg(Tail(p.path))
-                         .arg(p.terminals)
-                         .arg(p.terminals == 1 ? "" : "s")
-                   : QStringLiteral("%1  clock").arg(Tail(p.path)),
-              row, {textX, 7});
-        const int ticks = static_cast<int>(std::min<long>(p.terminals, kMaxTicks));
-        const double tickRight = m.generator ? kModuleWidth - 16 : kModuleWidth - 8;
-        for (int t = 0; t < ticks && data; ++t) {
-          auto* tick = new QGraphicsRectItem(0, 0, 3, 10, row);
-          tick->setPen(Qt::NoPen);
-          tick->setBrush(QColor(0x70, 0x70, 0x70));
-          tick->setPos(tickRight - (ticks - t) * 5.0, 10);
-        }
-        const double anchorX = m.generator ? kModuleWidth : 0;
-        auto* anchor =
-            new QGraphicsEllipseItem(anchorX - kAnchor, kRow / 2 - kAnchor, 2 * kAnchor, 2 * kAnchor, row);
-        anchor->setPen(QPen(data ? kLineColour : QColor(0x90, 0x90, 0x90), 1.5));
-        anchor->setBrush(Qt::white);
-        anchors[p.path] = anchor;
-        row->setToolTip(!data ? QStringLiteral("%1: a clock output; it is not connected here")
-                                    .arg(QString::fromStdString(p.path))
-                        : m.generator ? QStringLiteral("%1: drag to an analyser port to connect")
-                                            .arg(QString::fromStdString(p.path))
-                                      : QStringLiteral("%1: drag to a generator port to connect")
-                                            .arg(QString::fromStdString(p.path)));
-        mAnchors[p.path] = row->mapToScene(anchorX, kRow / 2);
-        rowTop += kRow;
-      }
-      y[column] += ModuleHeight(m) + kModuleGap;
-    }
-    top += height + kGroupGap;
-  }
-  for (const CPortConnections::Connection& c : connections) {
-    auto from = mAnchors.find(c.generator);
-    auto to = mAnchors.find(c.analyser);
-    if (from == mAnchors.end() || to == mAnchors.end()) continue;
-    for (const Dstring& port : {c.generator, c.analyser}) {
-      if (QGraphicsEllipseItem* anchor = anchors[port]) anchor->setBrush(kLineColour);
-    }
-    // From the rim of one port's circle to the other's.
-    auto* line = new LineItem(from->second + QPointF(kAnchor, 0), to->second - QPointF(kAnchor, 0));
-    line->setData(kRoleKind, kLine);
-    line->setData(kRoleFirst, QString::fromStdString(c.generator));
-    line->setData(kRoleSecond, QString::fromStdString(c.analyser));
-    line->setToolTip(QStringLiteral("%1 → %2").arg(QString::fromStdString(c.generator),
-                                                   QString::fromStdString(c.analyser)));
-    scene()->addItem(line);
-  }
+  for (const CFrontendInfo::Group& g : groups) top += AddGroup(g, top) + kGroupGap;
+  for (const CPortConnections::Connection& c : connections) AddLine(c);
   if (groups.empty()) scene()->addSimpleText(QStringLiteral("The instrument reports no modules."));
   scene()->setSceneRect(scene()->itemsBoundingRect().adjusted(-kPad, -kPad, kPad, kPad));
   if (hadSelection) SelectConnection(selected);
   if (mFitting) Fit();
+}
+
+double SchemeView::AddGroup(const CFrontendInfo::Group& group, double top) {
+  double heights[2] = {0, 0};
+  for (const CFrontendInfo::Module& m : group.modules)
+    heights[m.generator ? 0 : 1] += ModuleHeight(m) + kModuleGap;
+  const double height = kGroupTitle + std::max({heights[0], heights[1], kRow}) + kPad;
+  auto* frame = scene()->addRect(0, 0, 2 * kPad + 2 * kModuleWidth + kColumnGap, height,
+                                 QPen(QColor(0x80, 0x80, 0x80), 1.5), QColor(0xfc, 0xfc, 0xfc));
+  frame->setPos(0, top);
+  Label(QStringLiteral("Clock group %1").arg(group.number), frame, {kPad, 6}, true);
+  double y[2] = {kGroupTitle, kGroupTitle};
+  for (const CFrontendInfo::Module& m : group.modules) {
+    const int column = m.generator ? 0 : 1;
+    AddModule(m, frame, {kPad + column * (kModuleWidth + kColumnGap), y[column]});
+    y[column] += ModuleHeight(m) + kModuleGap;
+  }
+  return height;
+}
+
+void SchemeView::AddModule(const CFrontendInfo::Module& module, QGraphicsItem* frame, const QPointF& at) {
+  auto* box = new QGraphicsRectItem(0, 0, kModuleWidth, ModuleHeight(module), frame);
+  box->setPen(QPen(QColor(0x60, 0x60, 0x60)));
+  box->setBrush(Qt::white);
+  box->setPos(at);
+  auto* header = new QGraphicsRectItem(0, 0, kModuleWidth, kHeader, box);
+  header->setPen(Qt::NoPen);
+  header->setBrush(module.generator ? kGeneratorColour : kAnalyserColour);
+  Label(QStringLiteral("%1   %2").arg(Tail(module.path), QString::fromStdString(module.model)), box, {8, 4},
+        true);
+  Label(QStringLiteral("Slot %1 · %2")
+            .arg(module.slot)
+            .arg(module.generator ? QStringLiteral("generator") : QStringLiteral("analyser")),
+        box, {8, 22});
+  double top = kHeader;
+  for (const CFrontendInfo::Port& p : module.ports) {
+    AddPort(p, module.generator, box, top);
+    top += kRow;
+  }
+}
+
+void SchemeView::AddPort(const CFrontendInfo::Port& port, bool generator, QGraphicsItem* box, double top) {
+  const bool data = port.portClass == "PDAT";
+  const QString path = QString::fromStdString(port.path);
+  auto* row = new QGraphicsRectItem(0, 0, kModuleWidth, kRow, box);
+  row->setPen(QPen(QColor(0xe0, 0xe0, 0xe0)));
+  row->setPos(0, top);
+  row->setData(kRoleKind, kPort);
+  row->setData(kRoleFirst, path);
+  row->setData(kRoleSecond, !data       ? QStringLiteral("CLOCK")
+                            : generator ? QStringLiteral("GEN")
+                                        : QStringLiteral("ANA"));
+  row->setToolTip(!data       ? QStringLiteral("%1: a clock output; it is not connected here").arg(path)
+                  : generator ? QStringLiteral("%1: drag to an analyser port to connect").arg(path)
+                              : QStringLiteral("%1: drag to a generator port to connect").arg(path));
+  Label(data ? QStringLiteral("%1  data · %2 terminal%3")
+                   .arg(Tail(port.path))
+                   .arg(port.terminals)
+                   .arg(port.terminals == 1 ? "" : "s")
+             : QStringLiteral("%1  clock").arg(Tail(port.path)),
+        row, {generator ? 10.0 : 18.0, 7});
+  const int ticks = data ? static_cast<int>(std::min<long>(port.terminals, kMaxTicks)) : 0;
+  const double tickRight = generator ? kModuleWidth - 16 : kModuleWidth - 8;
+  for (int t = 0; t < ticks; ++t) {
+    auto* tick = new QGraphicsRectItem(0, 0, 3, 10, row);
+    tick->setPen(Qt::NoPen);
+    tick->setBrush(QColor(0x70, 0x70, 0x70));
+    tick->setPos(tickRight - (ticks - t) * 5.0, 10);
+  }
+  const double x = generator ? kModuleWidth : 0;
+  auto* circle = new QGraphicsEllipseItem(x - kAnchor, kRow / 2 - kAnchor, 2 * kAnchor, 2 * kAnchor, row);
+  circle->setPen(QPen(data ? kLineColour : QColor(0x90, 0x90, 0x90), 1.5));
+  circle->setBrush(Qt::white);
+  mAnchors[port.path] = circle;
+}
+
+void SchemeView::AddLine(const CPortConnections::Connection& connection) {
+  QPointF from, to;
+  if (!PortAnchor(connection.generator, from) || !PortAnchor(connection.analyser, to)) return;
+  // A connected port's circle is filled; the line runs from the rim of one to the other's.
+  mAnchors[connection.generator]->setBrush(kLineColour);
+  mAnchors[connection.analyser]->setBrush(kLineColour);
+  auto* line = new LineItem(from + QPointF(kAnchor, 0), to - QPointF(kAnchor, 0));
+  const QString generator = QString::fromStdString(connection.generator);
+  const QString analyser = QString::fromStdString(connection.analyser);
+  line->setData(kRoleKind, kLine);
+  line->setData(kRoleFirst, generator);
+  line->setData(kRoleSecond, analyser);
+  line->setToolTip(QStringLiteral("%1 → %2").arg(generator, analyser));
+  scene()->addItem(line);
 }
 
 void SchemeView::SetReadOnly(bool readOnly) {
@@ -216,7 +221,7 @@ void SchemeView::SetReadOnly(bool readOnly) {
 bool SchemeView::PortAnchor(const Dstring& path, QPointF& at) const {
   auto found = mAnchors.find(path);
   if (found == mAnchors.end()) return false;
-  at = found->second;
+  at = found->second->mapToScene(found->second->rect().center());
   return true;
 }
 
@@ -306,7 +311,8 @@ void SchemeView::mouseMoveEvent(QMouseEvent* event) {
   if (mRubber == nullptr) return QGraphicsView::mouseMoveEvent(event);
   mRubber->setLine(QLineF(mRubber->line().p1(), mapToScene(event->pos())));
   QGraphicsItem* port = PortAt(event->pos());
-  Hover(port != mDragFrom && port != nullptr && Text(port, kRoleSecond) != QStringLiteral("CLOCK") ? port : nullptr);
+  Hover(port != mDragFrom && port != nullptr && Text(port, kRoleSecond) != QStringLiteral("CLOCK") ? port
+                                                                                                   : nullptr);
   event->accept();
 }
 

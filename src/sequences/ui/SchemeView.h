@@ -8,6 +8,7 @@
 #include "sequences/CPortConnections.h"
 #include "support/ConditionList.h"
 
+class QGraphicsEllipseItem;
 class QGraphicsLineItem;
 
 // The system scheme: the rack drawn from its front-end information, clock groups as frames
@@ -62,6 +63,11 @@ class SchemeView : public QGraphicsView {
   void resizeEvent(QResizeEvent* event) override;
 
  private:
+  // Each adds its part of the scheme; AddGroup returns the group's height.
+  double AddGroup(const CFrontendInfo::Group& group, double top);
+  void AddModule(const CFrontendInfo::Module& module, QGraphicsItem* frame, const QPointF& at);
+  void AddPort(const CFrontendInfo::Port& port, bool generator, QGraphicsItem* box, double top);
+  void AddLine(const CPortConnections::Connection& connection);
   // The port (its row) under a view position, null when none.
   QGraphicsItem* PortAt(const QPoint& pos) const;
   QGraphicsItem* LineAt(const QPoint& pos) const;
@@ -70,7 +76,7 @@ class SchemeView : public QGraphicsView {
   template <class Paint>
   void Unselected(Paint paint);
 
-  std::map<Dstring, QPointF> mAnchors;  // by port path
+  std::map<Dstring, QGraphicsEllipseItem*> mAnchors;  // each port's circle, by path
   bool mReadOnly = false;
   bool mFitting = true;  // follows the window's size until the user zooms
   // Marks the port a drag would connect to (null: none).
