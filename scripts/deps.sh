@@ -26,7 +26,7 @@ qen_install_deps() {
 
 # The packages every build needs.
 QEN_BUILD_PACKAGES=(cmake ninja-build g++ pkg-config libgtest-dev libgmock-dev libbenchmark-dev
-  qt6-base-dev qt6-tools-dev qt6-tools-dev-tools libqt6opengl6-dev libxkbcommon-dev libgl-dev qt6-charts-dev)
+  qt6-base-dev qt6-tools-dev qt6-tools-dev-tools libqt6opengl6-dev libxkbcommon-dev libgl-dev qt6-charts-dev qt6-svg-dev)
 
 # Runs a command quietly; its output is shown only when it fails.
 qen_quiet() {

@@ -2,6 +2,7 @@
 
 #include <cmath>
 
+#include "SimConnections.h"
 #include "SimPlace.h"
 
 namespace {
@@ -55,6 +56,7 @@ void SimBerMeter::Advance(SimContext& context) {
   if (running && mWasRunning && mLastMs >= 0) {
     const double seconds = static_cast<double>(now - mLastMs) / 1000.0;
     for (auto& [header, count] : mCounts) {
+      if (mConnections->DriverOf(Dstring(header.substr(0, header.size() - kSuffix.size()))).empty()) continue;
       const double bits = ClockOf(header, context) * seconds;
       count.compared += bits;
       count.errors += bits * (count.injected > 0 ? count.injected : RatioOf(header));

@@ -4,7 +4,7 @@
 
 #include "SimBerMeter.h"
 #include "SimCapturePlan.h"
-#include "SimPlace.h"
+#include "SimConnections.h"
 #include "SimReply.h"
 #include "SimSegment.h"
 #include "SimSegmentRows.h"
@@ -27,31 +27,24 @@ bool BitAt(const std::string& row, long vector) {
   return (static_cast<unsigned char>(row[static_cast<std::size_t>(vector >> 3)]) & (0x80u >> (vector & 7))) != 0;
 }
 
-// The data port places (slots of a block) of the generator each analyser data port receives.
-std::map<Dstring, long> Sources(const SimSequenceConfig& config) {
-  std::map<long, std::vector<long>> generators;  // by group: their slots
-  std::map<long, long> analysersSeen;
-  std::vector<std::pair<Dstring, long>> analysers;  // path, rank in the group
-  long slot = 0;
-  for (const SimSequenceConfig::Port& port : config.GetPorts()) {
+}  // namespace
+
+std::map<Dstring, long> SimCapture::Sources() const {
+  std::map<Dstring, long> slots;  // of every data port
+  std::vector<Dstring> analysers;
+  for (const SimSequenceConfig::Port& port : mSequence->GetConfig().GetPorts()) {
     if (port.portClass != "PDAT") continue;
-    const long group = NumberAfter(port.path, ":CGR");
-    if (port.type == "INPUT_PORT") {
-      analysers.emplace_back(port.path.ToUpper(), analysersSeen[group]++);
-    } else {
-      generators[group].push_back(slot);
-    }
-    ++slot;
+    const Dstring path = port.path.ToUpper();
+    slots.emplace(path, static_cast<long>(slots.size()));
+    if (port.type == "INPUT_PORT") analysers.push_back(path);
   }
   std::map<Dstring, long> sources;
-  for (const auto& [path, rank] : analysers) {
-    const std::vector<long>& slots = generators[NumberAfter(path, ":CGR")];
-    sources[path] = rank < static_cast<long>(slots.size()) ? slots[static_cast<std::size_t>(rank)] : -1;
+  for (const Dstring& path : analysers) {
+    auto driver = slots.find(mConnections->DriverOf(path));
+    sources[path] = driver == slots.end() ? -1 : driver->second;
   }
   return sources;
 }
-
-}  // namespace
 
 int SimCapture::StartRefusal(SimContext& context) const { return context.Global().IsRunning() ? 0 : -221; }
 
@@ -61,7 +54,7 @@ std::size_t SimCapture::Begin(SimContext& context) {
   if (context.Params().Find(":MEAS:CAPT:DEPT", index)) depth = static_cast<long>(context.Params().At(index).GetNumber());
   mPending.clear();
   std::map<long, Record> sent;
-  for (const auto& [path, generator] : Sources(mSequence->GetConfig())) {
+  for (const auto& [path, generator] : Sources()) {
     if (!sent.contains(generator)) sent[generator] = Sent(generator, depth);
     Record record = sent[generator];
     InjectErrors(record, mBer->RatioFor(path));
@@ -75,7 +68,7 @@ void SimCapture::ItemDone(std::size_t item, SimContext&) {
 }
 
 long SimCapture::ReceivedWidth(const Dstring& port) const {
-  const std::map<Dstring, long> sources = Sources(mSequence->GetConfig());
+  const std::map<Dstring, long> sources = Sources();
   auto found = sources.find(port);
   long width = 1;
   if (found == sources.end() || found->second < 0) return width;
@@ -201,7 +194,7 @@ bool SimCapture::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, Si
   if (at == Dstring::npos || !rest.StartsWith(":CGR")) return false;
   const Dstring port(rest.substr(0, at));
   const Dstring what(rest.substr(at + kStem.size()));
-  if (!Sources(mSequence->GetConfig()).contains(port)) return false;
+  if (!Sources().contains(port)) return false;
   static const Record kNone;
   auto found = mRecords.find(port);
   const Record& record = found == mRecords.end() ? kNone : found->second;

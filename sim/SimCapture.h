@@ -9,14 +9,15 @@
 #include "SimTimedTask.h"
 
 class SimBerMeter;
+class SimConnections;
 class SimSegment;
 class SimSegmentStore;
 class SimSequence;
 
 // The capture of every analyser data port (":CAPT", see SimTimedTask; 250 ms per port): while
-// the instrument runs, each analyser port records ":MEAS:CAPT:DEPT" vectors of what its
-// generator port sends under the sequence (the k-th analyser data port of a clock group
-// receives the group's k-th generator data port), with bit errors at the port's error ratio.
+// the instrument runs, each analyser port records ":MEAS:CAPT:DEPT" vectors of what the
+// generator port that drives it (SimConnections) sends under the sequence, with bit errors at
+// the port's error ratio; one that nothing drives receives a low line.
 // The last finished capture stays until the next one finishes; a cancelled one changes nothing.
 //   "<port>:CAPT:SIZE?"              <vectors>,<traces> of the last capture ("0,0" before one)
 //   "<port>:CAPT:DATA? START,COUNT"  the received bits, a block of one row per trace, packed
@@ -29,8 +30,12 @@ class SimCapture : public SimTimedTask {
   static constexpr std::size_t kMaxReplyBytes = 8u << 20;
 
   SimCapture(std::shared_ptr<const SimSequence> sequence, std::shared_ptr<const SimSegmentStore> segments,
-             std::shared_ptr<const SimBerMeter> ber)
-      : SimTimedTask(":CAPT", 0.25), mSequence(std::move(sequence)), mSegments(std::move(segments)), mBer(std::move(ber)) {}
+             std::shared_ptr<const SimBerMeter> ber, std::shared_ptr<const SimConnections> connections)
+      : SimTimedTask(":CAPT", 0.25),
+        mSequence(std::move(sequence)),
+        mSegments(std::move(segments)),
+        mBer(std::move(ber)),
+        mConnections(std::move(connections)) {}
 
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
   // The traces an analyser data port receives under the sequence now: the widest segment its
@@ -62,11 +67,15 @@ class SimCapture : public SimTimedTask {
   Record Sent(long generator, long vectors);
   const Bits& BitsOf(const Dstring& name, long vectors, std::map<Dstring, Bits>& cache) const;
   void InjectErrors(Record& record, double ratio);
+  // The data port place (slot of a block) of the generator that drives each analyser data
+  // port, -1 for none.
+  std::map<Dstring, long> Sources() const;
   int ReplyBits(const Record& record, bool errors, const SimCommand& cmd, SimContext& context) const;
 
   std::shared_ptr<const SimSequence> mSequence;
   std::shared_ptr<const SimSegmentStore> mSegments;
   std::shared_ptr<const SimBerMeter> mBer;
+  std::shared_ptr<const SimConnections> mConnections;
   std::map<Dstring, Record> mRecords;  // by port path, upper case
   std::map<Dstring, Record> mPending;
   std::mt19937_64 mRandom{71300};

@@ -2,6 +2,7 @@
 
 #include "SimBerMeter.h"
 #include "SimCapture.h"
+#include "SimConnections.h"
 #include "SimChannelErrors.h"
 #include "SimDeskew.h"
 #include "SimSelfTest.h"
@@ -132,7 +133,9 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
     : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
   mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir));
-  auto ber = std::make_shared<SimBerMeter>();
+  auto connections = std::make_shared<SimConnections>(mParams.GetRack());
+  mModules.push_back(connections);
+  auto ber = std::make_shared<SimBerMeter>(connections);
   auto sequence = std::make_shared<SimSequence>(mParams);
   auto segments = std::make_shared<SimSegmentStore>(dataDir);
   mModules.push_back(ber);
@@ -140,7 +143,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
   mModules.push_back(segments);
   mModules.push_back(std::make_shared<SimSelfTest>());
   mModules.push_back(std::make_shared<SimDeskew>());
-  auto capture = std::make_shared<SimCapture>(sequence, segments, ber);
+  auto capture = std::make_shared<SimCapture>(sequence, segments, ber, connections);
   mModules.push_back(capture);
   mModules.push_back(std::make_shared<SimChannelErrors>(ber, capture));
 }
@@ -594,6 +597,17 @@ bool SimCommandProcessor::ReadArgs(const SimCommand& cmd, DataParcel& items, std
 
 void SimCommandProcessor::Error(int code) {
   mTarget->Push(code, TextOf(code));
+  ++mErrors;
+}
+
+void SimCommandProcessor::Error(int code, const Dstring& detail) {
+  // A quote of the detail is doubled, so that the entry stays one quoted string.
+  Dstring text = Dstring(TextOf(code)) + "; ";
+  for (char c : detail) {
+    text += c;
+    if (c == '"') text += c;
+  }
+  mTarget->Push(code, text);
   ++mErrors;
 }
 

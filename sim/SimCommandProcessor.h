@@ -39,6 +39,7 @@ class SimCommandProcessor : public SimContext {
   // SimContext, for the command modules.
   void Reply(const Dstring& text) override { mReplies.push_back(text); }
   void Error(int code) override;
+  void Error(int code, const Dstring& detail) override;
   const Dstring& GetHandle() const override { return mHandle; }
   long long NowMs() const override { return mClock.NowMs(); }
   SimParamTable& Params() override { return mParams; }

@@ -2,6 +2,7 @@
 
 #include <cctype>
 #include <map>
+#include <set>
 
 namespace {
 
@@ -29,6 +30,7 @@ struct Port {
 struct Module {
   unsigned long number = 0;
   Dstring model;
+  unsigned long slot = 0;
   std::vector<Port> ports;
 };
 
@@ -176,6 +178,8 @@ class Reader {
   SimParamTable& mTable;
   Dstring mError;
   std::map<Dstring, Dstring> mModelKinds;
+  std::map<Dstring, unsigned long> mModelTerminals;  // of each data port
+  SimRack mRack;
   std::map<Dstring, SimUnitAttr> mUnits;
   std::vector<Template> mTemplates;
   bool mOpenTemplate = false;
@@ -218,10 +222,13 @@ bool Reader::InTemplate(const Line& line) {
 
 bool Reader::OnModel(const Line& line) {
   const DstringList& w = line.words;
-  if (w.size() != 3 || (w[2] != "generator" && w[2] != "analyser")) {
-    return Fail(line, "expected: model <code> generator|analyser");
+  unsigned long terminals = 1;
+  if (w.size() < 3 || w.size() > 4 || (w[2] != "generator" && w[2] != "analyser") ||
+      (w.size() == 4 && !(w[3].StartsWith("terminals=") && ReadNumber(Dstring(w[3].substr(10)), terminals)))) {
+    return Fail(line, "expected: model <code> generator|analyser [terminals=<1..999>]");
   }
   mModelKinds[w[1]] = w[2];
+  mModelTerminals[w[1]] = terminals;
   return true;
 }
 
@@ -290,12 +297,22 @@ bool Reader::OnGroup(const Line& line) {
 
 bool Reader::OnModule(const Line& line) {
   Module m;
-  if (line.words.size() != 3 || !ReadNumber(line.words[1], m.number))
-    return Fail(line, "expected: module <number> <model>");
+  const DstringList& w = line.words;
+  if (w.size() < 3 || w.size() > 4 || !ReadNumber(w[1], m.number) ||
+      (w.size() == 4 && !(w[3].StartsWith("slot=") && ReadNumber(Dstring(w[3].substr(5)), m.slot)))) {
+    return Fail(line, "expected: module <number> <model> [slot=<1..999>]");
+  }
   if (mGroups.empty()) return Fail(line, "a module belongs to a group");
   m.model = line.words[2];
   if (!mModelKinds.contains(m.model))
     return Fail(line, Dstring::Format("model %s is not declared", m.model.c_str()));
+  // Without slot= a module sits in the slot of its place in the rack.
+  std::set<unsigned long> taken;
+  for (const Group& g : mGroups) {
+    for (const Module& other : g.modules) taken.insert(other.slot);
+  }
+  if (m.slot == 0) m.slot = taken.size() + 1;
+  if (taken.contains(m.slot)) return Fail(line, Dstring::Format("slot %lu is taken", m.slot));
   mGroups.back().modules.push_back(m);
   return true;
 }
@@ -399,10 +416,12 @@ bool Reader::Finish() {
     if (!mTable.AddCoupling(line.words[1], headers, why)) return Fail(line, why);
   }
   mTable.Settle();
+  mTable.SetRack(std::move(mRack));
   return true;
 }
 
 bool Reader::ExpandGroup(const Group& g) {
+  mRack.AddGroup(static_cast<long>(g.number));
   Placeholders names{{"{group}", Dstring::Format(":CGR%lu", g.number)},
                      {"{cgr}", Dstring::Format("%lu", g.number)}};
   if (!Expand(Scope::Group, names, "", "", "")) return false;
@@ -420,7 +439,10 @@ bool Reader::ExpandModule(const Module& m, Placeholders names) {
                 {"{model}", m.model},
                 {"{kind}", kind}});
   if (!Expand(Scope::Module, names, kind, m.model, "")) return false;
+  mRack.AddModule({module, m.model, kind == "generator", static_cast<long>(m.slot), {}});
   for (const Port& p : m.ports) {
+    const unsigned long terminals = p.type == "PDAT" ? mModelTerminals[m.model] : 1;
+    mRack.AddPort({module + Dstring::Format(":CONN%lu", p.number), p.type, static_cast<long>(terminals)});
     Placeholders portNames = names;
     portNames.insert({{"{port}", module + Dstring::Format(":CONN%lu", p.number)},
                       {"{conn}", Dstring::Format("%lu", p.number)}});

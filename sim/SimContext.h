@@ -12,6 +12,8 @@ class SimContext {
   virtual void Reply(const Dstring& text) = 0;
   // Queues the SCPI error on the queue the client reads for this command.
   virtual void Error(int code) = 0;
+  // The same with what went wrong after the standard text ("Settings conflict; ...").
+  virtual void Error(int code, const Dstring& detail) = 0;
   // The handle of the command being run (upper case).
   virtual const Dstring& GetHandle() const = 0;
   virtual long long NowMs() const = 0;

@@ -9,6 +9,7 @@
 
 #include "SimCoupling.h"
 #include "SimParam.h"
+#include "SimRack.h"
 #include "support/DstringList.h"
 
 // All parameters of the instrument with their coupling rules. Every value or current-limit
@@ -22,6 +23,10 @@ class SimParamTable {
   // After loading: derive the coupled values from the first member of each rule, set the
   // current limits and forget the changes that made.
   void Settle();
+
+  // The rack the parameters were made for (the configuration's groups, modules and ports).
+  void SetRack(SimRack rack) { mRack = std::move(rack); }
+  const SimRack& GetRack() const { return mRack; }
 
   std::size_t Size() const { return mParams.size(); }
   const SimParam& At(std::size_t index) const { return mParams[index]; }
@@ -51,6 +56,7 @@ class SimParamTable {
   void Propagate(std::size_t written);
   void RecomputeLimits();
 
+  SimRack mRack;
   std::vector<SimParam> mParams;
   std::unordered_map<std::string, std::size_t> mIndex;
   std::vector<SimCoupling> mCouplings;

@@ -16,6 +16,7 @@
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
 #include "segments/QenSegmentPool.h"
+#include "sequences/CFrontendInfo.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SegmentPoolSync.h"
@@ -117,6 +118,7 @@ int uiapp::End(ConditionList& list) {
     DestroyAppHandle(handle, list);
   }
   CPortInfo::End();
+  CFrontendInfo::Invalidate();
   QenSegmentPool::End();
   Dte::End();
   QENSettingProfile::End();

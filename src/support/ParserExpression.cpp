@@ -392,3 +392,11 @@ int ParserExpression::SplitJoined(std::string_view text, std::vector<std::string
   parts = std::move(found);
   return 0;
 }
+
+int ParserExpression::ParseElements(std::string_view text, LispList& out, ConditionList& list) {
+  // The text must stand on its own: "1),(2" is no text, though "(1),(2)" is.
+  LispList alone;
+  if (int status = Parse(text, alone, list)) return status;
+  const std::string wrapped = "(" + std::string(text) + ")";
+  return Parse(wrapped, out, list);
+}

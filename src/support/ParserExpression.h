@@ -44,6 +44,9 @@ class ParserExpression {
   static int Parse(std::string_view text, LispList& out, ConditionList& list, Sink& sink);
   // The top-level elements as a flat parcel; a nested list is refused.
   static int Parse(std::string_view text, DataParcel& out, ConditionList& list);
+  // The text's elements as they stand, never unwrapped: "(1,2)" is one element, a list, where
+  // Parse gives two; for replies that are a list of lists of which there may be one.
+  static int ParseElements(std::string_view text, LispList& out, ConditionList& list);
 
   // Splits the replies of several queries (or several commands) joined by ";" into their
   // parts, leaving ";" inside quoted strings and blocks alone. The parts refer into `text`;

@@ -1,5 +1,6 @@
 #include "windows/WindowFactory.h"
 
+#include "windows/bconnect/BconnectConnectWin.h"
 #include "windows/ber/BerBerWin.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/deskew/DeskewDeskewWin.h"
@@ -39,6 +40,7 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
       {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
+      {"bconnect.ConnectWin", "System Scheme", Maker<BconnectConnectWin>()},
   };
   return kEntries;
 }

@@ -66,6 +66,21 @@ TEST_F(SimCaptureTest, RecordsWhatTheGeneratorPlaysUnderTheSequence) {
   EXPECT_EQ(Bits(kOther, "DATA", 0, 12), "\xFF\xF0");
 }
 
+TEST_F(SimCaptureTest, EachAnalyserReceivesWhatTheConnectionTableSaysAndAnUndrivenOneALowLine) {
+  Text(":_H:CONF:CONN:DEL \":CGR1:MOD1:CONN1\",\":CGR1:MOD3:CONN1\"");
+  Text(":_H:CONF:CONN:DEL \":CGR1:MOD1:CONN2\",\":CGR1:MOD3:CONN2\"");
+  Text(":_H:CONF:CONN:ADD \":CGR1:MOD1:CONN1\",\":CGR1:MOD3:CONN2\"");
+  Text(std::string(":_H") + kOther + ":BER:INJ 1E-12");
+  Capture(64);
+  EXPECT_EQ(Text(std::string(":_H") + kPort + ":CAPT:SIZE?"), "64,1");
+  EXPECT_EQ(Bits(kPort, "DATA", 0, 64), std::string(8, '\0'));
+  EXPECT_EQ(Text(std::string(":_H") + kOther + ":CAPT:SIZE?"), "64,4");
+  const std::string data = Bits(kOther, "DATA", 0, 32);
+  for (long t = 0; t < 4; ++t) {
+    for (long v = 0; v < 32; ++v) ASSERT_EQ(BitAt(data, 4, t, v), ((v % 16) >> t) & 1) << t << "," << v;
+  }
+}
+
 TEST_F(SimCaptureTest, ErrorsAreTheBitsThatDifferFromWhatWasSentAtTheInjectedRatio) {
   Text(std::string(":_H") + kPort + ":BER:INJ 1E-2");
   Capture(16384);

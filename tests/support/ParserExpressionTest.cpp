@@ -206,6 +206,24 @@ TEST(ParserExpression, WritesNumbersAsReadAndBlocksCanonically) {
   EXPECT_EQ(tree.AsExpression(), "(+3,1.500000f,'it''s',#13a\"c,w)");
 }
 
+TEST(ParserExpression, ElementsAreNeverUnwrapped) {
+  struct Case {
+    const char* text;
+    const char* shape;  // empty for a failure
+  };
+  const Case cases[] = {{"(1,2)", "((1,2))"}, {"(1),(2)", "((1),(2))"}, {"1,2", "(1,2)"}, {"", "()"},
+                        {"1),(2", ""},        {"(1", ""}};
+  for (const Case& c : cases) {
+    ConditionList list;
+    LispList tree;
+    const int status = ParserExpression::ParseElements(c.text, tree, list);
+    EXPECT_EQ(status == 0, *c.shape != '\0') << c.text;
+    if (status == 0) {
+      EXPECT_EQ(tree.AsExpression(), c.shape) << c.text;
+    }
+  }
+}
+
 struct ParcelCase {
   std::string text;
   bool ok;
