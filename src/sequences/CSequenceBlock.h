@@ -7,9 +7,9 @@
 
 #include "sequences/CSequence.h"
 #include "support/DataParcel.h"
+#include "support/Dstring.h"
 #include "support/NodeAllocator.h"
 #include "support/NodeArena.h"
-#include "support/Dstring.h"
 
 // One block of the sequence: one segment item per port and the block's attributes, its
 // reaction (branch) table, and a pointer per loop level to the loop it is in (not owned).
@@ -28,7 +28,9 @@ class CSequence::CSequenceBlock {
 
   // A long sequence is tens of thousands of blocks, made and dropped at every read: they lie
   // in the order they are read, beside their segments, and go back whole with the model.
-  static void* operator new(std::size_t size) { return NodeArena::Allocate(NodeArena::Stream::Records, size); }
+  static void* operator new(std::size_t size) {
+    return NodeArena::Allocate(NodeArena::Stream::Records, size);
+  }
   static void operator delete(void* block, std::size_t size) noexcept { NodeArena::Free(block, size); }
 
   // A copy of everything but the loops.

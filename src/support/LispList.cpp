@@ -36,13 +36,14 @@ void FreeArray(LispList* data, std::size_t n) noexcept {
 LispList LispList::Adopt(LispList* first, std::size_t count) {
   LispList list;
   if (count == 0) return list;
-  list.mChildren.data = NewArray(count);
-  list.mChildren.capacity = static_cast<std::uint32_t>(count);
+  LispList* data = NewArray(count);
+  bool plain = true;
   for (std::size_t i = 0; i < count; ++i) {
-    list.mPlain = list.mPlain && first[i].OwnsNothing();
-    new (&list.mChildren.data[i]) LispList(std::move(first[i]));
+    plain &= first[i].OwnsNothing();
+    new (&data[i]) LispList(std::move(first[i]));
   }
-  list.mChildren.size = static_cast<std::uint32_t>(count);
+  list.mChildren = Array{data, static_cast<std::uint32_t>(count), static_cast<std::uint32_t>(count)};
+  list.mPlain = plain;
   return list;
 }
 

@@ -23,8 +23,8 @@ class LispList {
   LispList& operator=(LispList&& other) noexcept;
   ~LispList() { Destroy(); }
 
-  // A list that takes over the `count` nodes at `first`, moving them into an array of exactly
-  // their number; they are left as empty nodes.
+  // A list that takes over the `count` nodes at `first`, moved into an array of exactly their
+  // number; what is left at `first` owns nothing and only awaits destruction.
   static LispList Adopt(LispList* first, std::size_t count);
 
   bool IsList() const { return mIsList; }

@@ -151,7 +151,8 @@ void Cutter::Retire() noexcept {
 
 void* NodeArena::Allocate(Stream stream, std::size_t bytes) {
   if (bytes > kMaxPieceBytes) return ::operator new(bytes);
-  if (Owner* owner = ThreadOwner()) return owner->cutters[static_cast<std::size_t>(stream)].Cut(Footprint(bytes), owner->spares);
+  if (Owner* owner = ThreadOwner())
+    return owner->cutters[static_cast<std::size_t>(stream)].Cut(Footprint(bytes), owner->spares);
   // Late in the thread's exit: a chunk for this one piece, returned when it is freed.
   Spares none;
   Cutter last;

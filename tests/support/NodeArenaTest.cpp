@@ -85,7 +85,8 @@ TEST(NodeArenaTest, WhatAThreadKeepsIsBounded) {
 TEST(NodeArenaTest, ATreeParsedOnOneThreadIsFreedOnAnother) {
   LispList tree;
   ConditionList list;
-  ASSERT_EQ(ParserExpression::Parse("(1,(2,(3,\"a long text that is not held in place\")),x)", tree, list), 0);
+  ASSERT_EQ(ParserExpression::Parse("(1,(2,(3,\"a long text that is not held in place\")),x)", tree, list),
+            0);
   LispList copy = tree;
   std::thread([taken = std::move(tree)]() mutable { LispList gone = std::move(taken); }).join();
   EXPECT_EQ(copy.AsExpression(), "(1,(2,(3,\"a long text that is not held in place\")),x)");
