@@ -231,6 +231,10 @@ void DataItem::SetText(std::string_view text) {
     SetShared(copy, std::move(owner));
     return;
   }
+  SetInPlace(text);
+}
+
+void DataItem::SetInPlace(std::string_view text) {
   if (!mInline) ReleaseText();
   CopyShort(mChars, text.data(), text.size());
   mSize = static_cast<std::uint32_t>(text.size());
@@ -305,7 +309,9 @@ void DataItem::FromString(std::string_view text, char quote, DataItem& out,
 }
 
 void DataItem::SetTokenText(std::string_view text, const std::shared_ptr<const std::string>& owner) {
-  if (text.size() > kInlineSize && owner) {
+  if (text.size() <= kInlineSize) {
+    SetInPlace(text);
+  } else if (owner) {
     SetShared(text, owner);
   } else {
     SetText(text);

@@ -79,6 +79,8 @@ class DataItem {
   };
 
   void SetText(std::string_view text);
+  // A text of at most kInlineSize bytes, held in place.
+  void SetInPlace(std::string_view text);
   void SetShared(std::string_view text, std::shared_ptr<const std::string> owner);
   // In place when it fits, else a view into `owner` (when there is one) or a shared copy.
   void SetTokenText(std::string_view text, const std::shared_ptr<const std::string>& owner);
