@@ -1,7 +1,10 @@
 #pragma once
 
+#include <cstddef>
+
 #include "sequences/CSequence.h"
 #include "support/Dstring.h"
+#include "support/NodeArena.h"
 
 // One loop: it repeats the blocks start .. start + length - 1, which all point at it on its
 // level (1 = innermost). Owned by the sequence's loop list; blocks only point at it.
@@ -12,6 +15,12 @@ class CSequence::CLoop {
   virtual ~CLoop() = default;
   CLoop(const CLoop&) = default;
   CLoop& operator=(const CLoop&) = default;
+
+  // Made and dropped with the blocks at every read, and kept beside them.
+  static void* operator new(std::size_t size) {
+    return NodeArena::Allocate(NodeArena::Stream::Records, size);
+  }
+  static void operator delete(void* loop, std::size_t size) noexcept { NodeArena::Free(loop, size); }
 
   CSequence* GetSequence() const { return mOwner; }
   unsigned long GetStart() const { return mStart; }

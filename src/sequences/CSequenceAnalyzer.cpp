@@ -2,12 +2,12 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <tuple>
 #include <utility>
 
 #include "sequences/CLoop.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/CSequenceObserver.h"
+#include "sequences/CSequenceStructure.h"
 
 namespace {
 
@@ -144,27 +144,24 @@ int CSequenceAnalyzer::ReportLoops(const CSequence::Content& old, const CSequenc
   for (const Op& op : ops) {
     if (op.kind == Op::Same || op.kind == Op::Changed) newOf[op.oldIndex + 1] = op.newIndex + 1;
   }
-  // The new loops by (level, start, length), each marked once an old loop is found in it.
-  using Key = std::tuple<unsigned long, unsigned long, unsigned long>;
-  std::vector<std::pair<Key, std::size_t>> fresh;
-  fresh.reserve(now.loops.size());
-  for (std::size_t i = 0; i < now.loops.size(); ++i) {
-    const Loop& loop = *now.loops[i];
-    fresh.push_back({{loop.GetLevel(), loop.GetStart(), loop.GetLength()}, i});
-  }
-  std::sort(fresh.begin(), fresh.end());
-  std::vector<char> kept(now.loops.size(), 0);
+  // A new loop is the one its first block points at on its level, so the new loop an old one
+  // may have become is found through the block its first block became, with no search; each
+  // is marked, by its first block and level, once an old loop is found in it.
+  const unsigned long levels = CSequenceStructure::MaxLoopLevel(now);
+  std::vector<char> kept(now.blocks.size() * levels, 0);
+  const auto keptOf = [&](const Loop& loop) -> char& {
+    return kept[(loop.GetStart() - 1) * levels + loop.GetLevel() - 1];
+  };
 
   std::vector<std::pair<const Loop*, const Loop*>> stayed;
   std::vector<const Loop*> deleted;
   for (const auto& loop : old.loops) {
     const unsigned long start = newOf[loop->GetStart()], end = newOf[loop->GetEnd()];
-    const Key key{loop->GetLevel(), start, loop->GetLength()};
-    auto it = std::lower_bound(fresh.begin(), fresh.end(), std::pair<Key, std::size_t>{key, 0});
-    while (it != fresh.end() && it->first == key && kept[it->second]) ++it;
-    if (start && end && end - start + 1 == loop->GetLength() && it != fresh.end() && it->first == key) {
-      kept[it->second] = 1;
-      stayed.emplace_back(loop.get(), now.loops[it->second].get());
+    const Loop* found = start != 0 ? now.blocks[start - 1]->GetLoop(loop->GetLevel()) : nullptr;
+    if (end && end - start + 1 == loop->GetLength() && found && found->GetStart() == start &&
+        found->GetLength() == loop->GetLength() && found->GetLevel() == loop->GetLevel() && !keptOf(*found)) {
+      keptOf(*found) = 1;
+      stayed.emplace_back(loop.get(), found);
     } else {
       deleted.push_back(loop.get());
     }
@@ -179,9 +176,9 @@ int CSequenceAnalyzer::ReportLoops(const CSequence::Content& old, const CSequenc
   for (const Loop* loop : deleted) {
     if (int status = report(&CSequenceObserver::NfyLoopDeleted, loop)) return status;
   }
-  for (std::size_t i = 0; i < now.loops.size(); ++i) {
-    if (kept[i]) continue;
-    if (int status = report(&CSequenceObserver::NfyLoopInserted, now.loops[i].get())) return status;
+  for (const auto& loop : now.loops) {
+    if (keptOf(*loop)) continue;
+    if (int status = report(&CSequenceObserver::NfyLoopInserted, loop.get())) return status;
   }
   for (const auto& [was, is] : stayed) {
     const std::pair<bool, LoopReport> changes[] = {

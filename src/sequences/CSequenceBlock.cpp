@@ -1,5 +1,7 @@
 #include "sequences/CSequenceBlock.h"
 
+#include <algorithm>
+
 #include "instrument/QenGuiInst.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/SequenceSegmentSync.h"
@@ -59,6 +61,8 @@ void CSequence::CSequenceBlock::SetLoop(unsigned long level, CLoop* loop) {
   if (level == 0) return;
   if (mLoops.size() < level) {
     if (loop == nullptr) return;
+    // Room for every level at once: a read sets the levels of a block from the innermost out.
+    mLoops.reserve(std::max(level, GetNumLoopLevels()));
     mLoops.resize(level, nullptr);
   }
   mLoops[level - 1] = loop;

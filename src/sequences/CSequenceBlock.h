@@ -7,8 +7,9 @@
 
 #include "sequences/CSequence.h"
 #include "support/DataParcel.h"
-#include "support/NodePool.h"
 #include "support/Dstring.h"
+#include "support/NodeAllocator.h"
+#include "support/NodeArena.h"
 
 // One block of the sequence: one segment item per port and the block's attributes, its
 // reaction (branch) table, and a pointer per loop level to the loop it is in (not owned).
@@ -25,10 +26,12 @@ class CSequence::CSequenceBlock {
 
   CSequenceBlock() = default;
 
-  // A long sequence is tens of thousands of blocks, made and dropped at every read: they are
-  // kept for the next read instead of being given back to the system.
-  static void* operator new(std::size_t size) { return NodePool::Allocate(size); }
-  static void operator delete(void* block, std::size_t size) noexcept { NodePool::Free(block, size); }
+  // A long sequence is tens of thousands of blocks, made and dropped at every read: they lie
+  // in the order they are read, beside their segments, and go back whole with the model.
+  static void* operator new(std::size_t size) {
+    return NodeArena::Allocate(NodeArena::Stream::Records, size);
+  }
+  static void operator delete(void* block, std::size_t size) noexcept { NodeArena::Free(block, size); }
 
   // A copy of everything but the loops.
   std::unique_ptr<CSequenceBlock> CloneContent() const;
@@ -86,5 +89,5 @@ class CSequence::CSequenceBlock {
   Dstring mLabel;
   unsigned mSync = 0;
   std::vector<Reaction> mReactions;
-  std::vector<CLoop*> mLoops;
+  std::vector<CLoop*, NodeAllocator<CLoop*>> mLoops;
 };

@@ -51,6 +51,21 @@ bool ScanNumber(std::string_view token, std::string_view& body, char& suffix, bo
   return i == token.size() && (integral || (suffix != 'i' && suffix != 'u'));
 }
 
+// Most numbers of a reply are short integers without a suffix ("0", "-12", "1024"): read while
+// they are scanned. Up to 18 digits cannot overflow; longer ones take the general way.
+bool ShortInteger(std::string_view token, long long& value) {
+  const bool negative = !token.empty() && token[0] == '-';
+  std::size_t i = !token.empty() && (negative || token[0] == '+') ? 1 : 0;
+  if (i == token.size() || token.size() - i > 18) return false;
+  long long v = 0;
+  for (; i < token.size(); ++i) {
+    if (!IsDigit(token[i])) return false;
+    v = v * 10 + (token[i] - '0');
+  }
+  value = negative ? -v : v;
+  return true;
+}
+
 // from_chars takes no leading '+'.
 std::string_view WithoutPlus(std::string_view body) {
   return body[0] == '+' ? body.substr(1) : body;
@@ -137,6 +152,22 @@ bool FitsIntegral(double v) {
   return v >= low && v < limit && std::trunc(v) == v;
 }
 
+// Copies n <= DataItem::kInlineSize bytes with a few fixed-size moves, overlapping where n is
+// not a multiple, instead of a library call: the texts of a reply are mostly a few bytes long.
+void CopyShort(char* to, const char* from, std::size_t n) {
+  if (n >= 8) {
+    for (std::size_t i = 0; i + 8 < n; i += 8) std::memcpy(to + i, from + i, 8);
+    std::memcpy(to + n - 8, from + n - 8, 8);
+  } else if (n >= 4) {
+    std::memcpy(to, from, 4);
+    std::memcpy(to + n - 4, from + n - 4, 4);
+  } else if (n > 0) {
+    to[0] = from[0];
+    to[n / 2] = from[n / 2];
+    to[n - 1] = from[n - 1];
+  }
+}
+
 std::string Quoted(std::string_view text, char quote) {
   std::string out(1, quote);
   for (char c : text) {
@@ -200,8 +231,12 @@ void DataItem::SetText(std::string_view text) {
     SetShared(copy, std::move(owner));
     return;
   }
-  ReleaseText();
-  if (!text.empty()) std::memcpy(mChars, text.data(), text.size());
+  SetInPlace(text);
+}
+
+void DataItem::SetInPlace(std::string_view text) {
+  if (!mInline) ReleaseText();
+  CopyShort(mChars, text.data(), text.size());
   mSize = static_cast<std::uint32_t>(text.size());
 }
 
@@ -266,18 +301,17 @@ DataItem DataItem::MakeBlock(std::string_view bytes, std::shared_ptr<const std::
   return item;
 }
 
-DataItem DataItem::MakeShared(DataItemType type, std::string_view text, char quote,
-                              const std::shared_ptr<const std::string>& owner) {
-  assert(type == DataItemType::String || type == DataItemType::Word);
-  DataItem item;
-  item.mType = type;
-  item.mQuote = quote == '\'' ? '\'' : '"';
-  item.SetTokenText(text, owner);
-  return item;
+void DataItem::FromString(std::string_view text, char quote, DataItem& out,
+                          const std::shared_ptr<const std::string>& owner) {
+  out.mType = DataItemType::String;
+  out.mQuote = quote == '\'' ? '\'' : '"';
+  out.SetTokenText(text, owner);
 }
 
 void DataItem::SetTokenText(std::string_view text, const std::shared_ptr<const std::string>& owner) {
-  if (text.size() > kInlineSize && owner) {
+  if (text.size() <= kInlineSize) {
+    SetInPlace(text);
+  } else if (owner) {
     SetShared(text, owner);
   } else {
     SetText(text);
@@ -293,7 +327,9 @@ bool DataItem::FromToken(std::string_view token, DataItem& out, const std::share
   char suffix = 0;
   bool integral = true;
   Number number;
-  if (!ScanNumber(token, body, suffix, integral)) {
+  if (ShortInteger(token, number.s)) {
+    number.type = DataItemType::Signed;
+  } else if (!ScanNumber(token, body, suffix, integral)) {
     number.type = DataItemType::Word;
   } else if (!ReadNumber(body, suffix, integral, number)) {
     return false;

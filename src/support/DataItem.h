@@ -39,9 +39,10 @@ class DataItem {
   static DataItem MakeWord(std::string_view text);
   // A block refers to `bytes`, which must stay alive as long as `owner` does.
   static DataItem MakeBlock(std::string_view bytes, std::shared_ptr<const std::string> owner);
-  // A string or word whose text lies in `owner`, which must hold it (the parser's texts).
-  static DataItem MakeShared(DataItemType type, std::string_view text, char quote,
-                             const std::shared_ptr<const std::string>& owner);
+  // Writes into `out` a string whose text lies in `owner`, which must hold it when the text is
+  // longer than the in-place text (the parser's texts).
+  static void FromString(std::string_view text, char quote, DataItem& out,
+                         const std::shared_ptr<const std::string>& owner);
   // Reads a bare token: a number keeping the token as its text, or else a word.
   // False when the token is a number that does not fit its type ("1e400", "-1u").
   static bool FromToken(std::string_view token, DataItem& out);
@@ -53,6 +54,8 @@ class DataItem {
   bool IsInteger() const { return mType == DataItemType::Signed || mType == DataItemType::Unsigned; }
   bool IsText() const { return mType == DataItemType::String || mType == DataItemType::Word; }
   char GetQuote() const { return mQuote; }
+  // The text is held in place, not shared: the item owns nothing beyond itself.
+  bool IsInPlace() const { return mInline; }
 
   // Conversions; false when the value does not fit the asked type.
   bool GetLong(long& out) const;
@@ -76,6 +79,8 @@ class DataItem {
   };
 
   void SetText(std::string_view text);
+  // A text of at most kInlineSize bytes, held in place.
+  void SetInPlace(std::string_view text);
   void SetShared(std::string_view text, std::shared_ptr<const std::string> owner);
   // In place when it fits, else a view into `owner` (when there is one) or a shared copy.
   void SetTokenText(std::string_view text, const std::shared_ptr<const std::string>& owner);

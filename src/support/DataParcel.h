@@ -5,8 +5,8 @@
 #include "support/DataItem.h"
 #include "support/NodeAllocator.h"
 
-// An ordered, flat list of typed values. Its array comes from the node pool, like a parsed
-// list's: replies and sequence blocks make and drop them by the thousand.
+// An ordered, flat list of typed values. Its array is cut from the node arena: replies and
+// sequence blocks make and drop them by the thousand.
 class DataParcel : public std::vector<DataItem, NodeAllocator<DataItem>> {
  public:
   using std::vector<DataItem, NodeAllocator<DataItem>>::vector;

@@ -243,11 +243,11 @@ int Reader::OpenList() {
 }
 
 LispList Reader::TakeOpenList() {
-  const auto first = mElements.begin() + static_cast<std::ptrdiff_t>(mStack.back().first);
-  LispList::Elements elements(std::make_move_iterator(first), std::make_move_iterator(mElements.end()));
-  mElements.erase(first, mElements.end());
+  const std::size_t first = mStack.back().first;
+  LispList list = LispList::Adopt(mElements.data() + first, mElements.size() - first);
+  mElements.erase(mElements.begin() + static_cast<std::ptrdiff_t>(first), mElements.end());
   mStack.pop_back();
-  return LispList::OfElements(std::move(elements));
+  return list;
 }
 
 int Reader::CloseList() {
@@ -297,7 +297,7 @@ int Reader::ReadString() {
   std::size_t close = FindQuote(mText, quote, mPos);
   if (close == kNone) return Fail(start, "the string has no closing quote");
   if (close + 1 >= mText.size() || mText[close + 1] != quote) {
-    AppendItem() = DataItem::MakeShared(DataItemType::String, Shared(mPos, close - mPos), quote, mOwner);
+    DataItem::FromString(Shared(mPos, close - mPos), quote, AppendItem(), mOwner);
     mPos = close + 1;
     return 0;
   }
