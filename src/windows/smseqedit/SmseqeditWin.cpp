@@ -14,6 +14,7 @@
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/CSequenceObserver.h"
+#include "sequences/SequenceUndo.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/MainWin.h"
 #include "windows/PlaceName.h"
@@ -46,8 +47,6 @@ class SmseqeditWin::Observer : public CSequenceObserver {
 
  private:
   int Changed() {
-    // Another client's change makes the steps back meaningless: they would undo it too.
-    if (!mWin.mEditing) mWin.ForgetSteps();
     mWin.MarkStale();
     return 0;
   }
@@ -59,6 +58,7 @@ SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mObserver(std::ma
 }
 
 SmseqeditWin::~SmseqeditWin() {
+  mUndo.reset();
   if (CSequence* sequence = GetSequence()) sequence->RemoveObserver(mObserver.get());
 }
 
@@ -90,6 +90,7 @@ int SmseqeditWin::Load(ConditionList& list) {
   AddBlockActions();
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   GetSequence()->AddObserver(mObserver.get());
+  mUndo = std::make_unique<SequenceUndo>(*GetSequence());
   const int status = GetSequence()->ReadSequence(list, 0);
   Rebuild();
   return status;
@@ -205,45 +206,25 @@ int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text
 
 void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
-  const Dstring before = GetSequence()->GetLastExpression();
-  mEditing = true;
-  const int status = command(list);
-  mEditing = false;
-  // A step that changed what the instrument holds can be taken back.
-  if (status == 0 && GetSequence()->GetLastExpression() != before && !before.empty()) {
-    mUndo.push_back(before);
-    if (mUndo.size() > kMaxSteps) mUndo.erase(mUndo.begin());
-    mRedo.clear();
-  }
+  const int status = mUndo->Run(command, list);
   // A refusal shows what the instrument holds; a step shows what it holds now.
   if (status != 0 || mStale) Rebuild();
   BoundControl::Report(list);
 }
 
-int SmseqeditWin::Undo(ConditionList& list) { return Step(mUndo, mRedo, list); }
-int SmseqeditWin::Redo(ConditionList& list) { return Step(mRedo, mUndo, list); }
+bool SmseqeditWin::CanUndo() const { return mUndo && mUndo->CanUndo(); }
 
-// The sequence as it was is written whole and read back; the text it replaces goes on the
-// other stack.
-int SmseqeditWin::Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& list) {
-  if (from.empty() || !IsEditable()) return 0;
-  CSequence* sequence = GetSequence();
-  const Dstring now = sequence->GetLastExpression();
-  mEditing = true;
-  int status = sequence->fromExpression(from.back(), list);
-  if (status == 0) status = sequence->WriteSequence(list);
-  mEditing = false;
-  if (status == 0) {
-    from.pop_back();
-    to.push_back(now);
-  }
+// A sequence with loops is not this editor's to change, not even back.
+int SmseqeditWin::Undo(ConditionList& list) {
+  const int status = IsEditable() ? mUndo->Undo(list) : 0;
   Rebuild();
   return status;
 }
 
-void SmseqeditWin::ForgetSteps() {
-  mUndo.clear();
-  mRedo.clear();
+int SmseqeditWin::Redo(ConditionList& list) {
+  const int status = IsEditable() ? mUndo->Redo(list) : 0;
+  Rebuild();
+  return status;
 }
 
 // Cut, copy and paste of whole blocks, on the table's keys and its context menu; the keys are
