@@ -9,7 +9,9 @@
 
 namespace {
 
-Dstring Number(unsigned long n) { return Dstring::Format("%lu", n); }
+Dstring Number(unsigned long n) {
+  return Dstring::Format("%lu", n);
+}
 
 int Refuse(ConditionList& cond, std::string_view key, std::initializer_list<Dstring> args) {
   ConditionListLoader::ConditionToken(cond, key, args, CSequence::kStatusError);
@@ -18,8 +20,8 @@ int Refuse(ConditionList& cond, std::string_view key, std::initializer_list<Dstr
 
 }  // namespace
 
-int SequenceLoopRules::Check(const CSequence& sequence, unsigned long first, unsigned long last, unsigned long level,
-                             ConditionList& cond) {
+int SequenceLoopRules::Check(const CSequence& sequence, unsigned long first, unsigned long last,
+                             unsigned long level, ConditionList& cond) {
   for (unsigned long b = first; b <= last; ++b) {
     if (sequence.GetLoopStatus(b, level) != CSequence::LOOP_NONE) {
       return Refuse(cond, "GUI_SEQUENCE_LOOP_TAKEN", {Number(first), Number(last), Number(level), Number(b)});
@@ -32,8 +34,9 @@ int SequenceLoopRules::Check(const CSequence& sequence, unsigned long first, uns
     const bool holds = loop->GetLevel() < level && start >= first && end <= last;
     const bool inside = loop->GetLevel() > level && start <= first && end >= last;
     if (!holds && !inside) {
-      return Refuse(cond, "GUI_SEQUENCE_LOOP_CROSSES",
-                    {Number(first), Number(last), Number(level), Number(loop->GetLevel()), Number(start), Number(end)});
+      return Refuse(
+          cond, "GUI_SEQUENCE_LOOP_CROSSES",
+          {Number(first), Number(last), Number(level), Number(loop->GetLevel()), Number(start), Number(end)});
     }
   }
   return 0;
@@ -56,10 +59,20 @@ int SequenceLoopRules::ParseCount(const Dstring& text, unsigned long largest, un
   bool digits = !trimmed.empty() && trimmed.size() <= 19;
   for (const char c : trimmed) digits = digits && std::isdigit(static_cast<unsigned char>(c));
   if (!digits || !trimmed.ToULong(n) || n == 0 || (largest != 0 && n > largest)) {
-    return Refuse(cond, "GUI_SEQUENCE_LOOP_COUNT", {trimmed, largest != 0 ? Dstring("1 to " + Number(largest)) : Dstring("1 or more")});
+    return Refuse(cond, "GUI_SEQUENCE_LOOP_COUNT",
+                  {trimmed, largest != 0 ? Dstring("1 to " + Number(largest)) : Dstring("1 or more")});
   }
   count = n;
   return 0;
+}
+
+int SequenceLoopRules::SetCount(CSequence& sequence, unsigned long block, unsigned long level,
+                                const Dstring& text, unsigned long largest, ConditionList& cond) {
+  if (level == CSequence::GetNumLoopLevels())
+    return Refuse(cond, "GUI_SEQUENCE_LOOP_ENDLESS", {Number(level)});
+  unsigned long count = 0;
+  if (int status = ParseCount(text, largest, count, cond)) return status;
+  return sequence.SetNumIterations(block, level, count, cond);
 }
 
 int SequenceLoopRules::ReadLargestCount(unsigned long& largest, ConditionList& cond) {

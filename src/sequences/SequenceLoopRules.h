@@ -19,7 +19,12 @@ class SequenceLoopRules {
   static unsigned long FreeLevel(const CSequence& sequence, unsigned long first, unsigned long last,
                                  ConditionList& cond);
   // Reads a typed loop count: a whole number from 1 to `largest` (0: no limit known).
-  static int ParseCount(const Dstring& text, unsigned long largest, unsigned long& count, ConditionList& cond);
+  static int ParseCount(const Dstring& text, unsigned long largest, unsigned long& count,
+                        ConditionList& cond);
+  // Sets the count of block's loop on `level` from typed text; the top level's loop always runs
+  // for ever and is refused a count.
+  static int SetCount(CSequence& sequence, unsigned long block, unsigned long level, const Dstring& text,
+                      unsigned long largest, ConditionList& cond);
   // The largest loop count the instrument plays (":%s:SGEN:GLOB:SEQ:ITER:MAX?").
   static int ReadLargestCount(unsigned long& largest, ConditionList& cond);
 };

@@ -2,11 +2,14 @@
 
 #include "sequences/CSequence.h"
 
-SequenceUndo::SequenceUndo(CSequence& sequence, std::size_t maxSteps) : mSequence(sequence), mMaxSteps(maxSteps) {
+SequenceUndo::SequenceUndo(CSequence& sequence, std::size_t maxSteps)
+    : mSequence(sequence), mMaxSteps(maxSteps) {
   mSequence.AddObserver(this);
 }
 
-SequenceUndo::~SequenceUndo() { mSequence.RemoveObserver(this); }
+SequenceUndo::~SequenceUndo() {
+  mSequence.RemoveObserver(this);
+}
 
 int SequenceUndo::Run(const std::function<int(ConditionList&)>& edit, ConditionList& cond) {
   const Dstring before = mSequence.GetLastExpression();
@@ -22,8 +25,12 @@ int SequenceUndo::Run(const std::function<int(ConditionList&)>& edit, ConditionL
   return status;
 }
 
-int SequenceUndo::Undo(ConditionList& cond) { return Step(mUndo, mRedo, cond); }
-int SequenceUndo::Redo(ConditionList& cond) { return Step(mRedo, mUndo, cond); }
+int SequenceUndo::Undo(ConditionList& cond) {
+  return Step(mUndo, mRedo, cond);
+}
+int SequenceUndo::Redo(ConditionList& cond) {
+  return Step(mRedo, mUndo, cond);
+}
 
 int SequenceUndo::Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& cond) {
   if (from.empty()) return 0;
@@ -50,7 +57,7 @@ void SequenceUndo::Forget() {
   mRedo.clear();
 }
 
-int SequenceUndo::Changed() {
+int SequenceUndo::NfyChanged(ConditionList&) {
   if (!mEditing) Forget();
   return 0;
 }

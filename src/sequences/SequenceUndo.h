@@ -4,7 +4,7 @@
 #include <functional>
 #include <vector>
 
-#include "sequences/CSequenceObserver.h"
+#include "sequences/SequenceChangeObserver.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
 
@@ -15,7 +15,7 @@ class CSequence;
 // replaces becomes the step forward. Any report of the sequence that is not of an edit run here
 // (another client's change, another window's edit) forgets every step: undoing would undo that
 // change too. Each editor window keeps its own.
-class SequenceUndo : public CSequenceObserver {
+class SequenceUndo : public SequenceChangeObserver {
  public:
   static constexpr std::size_t kMaxSteps = 50;
 
@@ -35,25 +35,10 @@ class SequenceUndo : public CSequenceObserver {
   // Whether an edit or a step of this is being written: its reports are its own.
   bool IsEditing() const { return mEditing; }
 
-  int NfyBlockInserted(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockDeleted(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockLabelChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockLengthChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockMeasureChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockSyncChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockTriggerChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockVXITriggerChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockReactionsChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfySegmentChanged(unsigned long, unsigned long, ConditionList&) override { return Changed(); }
-  int NfyUpdateLoops(ConditionList&) override { return Changed(); }
-  int NfyLoopIterationsChanged(long, long, long, long, ConditionList&) override { return Changed(); }
-  int NfyLoopTriggerChanged(long, long, long, long, ConditionList&) override { return Changed(); }
-  int NfyLoopVXITriggerChanged(long, long, long, long, ConditionList&) override { return Changed(); }
-  int NfySequence(ConditionList&) override { return Changed(); }
+  int NfyChanged(ConditionList& cond) override;
 
  private:
   int Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& cond);
-  int Changed();
 
   CSequence& mSequence;
   std::size_t mMaxSteps;

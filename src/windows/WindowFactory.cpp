@@ -6,9 +6,11 @@
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/errstate/ErrstateErrStateWin.h"
+#include "windows/loopgridedit/LoopGridEditWin.h"
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
+#include "windows/seqedit/SeqeditSeqEdWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 #include "windows/wavewin/WavewinWaveWin.h"
 
@@ -39,6 +41,8 @@ const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
       {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
       {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
+      {"seqedit.SeqEdWin", "Sequence", Maker<SeqeditSeqEdWin>()},
+      {"LoopGridEdit.Win", "Loop Grid", Maker<LoopGridEditWin>()},
   };
   return kEntries;
 }

@@ -26,11 +26,21 @@ class SequenceUndoTable : public SequenceFixture, public testing::WithParamInter
       return undo.Run([&](ConditionList& l) { return mSeq.SetBlockLength(1, n, l); }, list);
     };
     switch (step) {
-      case 'a': EXPECT_EQ(length(1000), 0) << list.ToText(); break;
-      case 'b': EXPECT_EQ(length(2000), 0) << list.ToText(); break;
-      case 'c': EXPECT_EQ(length(3000), 0) << list.ToText(); break;
-      case 'u': EXPECT_EQ(undo.Undo(list), 0) << list.ToText(); break;
-      case 'r': EXPECT_EQ(undo.Redo(list), 0) << list.ToText(); break;
+      case 'a':
+        EXPECT_EQ(length(1000), 0) << list.ToText();
+        break;
+      case 'b':
+        EXPECT_EQ(length(2000), 0) << list.ToText();
+        break;
+      case 'c':
+        EXPECT_EQ(length(3000), 0) << list.ToText();
+        break;
+      case 'u':
+        EXPECT_EQ(undo.Undo(list), 0) << list.ToText();
+        break;
+      case 'r':
+        EXPECT_EQ(undo.Redo(list), 0) << list.ToText();
+        break;
       case 'o':
         mFake.sequence = Seq(Blk(4096));
         EXPECT_EQ(mSeq.ReadSequence(list, 0), 0);
@@ -45,7 +55,8 @@ class SequenceUndoTable : public SequenceFixture, public testing::WithParamInter
         EXPECT_EQ(undo.Undo(list), -19);
         mFake.locked = false;
         break;
-      default: FAIL() << step;
+      default:
+        FAIL() << step;
     }
   }
 };

@@ -9,6 +9,7 @@
 #include "support/Dstring.h"
 
 class CSequence;
+class SequenceFollower;
 class SequenceUndo;
 class QLabel;
 class QPushButton;
@@ -43,7 +44,6 @@ class SmseqeditWin : public QWidget {
   bool CanUndo() const;
 
  private:
-  class Observer;
   static constexpr int kFirstPortColumn = 2;
 
   // An edited cell goes to the model; a refusal is shown and the line put back.
@@ -56,15 +56,13 @@ class SmseqeditWin : public QWidget {
   int AddBlock(ConditionList& list);
   int DeleteBlock(ConditionList& list);
   int MoveBlock(long distance, ConditionList& list);
-  void MarkStale();
   void AddBlockActions();
   void HitPButOpenSegment();
 
   QTableWidget* mTable = nullptr;
   QLabel* mState = nullptr;
   QPushButton* mOpenSegment = nullptr;
-  std::unique_ptr<Observer> mObserver;
+  std::unique_ptr<SequenceFollower> mFollower;
   bool mFilling = false;
-  bool mStale = false;
   std::unique_ptr<SequenceUndo> mUndo;
 };
