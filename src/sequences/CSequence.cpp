@@ -680,7 +680,9 @@ int CSequence::WriteEvents(ConditionList& cond) {
   return QenGuiInst::Call(Command(":%s:SGEN:GLOB:SEQ:EVEN ") + mEvents.BuildExpression(), reply, cond);
 }
 
-int CSequence::ReadSequence(ConditionList& cond, unsigned force) {
+int CSequence::ReadSequence(ConditionList& cond, unsigned force) { return Read(cond, force, nullptr); }
+
+int CSequence::Read(ConditionList& cond, unsigned force, const Dstring* written) {
   LgsDebug trace("CSequence::ReadSequence", "sequence");
   FWBlocker guard("CSequence::ReadSequence", cond);
   if (int status = guard.Block()) return status;
@@ -690,6 +692,7 @@ int CSequence::ReadSequence(ConditionList& cond, unsigned force) {
   reply = reply.Trimmed();
   const bool same = reply == mLastExpression;
   if (same && !force) return 0;
+  if (written != nullptr && !same && reply == *written) return TakeWritten(reply, cond);
 
   // The old content is what the views show: the last expression read, not local edits.
   if (!mLastExpression.empty()) {
@@ -719,6 +722,31 @@ int CSequence::ReadSequence(ConditionList& cond, unsigned force) {
   return 0;
 }
 
+// The server holds the text just written from the model: the model is what it holds, and only
+// what the views show, the last expression read, is rebuilt to tell them what changed. An
+// edit thus costs one parse, not two.
+int CSequence::TakeWritten(const Dstring& reply, ConditionList& cond) {
+  Content edited = std::move(mContent);
+  mContent = Content();
+  ConditionList ignored;
+  if (mLastExpression.empty() || fromExpression(mLastExpression, ignored) != 0) {
+    mContent = std::move(edited);
+    return Read(cond, 0, nullptr);
+  }
+  Content old = std::move(mContent);
+  mContent = std::move(edited);
+  // What the text does not carry: a synchronisation block is written without its reactions.
+  for (const auto& block : mContent.blocks) {
+    if (block->GetSync() != 0) block->Reactions().clear();
+  }
+  if (int status = AnalyzeChanges(old, cond)) {
+    mContent = std::move(old);
+    return status;
+  }
+  mLastExpression = reply;
+  return 0;
+}
+
 void CSequence::RestoreLastExpression() {
   if (mLastExpression.empty()) return;
   ConditionList ignored;
@@ -738,7 +766,7 @@ int CSequence::WriteSequence(ConditionList& cond) {
   }
   if (status == 0) status = WriteEvents(cond);
   const Dstring previous = mLastExpression;
-  if (status == 0) status = ReadSequence(cond, 0);
+  if (status == 0) status = Read(cond, 0, &expression);
   if (status == 0) {
     // The server kept its text (it took nothing, or normalised the edit away): the model
     // follows the server, not the edit.

@@ -212,6 +212,9 @@ class CSequence {
   void InsertBlock(unsigned long block, bool after, std::unique_ptr<CSequenceBlock> newBlock);
   std::unique_ptr<CSequenceBlock> ClipboardCopy() const;
 
+  // ReadSequence; `written`, when given, is the text just written from the model.
+  int Read(ConditionList& cond, unsigned force, const Dstring* written);
+  int TakeWritten(const Dstring& reply, ConditionList& cond);
   int ReadEvents(ConditionList& cond);
   int WriteEvents(ConditionList& cond);
   // Puts the model back to the last expression read, undoing local edits.

@@ -65,6 +65,7 @@ void LoopGridManager::Detach() {
 void LoopGridManager::SetSequence(CSequence* sequence) {
   Detach();
   mSequence = sequence;
+  mField = static_cast<int>(sequence == nullptr ? 0 : CSequence::GetNumLoopLevels());
   if (mSequence != nullptr) {
     mFollower->Follow(mSequence);
     mUndo = std::make_unique<SequenceUndo>(*mSequence);
@@ -96,6 +97,10 @@ unsigned long LoopGridManager::LevelOf(int field) const {
 
 unsigned long LoopGridManager::PortOf(int field) const {
   return field > LengthField() && field < NumFields() ? static_cast<unsigned long>(field - LengthField()) : 0;
+}
+
+bool LoopGridManager::IsSelected(unsigned long block) const {
+  return mRow != mAnchor && block >= FirstSelected() && block <= LastSelected();
 }
 
 unsigned long LoopGridManager::FirstSelected() const {
@@ -205,7 +210,6 @@ QString LoopGridManager::DispHeader(const GridDisp& disp, int) const {
 GridCell LoopGridManager::DispCell(const GridDisp& disp, long line, int cell) const {
   GridCell out;
   const auto block = static_cast<unsigned long>(line) + 1;
-  const bool selected = block >= FirstSelected() && block <= LastSelected();
   const int field = FieldAt(disp, cell);
   if (disp.objectName() == kBlocks) {
     out.text = QString::number(block);
@@ -217,7 +221,8 @@ GridCell LoopGridManager::DispCell(const GridDisp& disp, long line, int cell) co
     out.dim = port != 0 && mSequence->GetType(block, port) != CSequence::SEG_NAMED;
     out.cursor = line == mRow && field == mField && !IsEditing();
   }
-  out.selected = selected;
+  // A run of blocks shows as selected; a single block by its number.
+  out.selected = IsSelected(block) || (line == mRow && disp.objectName() == kBlocks);
   return out;
 }
 
@@ -251,7 +256,7 @@ void LoopGridManager::PaintLoops(const GridDisp& disp, QPainter& painter, const 
     if (y > area.bottom()) break;
     const long line = mFirst + i;
     const auto block = static_cast<unsigned long>(line) + 1;
-    const bool selected = block >= FirstSelected() && block <= LastSelected();
+    const bool selected = IsSelected(block);
     for (unsigned long level = 1; level <= mLevels; ++level) {
       const int field = LaneField(level);
       const QRect box(field * lane, y, lane, dy);

@@ -28,7 +28,7 @@ class LoopGridManager : public GridManager {
 
  public:
   // The width of a loop lane, in cells.
-  static constexpr int kLaneCells = 6;
+  static constexpr int kLaneCells = 5;
 
   explicit LoopGridManager(QWidget* parent = nullptr);
   ~LoopGridManager() override;
@@ -64,6 +64,8 @@ class LoopGridManager : public GridManager {
   // The selected run of blocks (the cursor's block alone when nothing more is selected).
   unsigned long FirstSelected() const;
   unsigned long LastSelected() const;
+  // Whether the block is in a selected run of more than one block.
+  bool IsSelected(unsigned long block) const;
   // Moves the cursor to a block (from 1) and field; `extend` keeps the selection's other end.
   void SetCursor(unsigned long block, int field, bool extend = false);
   // The text of a cell as shown.

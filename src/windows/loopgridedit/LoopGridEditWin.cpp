@@ -43,7 +43,7 @@ int LoopGridEditWin::Load(ConditionList& list) {
     return 1;
   }
   layout()->setContentsMargins(8, 6, 8, 6);
-  if (auto* split = findChild<QSplitter*>(QStringLiteral("Split"))) split->setSizes({170, 930});
+  if (auto* split = findChild<QSplitter*>(QStringLiteral("Split"))) split->setStretchFactor(1, 1);
   setFocusProxy(mGrid);
   struct Button {
     const char* name;
@@ -80,7 +80,10 @@ int LoopGridEditWin::Load(ConditionList& list) {
   connect(mGrid, &LoopGridManager::OpenEventsRequested, this, &LoopGridEditWin::HitPButEvents);
   connect(mGrid, &GridManager::StateChanged, this, &LoopGridEditWin::ShowState);
   connect(mSegments, &QListWidget::itemActivated, this, &LoopGridEditWin::HitSegmentDoubleClicked);
-  mGrid->SetPortHeader([](unsigned long port) { return PortHeader(port); });
+  // The columns are narrow: the place goes down a line a part.
+  mGrid->SetPortHeader([](unsigned long port) {
+    return PortHeader(port).replace(QStringLiteral(" \u203A "), QStringLiteral("\n"));
+  });
   // The levels are asked once a connection; when another client held the instrument then, now.
   if (!CSequence::IsNumLoopLevelsInitialized()) CSequence::InitNumLoopLevels(list);
   // Without the instrument's limit, the instrument refuses a count itself when it is written.
