@@ -625,17 +625,13 @@ int LoopGridManager::RemoveLoop() {
   return Run([&](ConditionList& l) { return mSequence->DeleteLoop(block, level, l); });
 }
 
-int LoopGridManager::Undo() {
-  ConditionList list;
-  const int status = mUndo == nullptr ? 0 : mUndo->Undo(list);
-  Sync();
-  BoundControl::Report(list);
-  return status;
-}
+int LoopGridManager::Undo() { return Step(true); }
+int LoopGridManager::Redo() { return Step(false); }
 
-int LoopGridManager::Redo() {
+int LoopGridManager::Step(bool back) {
+  if (mUndo == nullptr) return 0;
   ConditionList list;
-  const int status = mUndo == nullptr ? 0 : mUndo->Redo(list);
+  const int status = back ? mUndo->Undo(list) : mUndo->Redo(list);
   Sync();
   BoundControl::Report(list);
   return status;

@@ -130,6 +130,7 @@ class LoopGridManager : public GridManager {
  private:
   void Detach();
   int Run(const std::function<int(ConditionList&)>& edit);
+  int Step(bool back);
   void SyncColumns();
   void AddActions();
   void CommitEdit();
