@@ -2,6 +2,7 @@
 
 #include <QApplication>
 #include <QCoreApplication>
+#include <QLabel>
 #include <QLineEdit>
 #include <QListWidget>
 #include <QMdiArea>
@@ -341,4 +342,44 @@ TEST_F(LoopGridTest, EventWindowEditsReachTheInstrument) {
   ASSERT_EQ(events->SetSync(true), 0);
   EXPECT_NE(Server().find(",SYNC,"), std::string::npos);
   EXPECT_EQ(events->Table()->rowCount(), 0);
+}
+
+// Blocks are inserted, moved, copied, pasted and deleted on the grid's keys, loops keeping their
+// blocks; the sequence editor sums up what the instrument then holds.
+TEST_F(LoopGridTest, BlocksMoveWithTheirKeysAndTheSequenceEditorFollows) {
+  LoadNested();
+  mGrid->SetCursor(1, mGrid->LengthField());
+  Key(Qt::Key_Insert, Qt::ControlModifier | Qt::ShiftModifier);  // before block 1
+  ASSERT_EQ(mGrid->DispLineCount(), 5);
+  EXPECT_EQ(mGrid->CursorBlock(), 1u);
+  ASSERT_EQ(mGrid->SetCellText(1, mGrid->LengthField(), QStringLiteral("777")), 0);
+  Key(Qt::Key_Down, Qt::ControlModifier);
+  EXPECT_EQ(mGrid->CursorBlock(), 2u);
+  EXPECT_EQ(mGrid->CellText(2, mGrid->LengthField()), QStringLiteral("777"));
+  Key(Qt::Key_C, Qt::ControlModifier);
+  mGrid->SetCursor(6 - 1, mGrid->LabelField());
+  Key(Qt::Key_V, Qt::ControlModifier);  // after the last block, outside the loops
+  ASSERT_EQ(mGrid->DispLineCount(), 6);
+  EXPECT_EQ(mGrid->CellText(6, mGrid->LengthField()), QStringLiteral("777"));
+  EXPECT_EQ(mGrid->CellText(6, mGrid->LaneField(2)), QString());
+  EXPECT_EQ(mGrid->CellText(3, mGrid->LaneField(1)), QStringLiteral("4"));
+  mGrid->SetCursor(2, mGrid->LabelField());
+  Key(Qt::Key_Delete);
+  EXPECT_EQ(mGrid->DispLineCount(), 5);
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+  const Dstring b = Block();
+  Dstring copied = b;
+  copied.replace(copied.find(",512,"), 5, ",777,");
+  EXPECT_EQ(Server(), "(3.0,\"\",(SEQ," + b + ",\"\",(LOOP2,0,3,\"\",(SEQ,(LOOP1,0,4,\"\",(SEQ," + b +
+                          ",\"\"," + b + ")),\"\"," + b + ")),\"\"," + copied + "))");
+
+  auto* sequence = qobject_cast<SeqeditSeqEdWin*>(SequenceWindows::OpenSequence(mWin));
+  ASSERT_NE(sequence, nullptr);
+  ASSERT_EQ(sequence->Table()->rowCount(), 5);
+  EXPECT_EQ(SeqeditSeqEdWin::LoopsOf(3), QStringLiteral("L2 \u00D73 2\u20134   L1 \u00D74 2\u20133"));
+  EXPECT_EQ(sequence->Table()->item(4, 1)->text(), QStringLiteral("777"));
+  EXPECT_TRUE(sequence->Summary()->text().startsWith(QStringLiteral("5 blocks, 2 loops on 3 loop levels")));
+  Other(":SGEN:GLOB:SEQ " + mInitial);
+  for (int i = 0; i < 20 && sequence->Table()->rowCount() != 1; ++i) PollAndShow();
+  EXPECT_EQ(sequence->Table()->rowCount(), 1);
 }

@@ -379,7 +379,7 @@ void LoopGridManager::AddActions() {
       {"InsertAfter", "&Insert Block After", {QKeySequence(Qt::Key_Insert)}, [this] { InsertBlock(false); }},
       {"InsertBefore",
        "Insert Block &Before",
-       {QKeySequence(Qt::SHIFT | Qt::Key_Insert)},
+       {QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_Insert)},
        [this] { InsertBlock(true); }},
       {"Delete",
        "&Delete Block (Loop on a Lane)",
@@ -625,8 +625,12 @@ int LoopGridManager::RemoveLoop() {
   return Run([&](ConditionList& l) { return mSequence->DeleteLoop(block, level, l); });
 }
 
-int LoopGridManager::Undo() { return Step(true); }
-int LoopGridManager::Redo() { return Step(false); }
+int LoopGridManager::Undo() {
+  return Step(true);
+}
+int LoopGridManager::Redo() {
+  return Step(false);
+}
 
 int LoopGridManager::Step(bool back) {
   if (mUndo == nullptr) return 0;
