@@ -383,3 +383,30 @@ TEST_F(LoopGridTest, BlocksMoveWithTheirKeysAndTheSequenceEditorFollows) {
   for (int i = 0; i < 20 && sequence->Table()->rowCount() != 1; ++i) PollAndShow();
   EXPECT_EQ(sequence->Table()->rowCount(), 1);
 }
+
+// The grid base's editing commands, as a pattern-editor window asks the grid with the focus.
+TEST_F(LoopGridTest, TheGridBaseCommandsWorkOnWholeBlocks) {
+  CSequence::ClearClipboard();
+  EXPECT_TRUE(mGrid->IsCopyPossible());
+  EXPECT_FALSE(mGrid->IsPastePossible());
+  EXPECT_FALSE(mGrid->IsFillPossible());
+  ConditionList list;
+  ASSERT_EQ(mGrid->SetCellText(1, mGrid->LengthField(), QStringLiteral("640")), 0);
+  ASSERT_EQ(mGrid->ModifyInsert(VectorTrace::kVector, InsertMode::kAfter, 2, list), 0) << list.ToText();
+  EXPECT_EQ(mGrid->DispLineCount(), 3);
+  ASSERT_EQ(mGrid->ModifyCopy(list), 0);
+  EXPECT_TRUE(mGrid->IsPastePossible());
+  mGrid->SetCursor(3, mGrid->LabelField());
+  ASSERT_EQ(mGrid->ModifyPaste(list), 0) << list.ToText();
+  const Dstring b = Block();
+  Dstring copied = b;
+  copied.replace(copied.find(",512,"), 5, ",640,");
+  EXPECT_EQ(Server(), "(3.0,\"\",(SEQ," + copied + ",\"\"," + b + ",\"\"," + b + ",\"\"," + copied + "))");
+  mGrid->SetCursor(1, mGrid->LabelField());
+  ASSERT_EQ(mGrid->ModifyDelete(list), 0);
+  EXPECT_EQ(mGrid->DispLineCount(), 3);
+  EXPECT_EQ(mGrid->CellText(3, mGrid->LengthField()), QStringLiteral("640"));
+  ASSERT_EQ(mGrid->Undo(), 0);
+  EXPECT_EQ(mGrid->DispLineCount(), 4);
+  EXPECT_TRUE(list.IsEmpty()) << list.ToText();
+}

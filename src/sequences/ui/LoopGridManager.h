@@ -104,6 +104,12 @@ class LoopGridManager : public GridManager {
   bool IsPastePossible() override;
   bool IsInsertPossible() override { return mSequence != nullptr; }
   bool IsDeletePossible() override { return mSequence != nullptr; }
+  // Copy, paste, insert (`count` blocks before or after the cursor's) and delete work on whole
+  // blocks; an insert of several blocks is one step back.
+  int ModifyCopy(ConditionList& list) override;
+  int ModifyPaste(ConditionList& list) override;
+  int ModifyInsert(VectorTrace what, InsertMode mode, long count, ConditionList& list) override;
+  int ModifyDelete(ConditionList& list) override;
   int GetSegmentName(long row, long column, Dstring& name, ConditionList& list) override;
 
   long DispLineCount() const override;
@@ -129,7 +135,11 @@ class LoopGridManager : public GridManager {
 
  private:
   void Detach();
+  // An edit through the steps; Run reports its conditions, Apply leaves them in the list.
+  int Apply(const std::function<int(ConditionList&)>& edit, ConditionList& list);
   int Run(const std::function<int(ConditionList&)>& edit);
+  // A command of the grid base with its conditions reported.
+  int Reported(int (LoopGridManager::*modify)(ConditionList&));
   int Step(bool back);
   void SyncColumns();
   void AddActions();

@@ -9,14 +9,55 @@
 
 // --- Commands ----------------------------------------------------------------------------------
 
-int LoopGridManager::Run(const std::function<int(ConditionList&)>& edit) {
+int LoopGridManager::Apply(const std::function<int(ConditionList&)>& edit, ConditionList& list) {
   if (mSequence == nullptr || mUndo == nullptr) return 0;
-  ConditionList list;
   const int status = mUndo->Run(edit, list);
   // Refused or not, the grid shows what the instrument holds now.
   Sync();
+  return status;
+}
+
+int LoopGridManager::Run(const std::function<int(ConditionList&)>& edit) {
+  ConditionList list;
+  const int status = Apply(edit, list);
   BoundControl::Report(list);
   return status;
+}
+
+int LoopGridManager::Reported(int (LoopGridManager::*modify)(ConditionList&)) {
+  ConditionList list;
+  const int status = (this->*modify)(list);
+  BoundControl::Report(list);
+  return status;
+}
+
+// The editing commands a pattern-editor window asks the grid with the focus for: whole blocks.
+int LoopGridManager::ModifyCopy(ConditionList& list) {
+  return mSequence == nullptr ? 0 : mSequence->CopyBlock(CursorBlock(), list);
+}
+
+int LoopGridManager::ModifyPaste(ConditionList& list) {
+  const unsigned long block = CursorBlock();
+  return Apply([&](ConditionList& l) { return mSequence->PasteBlockAfter(block, l); }, list);
+}
+
+int LoopGridManager::ModifyInsert(VectorTrace, InsertMode mode, long count, ConditionList& list) {
+  const unsigned long block = CursorBlock();
+  return Apply(
+      [&](ConditionList& l) {
+        for (long n = 0; n < count; ++n) {
+          const int status = mode == InsertMode::kBefore ? mSequence->AddBlockBefore(block, l)
+                                                         : mSequence->AddBlockAfter(block, l);
+          if (status != 0) return status;
+        }
+        return 0;
+      },
+      list);
+}
+
+int LoopGridManager::ModifyDelete(ConditionList& list) {
+  const unsigned long block = CursorBlock();
+  return Apply([&](ConditionList& l) { return mSequence->DeleteBlock(block, l); }, list);
 }
 
 int LoopGridManager::InsertBlock(bool before) {
@@ -29,8 +70,7 @@ int LoopGridManager::InsertBlock(bool before) {
 }
 
 int LoopGridManager::DeleteBlock() {
-  const unsigned long block = CursorBlock();
-  return Run([&](ConditionList& l) { return mSequence->DeleteBlock(block, l); });
+  return Reported(&LoopGridManager::ModifyDelete);
 }
 
 int LoopGridManager::MoveBlock(long distance) {
@@ -48,10 +88,7 @@ int LoopGridManager::CutBlock() {
 }
 
 int LoopGridManager::CopyBlock() {
-  ConditionList list;
-  const int status = mSequence->CopyBlock(CursorBlock(), list);
-  BoundControl::Report(list);
-  return status;
+  return Reported(&LoopGridManager::ModifyCopy);
 }
 
 bool LoopGridManager::IsPastePossible() {
@@ -60,7 +97,7 @@ bool LoopGridManager::IsPastePossible() {
 
 int LoopGridManager::PasteBlock() {
   const unsigned long block = CursorBlock();
-  const int status = Run([&](ConditionList& l) { return mSequence->PasteBlockAfter(block, l); });
+  const int status = Reported(&LoopGridManager::ModifyPaste);
   if (status == 0) SetCursor(block + 1, mField);
   return status;
 }
