@@ -24,5 +24,6 @@ class SequenceChangeObserver : public CSequenceObserver {
   int NfyLoopTriggerChanged(long, long, long, long, ConditionList& c) override { return NfyChanged(c); }
   int NfyLoopVXITriggerChanged(long, long, long, long, ConditionList& c) override { return NfyChanged(c); }
   int NfyUpdateLoops(ConditionList& c) override { return NfyChanged(c); }
+  int NfyEventsChanged(ConditionList& c) override { return NfyChanged(c); }
   int NfySequence(ConditionList& c) override { return NfyChanged(c); }
 };

@@ -3,10 +3,10 @@
 #include <QHeaderView>
 #include <QLabel>
 #include <QLayout>
-#include <QListWidget>
 #include <QPushButton>
 #include <QTableWidget>
 
+#include "params/ui/BoundControl.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/ui/LoopGridManager.h"
@@ -27,7 +27,7 @@ int SeqeditSeqEdWin::Load(ConditionList& list) {
   mSummary = findChild<QLabel*>(QStringLiteral("LabelSummary"));
   mTable = findChild<QTableWidget*>(QStringLiteral("TableBlocks"));
   mEventsLabel = findChild<QLabel*>(QStringLiteral("LabelEvents"));
-  mEvents = findChild<QListWidget*>(QStringLiteral("ListEvents"));
+  mEvents = findChild<QTableWidget*>(QStringLiteral("TableEvents"));
   auto* events = findChild<QPushButton*>(QStringLiteral("PButEvents"));
   auto* grid = findChild<QPushButton*>(QStringLiteral("PButLoopGrid"));
   auto* simple = findChild<QPushButton*>(QStringLiteral("PButSimple"));
@@ -40,6 +40,11 @@ int SeqeditSeqEdWin::Load(ConditionList& list) {
   }
   layout()->setContentsMargins(8, 6, 8, 6);
   mTable->horizontalHeader()->setStretchLastSection(true);
+  mEvents->horizontalHeader()->setStretchLastSection(true);
+  mEvents->setColumnWidth(0, 160);
+  connect(mEvents, &QTableWidget::cellChanged, this, [this](int row, int column) {
+    if (!mFillingEvents) SetEventField(row, column, mEvents->item(row, column)->text());
+  });
   setFocusProxy(mTable);
   auto openEvents = [this] {
     if (CurrentBlock() != 0) SequenceWindows::OpenEvents(this, CurrentBlock());
@@ -120,23 +125,59 @@ void SeqeditSeqEdWin::Fill() {
 // The ten events belong to a central module; without one the sequencer has none.
 void SeqeditSeqEdWin::FillEvents() {
   const CSequence* sequence = CPortInfo::GetSequence();
-  mEvents->clear();
-  if (!CPortInfo::HasCentral()) {
-    mEventsLabel->setText(
-        QStringLiteral("Sequence events: this system has no central module, so the sequencer has none."));
-    mEvents->hide();
-    return;
-  }
-  mEventsLabel->setText(QStringLiteral("Sequence events of the central module"));
-  mEvents->show();
+  const bool central = CPortInfo::HasCentral();
+  mEventsLabel->setText(
+      central
+          ? QStringLiteral("Sequence events of the central module (name and number are edited here)")
+          : QStringLiteral("Sequence events: this system has no central module, so the sequencer has none."));
+  mEvents->setVisible(central);
+  if (!central) return;
+  mFillingEvents = true;
   const auto& events = sequence->GetEvents().GetEvents();
+  mEvents->setRowCount(static_cast<int>(events.size()));
   for (std::size_t i = 0; i < events.size(); ++i) {
     const CSequenceEvents::Event& e = events[i];
-    mEvents->addItem(QStringLiteral("%1. %2  (%3), %4 %5")
-                         .arg(i + 1)
-                         .arg(e.name.empty() ? QStringLiteral("(unnamed)") : QString::fromStdString(e.name))
-                         .arg(e.number)
-                         .arg(e.items.size())
-                         .arg(e.items.size() == 1 ? QStringLiteral("item") : QStringLiteral("items")));
+    QStringList items;
+    for (const CSequenceEvents::Item& item : e.items) {
+      items << QStringLiteral("('%1','%2','%3',%4)")
+                   .arg(QString::fromStdString(item.first), QString::fromStdString(item.second),
+                        QString::fromStdString(item.third), QString::fromStdString(item.bare));
+    }
+    const QString texts[] = {QString::fromStdString(e.name), QString::number(e.number),
+                             items.join(QStringLiteral("; "))};
+    for (int c = 0; c < 3; ++c) {
+      QTableWidgetItem* cell = mEvents->item(static_cast<int>(i), c);
+      if (cell == nullptr) {
+        cell = new QTableWidgetItem;
+        if (c == 1) cell->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
+        if (c == 2) cell->setFlags(cell->flags() & ~Qt::ItemIsEditable);
+        mEvents->setItem(static_cast<int>(i), c, cell);
+      }
+      cell->setText(texts[c]);
+    }
   }
+  mFillingEvents = false;
+}
+
+int SeqeditSeqEdWin::SetEventField(int index, int column, const QString& text) {
+  CSequence* sequence = CPortInfo::GetSequence();
+  if (sequence == nullptr || index < 0 || index >= static_cast<int>(CSequenceEvents::kNumEvents)) return 0;
+  CSequenceEvents::Event event = sequence->GetEvents().GetEvent(static_cast<std::size_t>(index));
+  ConditionList list;
+  int status = 0;
+  if (column == 0) {
+    event.name = text.trimmed().toStdString();
+  } else if (column == 1) {
+    bool number = false;
+    event.number = text.trimmed().toInt(&number);
+    if (!number) {
+      list.Add(1, Dstring::Format("\"%s\" is no event number: a whole number.", text.toStdString().c_str()));
+      status = 1;
+    }
+  }
+  if (status == 0) status = sequence->SetEvent(static_cast<std::size_t>(index), event, list);
+  // Refused or not, the table shows what the instrument holds.
+  FillEvents();
+  BoundControl::Report(list);
+  return status;
 }

@@ -7,13 +7,13 @@
 
 class QLabel;
 class SequenceFollower;
-class QListWidget;
 class QTableWidget;
 
 // The sequence editor ("seqedit.SeqEdWin"): the sequence as a whole, a line per block with its
 // label, length, the loops it is in, its marks and its reactions, and the table of sequence
-// events of a central module. From here the loop grid, the simple sequence editor and a block's
-// event window open. It follows the sequence: another client's change shows within the poll.
+// events of a central module, whose names and numbers are edited here. From here the loop grid, the simple
+// sequence editor and a block's event window open. It follows the sequence: another client's change shows
+// within the poll.
 class SeqeditSeqEdWin : public QWidget {
   Q_OBJECT
 
@@ -28,6 +28,9 @@ class SeqeditSeqEdWin : public QWidget {
   void Fill();
   // The loops block `block` is in, the top level first ("L2 ×3 2–4").
   static QString LoopsOf(unsigned long block);
+  QTableWidget* EventTable() const { return mEvents; }
+  // A typed name (column 0) or number (column 1) of event `index` goes to the instrument.
+  int SetEventField(int index, int column, const QString& text);
 
  private:
   void FillEvents();
@@ -36,6 +39,7 @@ class SeqeditSeqEdWin : public QWidget {
   QLabel* mSummary = nullptr;
   QTableWidget* mTable = nullptr;
   QLabel* mEventsLabel = nullptr;
-  QListWidget* mEvents = nullptr;
+  QTableWidget* mEvents = nullptr;
+  bool mFillingEvents = false;
   std::unique_ptr<SequenceFollower> mFollower;
 };
