@@ -6,6 +6,7 @@ const SimSequence::Entry SimSequence::kCommands[] = {
     {":SGEN:GLOB:SEQ", &SimSequence::Sequence},
     {":SGEN:GLOB:SEQ:EVEN", &SimSequence::Events},
     {":SGEN:GLOB:SEQ:LLEV", &SimSequence::LoopLevels},
+    {":SGEN:GLOB:SEQ:ITER:MAX", &SimSequence::LargestCount},
     {":SGEN:GLOB:CONF", &SimSequence::Configuration},
 };
 
@@ -60,6 +61,11 @@ void SimSequence::Events(const SimCommand& cmd, SimContext& context) {
 void SimSequence::LoopLevels(const SimCommand& cmd, SimContext& context) {
   if (!cmd.IsQuery()) return context.Error(-200);
   context.Reply(Dstring::Format("%lu", mConfig.LoopLevels()));
+}
+
+void SimSequence::LargestCount(const SimCommand& cmd, SimContext& context) {
+  if (!cmd.IsQuery()) return context.Error(-200);
+  context.Reply(Dstring::Format("%lu", SimSequenceCheck::kMaxLoopCount));
 }
 
 void SimSequence::Configuration(const SimCommand& cmd, SimContext& context) {

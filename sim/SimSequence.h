@@ -10,6 +10,7 @@
 //   :SGEN:GLOB:SEQ?  / :SGEN:GLOB:SEQ <expression>        the sequence
 //   :SGEN:GLOB:SEQ:EVEN? / :SGEN:GLOB:SEQ:EVEN <expr>     the events (only with a central module)
 //   :SGEN:GLOB:SEQ:LLEV?                                   loop levels
+//   :SGEN:GLOB:SEQ:ITER:MAX?                               the largest loop count
 //   :SGEN:GLOB:CONF?                                       ports and central module
 //
 // A text is stored as accepted (SimSequenceCheck) and replied as stored; a refused one queues
@@ -36,6 +37,7 @@ class SimSequence : public SimCommandModule {
   void Sequence(const SimCommand& cmd, SimContext& context);
   void Events(const SimCommand& cmd, SimContext& context);
   void LoopLevels(const SimCommand& cmd, SimContext& context);
+  void LargestCount(const SimCommand& cmd, SimContext& context);
   void Configuration(const SimCommand& cmd, SimContext& context);
   // Stores an accepted write of `text` into `stored`, marking `header` when it changed.
   void Store(const SimCommand& cmd, SimContext& context, int check, Dstring& stored, const char* header);

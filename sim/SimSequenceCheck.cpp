@@ -10,6 +10,7 @@ namespace {
 
 constexpr int kShape = -104;
 constexpr int kNotPlayable = -224;
+constexpr int kOutOfRange = -222;
 constexpr const char* kKeywords[] = {"PAUSE",     "PAUSE0",    "PAUSE1",  "ACQUIRE",
                                      "EXPECTED0", "EXPECTED1", "DONTCARE"};
 constexpr std::size_t kEvents = 10;
@@ -92,6 +93,10 @@ class SequenceChecker {
     if (e.Size() != 5 || !IsUnsigned(e[1]) || !(IsUnsigned(e[2]) || IsWord(e[2], "INF")) || !IsText(e[3]))
       return kShape;
     if (own < 1 || own > mLevels) return kNotPlayable;
+    unsigned long count = 0;
+    if (IsUnsigned(e[2]) && e[2].GetItem().GetULong(count) && count > SimSequenceCheck::kMaxLoopCount) {
+      return kOutOfRange;
+    }
     unsigned long inner = 0;
     if (int rc = Element(e[4], inner)) return rc;
     if (inner >= own) return kNotPlayable;

@@ -12,9 +12,13 @@
 //  -224 a well-formed expression this instrument cannot play: a version outside 2.0 .. 3.0
 //       (events: above 3.0), a block whose number of segments is not the number of data
 //       ports, a segment keyword it does not know, a loop level outside 1 .. its loop levels,
-//       or a loop holding a loop of its own level or a higher one.
+//       or a loop holding a loop of its own level or a higher one;
+//  -222 a loop count above kMaxLoopCount.
 class SimSequenceCheck {
  public:
+  // The most times the sequencer repeats a counted loop (":SGEN:GLOB:SEQ:ITER:MAX?").
+  static constexpr unsigned long kMaxLoopCount = 1048576;
+
   static int CheckSequence(std::string_view text, unsigned long dataPorts, unsigned long loopLevels);
   static int CheckEvents(std::string_view text);
 

@@ -149,7 +149,8 @@ int uiapp::LoadDatLib(ConditionList& list) { return Toolkit::Get().LoadResourceL
 const std::vector<Dstring>& uiapp::ClassNames() {
   static const std::vector<Dstring> kClasses = {"UnitEd",      "LbUnitEd",  "QenDsCBut", "QenDsRBut", "QenDsCBox",
                                                 "QenDsSlidr",  "QenDsSTEd", "QenParEd",  "QenParLb",  "GridManager",
-                                                "AddrDisp",    "DigitDisp", "NameDisp",  "ErrStateGridManager", "SegmentGridManager"};
+                                                "AddrDisp",    "DigitDisp", "NameDisp",  "ErrStateGridManager", "SegmentGridManager",
+                                                "LoopGridManager"};
   return kClasses;
 }
 

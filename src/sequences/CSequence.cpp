@@ -1,6 +1,7 @@
 #include "sequences/CSequence.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 #include <set>
 
@@ -12,6 +13,7 @@
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequenceAnalyzer.h"
 #include "sequences/CSequenceBlock.h"
+#include "sequences/CSequenceObserver.h"
 #include "sequences/CSequenceReader.h"
 #include "sequences/CSequenceStructure.h"
 #include "sequences/CSequenceWriter.h"
@@ -626,6 +628,31 @@ int CSequence::ClearBranchTable(unsigned long block, ConditionList& cond) {
   });
 }
 
+int CSequence::SetEvent(std::size_t index, const CSequenceEvents::Event& event, ConditionList& cond) {
+  const CSequenceEvents before = mEvents;
+  const int status = Edit("CSequence::SetEvent", cond, [&](bool&) {
+    if (!CPortInfo::HasCentral()) return Refuse(cond, "GUI_SEQUENCE_NO_EVENTS", {});
+    if (index >= CSequenceEvents::kNumEvents) {
+      return Refuse(cond, "GUI_SEQUENCE_NO_EVENT", {Number(index + 1), Number(CSequenceEvents::kNumEvents)});
+    }
+    if (int rc = CommandText::CheckArgument(event.name, cond)) return rc;
+    // Item texts travel in single quotes (a quote doubled), the last one bare.
+    for (const CSequenceEvents::Item& item : event.items) {
+      for (const Dstring* text : {&item.first, &item.second, &item.third}) {
+        if (int rc = CommandText::CheckArgument(*text, cond)) return rc;
+      }
+      const bool word = !item.bare.empty() && std::all_of(item.bare.begin(), item.bare.end(), [](char c) {
+        return std::isalnum(static_cast<unsigned char>(c)) || c == '_' || c == '.' || c == '-' || c == '+';
+      });
+      if (!word) return Refuse(cond, "GUI_SEQUENCE_BAD_EVENT_TEXT", {item.bare});
+    }
+    mEvents.SetEvent(index, event);
+    return 0;
+  });
+  if (status != 0) mEvents = before;
+  return status;
+}
+
 int CSequence::ClearExistingStartLabel(ConditionList& cond) {
   return Edit("CSequence::ClearExistingStartLabel", cond, [&](bool& write) {
     write = GetNumBlocks() > 0 && !GetLabel(1).empty();
@@ -680,16 +707,24 @@ int CSequence::WriteEvents(ConditionList& cond) {
   return QenGuiInst::Call(Command(":%s:SGEN:GLOB:SEQ:EVEN ") + mEvents.BuildExpression(), reply, cond);
 }
 
-int CSequence::ReadSequence(ConditionList& cond, unsigned force) {
+int CSequence::ReadSequence(ConditionList& cond, unsigned force) { return Read(cond, force, nullptr); }
+
+int CSequence::Read(ConditionList& cond, unsigned force, const Dstring* written) {
   LgsDebug trace("CSequence::ReadSequence", "sequence");
   FWBlocker guard("CSequence::ReadSequence", cond);
   if (int status = guard.Block()) return status;
+  const CSequenceEvents eventsBefore = mEvents;
   if (int status = ReadEvents(cond)) return status;
+  const bool eventsChanged = !(mEvents == eventsBefore);
   Dstring reply;
   if (int status = QenGuiInst::Call(Command(":%s:SGEN:GLOB:SEQ?"), reply, cond)) return status;
   reply = reply.Trimmed();
   const bool same = reply == mLastExpression;
-  if (same && !force) return 0;
+  if (same && !force) return eventsChanged ? ReportEvents(cond) : 0;
+  if (written != nullptr && !same && reply == *written) {
+    const int status = TakeWritten(reply, cond);
+    return status == 0 && eventsChanged ? ReportEvents(cond) : status;
+  }
 
   // The old content is what the views show: the last expression read, not local edits.
   if (!mLastExpression.empty()) {
@@ -716,6 +751,41 @@ int CSequence::ReadSequence(ConditionList& cond, unsigned force) {
   }
   trace.Printf(" read %zu blocks\n", mContent.blocks.size());
   mLastExpression = reply;
+  return eventsChanged ? ReportEvents(cond) : 0;
+}
+
+int CSequence::ReportEvents(ConditionList& cond) {
+  // An observer may leave while another is told.
+  const std::vector<CSequenceObserver*> observers = mObservers;
+  for (CSequenceObserver* observer : observers) {
+    if (std::find(mObservers.begin(), mObservers.end(), observer) == mObservers.end()) continue;
+    if (int status = observer->NfyEventsChanged(cond)) return status;
+  }
+  return 0;
+}
+
+// The server holds the text just written from the model: the model is what it holds, and only
+// what the views show, the last expression read, is rebuilt to tell them what changed. An
+// edit thus costs one parse, not two.
+int CSequence::TakeWritten(const Dstring& reply, ConditionList& cond) {
+  Content edited = std::move(mContent);
+  mContent = Content();
+  ConditionList ignored;
+  if (mLastExpression.empty() || fromExpression(mLastExpression, ignored) != 0) {
+    mContent = std::move(edited);
+    return Read(cond, 0, nullptr);
+  }
+  Content old = std::move(mContent);
+  mContent = std::move(edited);
+  // What the text does not carry: a synchronisation block is written without its reactions.
+  for (const auto& block : mContent.blocks) {
+    if (block->GetSync() != 0) block->Reactions().clear();
+  }
+  if (int status = AnalyzeChanges(old, cond)) {
+    mContent = std::move(old);
+    return status;
+  }
+  mLastExpression = reply;
   return 0;
 }
 
@@ -738,7 +808,7 @@ int CSequence::WriteSequence(ConditionList& cond) {
   }
   if (status == 0) status = WriteEvents(cond);
   const Dstring previous = mLastExpression;
-  if (status == 0) status = ReadSequence(cond, 0);
+  if (status == 0) status = Read(cond, 0, &expression);
   if (status == 0) {
     // The server kept its text (it took nothing, or normalised the edit away): the model
     // follows the server, not the edit.

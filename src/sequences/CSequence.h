@@ -173,6 +173,9 @@ class CSequence {
   int SetReactTrig(unsigned long block, unsigned long n, unsigned long value, ConditionList& cond);
   int SetReactVxi(unsigned long block, unsigned long n, const Dstring& value, ConditionList& cond);
   int ClearBranchTable(unsigned long block, ConditionList& cond);
+  // Event `index` (from 0) of the table; only a central module has events. A refused write
+  // leaves the table as it was.
+  int SetEvent(std::size_t index, const CSequenceEvents::Event& event, ConditionList& cond);
   // Clears the start label (the label of block 1); writes nothing when there is none.
   int ClearExistingStartLabel(ConditionList& cond);
   // Hands every named segment of the sequence, once each, to the segment sync (before a run).
@@ -212,7 +215,11 @@ class CSequence {
   void InsertBlock(unsigned long block, bool after, std::unique_ptr<CSequenceBlock> newBlock);
   std::unique_ptr<CSequenceBlock> ClipboardCopy() const;
 
+  // ReadSequence; `written`, when given, is the text just written from the model.
+  int Read(ConditionList& cond, unsigned force, const Dstring* written);
+  int TakeWritten(const Dstring& reply, ConditionList& cond);
   int ReadEvents(ConditionList& cond);
+  int ReportEvents(ConditionList& cond);
   int WriteEvents(ConditionList& cond);
   // Puts the model back to the last expression read, undoing local edits.
   void RestoreLastExpression();

@@ -54,5 +54,8 @@ class CSequenceObserver {
     return 0;
   }
   virtual int NfyUpdateLoops(ConditionList&) { return 0; }
+  // The table of sequence events read differs from the one before (told after the reports
+  // of the sequence, or alone when the sequence stayed).
+  virtual int NfyEventsChanged(ConditionList&) { return 0; }
   virtual int NfySequence(ConditionList&) { return 0; }
 };

@@ -200,17 +200,22 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
     Show(list);
     return nullptr;
   }
+  Adopt(window, resource, QString::fromStdString(entry->title));
+  Show(list);
+  return window;
+}
+
+QMdiSubWindow* MainWin::Adopt(QWidget* window, const QString& resource, const QString& title) {
   window->setAttribute(Qt::WA_DeleteOnClose);
   QMdiSubWindow* sub = mArea->addSubWindow(window);
   sub->setProperty(kResourceProperty, resource);
-  sub->setWindowTitle(QString::fromStdString(entry->title));
+  sub->setWindowTitle(title);
   sub->setWindowIcon(QIcon(QPixmap(1, 1)));
   sub->resize(window->sizeHint().expandedTo(window->size()));
   sub->setEnabled(!IsShowingLock());
   sub->show();
   window->setFocus();
-  Show(list);
-  return window;
+  return sub;
 }
 
 bool MainWin::IsShowingLock() const { return mBanner->isVisibleTo(this); }

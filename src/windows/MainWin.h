@@ -27,6 +27,8 @@ class MainWin : public QMainWindow {
   // (the condition has been shown).
   QWidget* OpenWindow(const QString& resource);
   QWidget* FindWindow(const QString& resource) const;
+  // Shows a built window in the area as a window of the resource, under the title.
+  QMdiSubWindow* Adopt(QWidget* window, const QString& resource, const QString& title);
   QMdiArea* Area() const { return mArea; }
   StateStatusBar* StatusBarView() const { return mStatus; }
   bool IsShowingLock() const;

@@ -7,9 +7,11 @@
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/errstate/ErrstateErrStateWin.h"
+#include "windows/loopgridedit/LoopGridEditWin.h"
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
+#include "windows/seqedit/SeqeditSeqEdWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 #include "windows/wavewin/WavewinWaveWin.h"
 
@@ -28,19 +30,22 @@ WindowFactory::Make Maker() {
 }  // namespace
 
 const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
+  // Editors first, then the tools used all day: the first nine have Ctrl+1 … Ctrl+9.
   static const std::vector<Entry> kEntries = {
       {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>()},
       {"dataedit.SegmentEditWin", "Segment Editor", Maker<DataeditSegmentEditWin>()},
       {"smseqedit.Win", "Simple Sequence", Maker<SmseqeditWin>()},
+      {"LoopGridEdit.Win", "Loop Grid", Maker<LoopGridEditWin>()},
+      {"seqedit.SeqEdWin", "Sequence", Maker<SeqeditSeqEdWin>()},
+      {"bconnect.ConnectWin", "System Scheme", Maker<BconnectConnectWin>()},
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
       {"errstate.ErrStateWin", "Error State", Maker<ErrstateErrStateWin>()},
+      {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
       {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
       {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
-      {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
-      {"bconnect.ConnectWin", "System Scheme", Maker<BconnectConnectWin>()},
   };
   return kEntries;
 }

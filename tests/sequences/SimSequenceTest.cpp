@@ -130,6 +130,9 @@ TEST_F(SimSequenceTest, TheBuiltInRack) {
   EXPECT_EQ(a.Error(), -113);
   EXPECT_EQ(a.Call(":SGEN:GLOB:SEQ:LLEV 4"), 1);
   EXPECT_EQ(a.Error(), -200);
+  EXPECT_EQ(a.Text(":SGEN:GLOB:SEQ:ITER:MAX?"), "1048576");
+  EXPECT_EQ(a.Call(":SGEN:GLOB:SEQ:ITER:MAX 5"), 1);
+  EXPECT_EQ(a.Error(), -200);
   EXPECT_EQ(a.Call(":SGEN:GLOB:CONF \"x\""), 1);
   EXPECT_EQ(a.Error(), -200);
 }
@@ -155,6 +158,8 @@ TEST_F(SimSequenceTest, WritesAreCheckedAndOnlyGoodOnesStored) {
       {"(3.0,\"\",(SEQ," + Block10(1) + "," + Block10(2) + "))", -104},
       {"(3.0,\"\",(BLOCK,0,-1,0,\"\",()," + Block10(1).substr(19) + ")", -104},
       {"(3.0,\"\",(LOOP1,0,2,\"\"," + Block10(1) + ",1))", -104},
+      {"(3.0,\"\",(LOOP1,0,1048577,\"\"," + Block10(1) + "))", -222},
+      {"(3.0,\"\",(LOOP1,0,1048576,\"\"," + Block10(1) + "))", 0},
       {good, 0},
       {"(3.0,,)", 0},
       {good, 0},

@@ -210,7 +210,11 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
     painter.setPen(pal.windowText().color());
     const Qt::Alignment align = digits ? Qt::AlignCenter : disp.Alignment();
     for (int c = 0; c < cells; ++c) {
-      painter.drawText(QRect(c * dx + pad, 0, dx - 2 * pad, top), align, DispHeader(disp, c));
+      // A name that does not fit ends in an ellipsis rather than being cut off; a header line
+      // by line.
+      QStringList lines = DispHeader(disp, c).split(QLatin1Char('\n'));
+      for (QString& line : lines) line = painter.fontMetrics().elidedText(line, Qt::ElideRight, dx - 2 * pad);
+      painter.drawText(QRect(c * dx + pad, 0, dx - 2 * pad, top), align, lines.join(QLatin1Char('\n')));
     }
   }
   const long first = DispFirstLine();
@@ -234,7 +238,8 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
       }
       if (cell.text.isEmpty()) continue;
       painter.setPen(cell.cursor ? pal.highlightedText().color() : cell.marked ? alert : cell.dim ? dimText : text);
-      painter.drawText(box.adjusted(pad, 0, -pad, 0), digits ? Qt::AlignCenter : disp.Alignment(), cell.text);
+      const QString text = digits ? cell.text : painter.fontMetrics().elidedText(cell.text, Qt::ElideRight, dx - 2 * pad);
+      painter.drawText(box.adjusted(pad, 0, -pad, 0), digits ? Qt::AlignCenter : disp.Alignment(), text);
     }
   }
 }

@@ -6,61 +6,24 @@
 #include <QLayout>
 #include <QPushButton>
 #include <QTableWidget>
-#include <QTimer>
 
 #include "params/ui/BoundControl.h"
-#include "segments/QenSegmentPool.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
-#include "sequences/CSequenceObserver.h"
+#include "sequences/SequenceCellEdit.h"
+#include "sequences/SequenceUndo.h"
+#include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/MainWin.h"
-#include "windows/PlaceName.h"
+#include "windows/PortHeader.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 
-namespace {
-
-// The kinds a port's cell may name instead of a segment, as the sequence spells them.
-CSequence::SeqSegType KindOf(const QString& text) {
-  for (int type = CSequence::SEG_PAUSE; type <= CSequence::SEG_DONTCARE; ++type) {
-    const auto kind = static_cast<CSequence::SeqSegType>(type);
-    if (text.compare(QLatin1String(CSequence::CSequenceBlock::KeywordOf(kind)), Qt::CaseInsensitive) == 0) return kind;
-  }
-  return CSequence::SEG_NAMED;
-}
-
-}  // namespace
-
-// Every report of a read ends in the same table: it is filled again once, after the read.
-class SmseqeditWin::Observer : public CSequenceObserver {
- public:
-  explicit Observer(SmseqeditWin& win) : mWin(win) {}
-  int NfySequence(ConditionList&) override { return Changed(); }
-  int NfyBlockInserted(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockDeleted(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockLabelChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfyBlockLengthChanged(unsigned long, ConditionList&) override { return Changed(); }
-  int NfySegmentChanged(unsigned long, unsigned long, ConditionList&) override { return Changed(); }
-  int NfyUpdateLoops(ConditionList&) override { return Changed(); }
-
- private:
-  int Changed() {
-    // Another client's change makes the steps back meaningless: they would undo it too.
-    if (!mWin.mEditing) mWin.ForgetSteps();
-    mWin.MarkStale();
-    return 0;
-  }
-  SmseqeditWin& mWin;
-};
-
-SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mObserver(std::make_unique<Observer>(*this)) {
+SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })) {
   setObjectName(QStringLiteral("SmseqeditWin"));
 }
 
-SmseqeditWin::~SmseqeditWin() {
-  if (CSequence* sequence = GetSequence()) sequence->RemoveObserver(mObserver.get());
-}
+SmseqeditWin::~SmseqeditWin() = default;
 
 CSequence* SmseqeditWin::GetSequence() { return CPortInfo::GetSequence(); }
 
@@ -89,7 +52,8 @@ int SmseqeditWin::Load(ConditionList& list) {
   connect(mOpenSegment, &QPushButton::clicked, this, &SmseqeditWin::HitPButOpenSegment);
   AddBlockActions();
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
-  GetSequence()->AddObserver(mObserver.get());
+  mFollower->Follow(GetSequence());
+  mUndo = std::make_unique<SequenceUndo>(*GetSequence());
   const int status = GetSequence()->ReadSequence(list, 0);
   Rebuild();
   return status;
@@ -101,18 +65,9 @@ unsigned long SmseqeditWin::CurrentBlock() const {
   return mTable->currentRow() < 0 ? 0 : static_cast<unsigned long>(mTable->currentRow()) + 1;
 }
 
-// A read may report many changes; the table is filled once, after the event that read.
-void SmseqeditWin::MarkStale() {
-  if (mStale) return;
-  mStale = true;
-  QTimer::singleShot(0, this, [this] {
-    if (mStale) Rebuild();
-  });
-}
-
 void SmseqeditWin::Rebuild() {
   const CSequence* sequence = GetSequence();
-  mStale = false;
+  mFollower->Refreshed();
   if (sequence == nullptr || mTable == nullptr) return;
   mFilling = true;
   const int current = mTable->currentRow();
@@ -121,18 +76,11 @@ void SmseqeditWin::Rebuild() {
   mTable->setColumnCount(kFirstPortColumn + static_cast<int>(ports));
   mTable->setHorizontalHeaderItem(0, new QTableWidgetItem(QStringLiteral("Label")));
   mTable->setHorizontalHeaderItem(1, new QTableWidgetItem(QStringLiteral("Length")));
-  // The sequence's ports are the data ports in the order of the configuration: a column each,
-  // headed by its place on two lines and its type.
-  unsigned long p = 0;
-  for (const CPortInfo::Port& port : CPortInfo::GetPorts()) {
-    if (port.portClass != "PDAT" || ++p > ports) continue;
-    QString place = PlaceName(port.path);
-    place.replace(place.lastIndexOf(QStringLiteral(" › ")), 3, QStringLiteral("\n"));
-    const QString kind = port.type == "OUTPUT_PORT"  ? QStringLiteral("generator")
-                         : port.type == "INPUT_PORT" ? QStringLiteral("analyser")
-                                                     : QString::fromStdString(port.type);
-    auto* header = new QTableWidgetItem(QStringLiteral("%1\n%2").arg(place, kind));
-    header->setToolTip(QStringLiteral("%1, %2").arg(PlaceName(port.path), QString::fromStdString(port.model)));
+  // The sequence's ports are the data ports in the order of the configuration: a column each.
+  for (unsigned long p = 1; p <= ports; ++p) {
+    QString tip;
+    auto* header = new QTableWidgetItem(PortHeader(p, &tip));
+    header->setToolTip(tip);
     mTable->setHorizontalHeaderItem(kFirstPortColumn + static_cast<int>(p) - 1, header);
   }
   mTable->setRowCount(static_cast<int>(sequence->GetNumBlocks()));
@@ -180,70 +128,32 @@ void SmseqeditWin::HitCellChanged(int row, int column) {
 int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list) {
   CSequence* sequence = GetSequence();
   if (column == 0) return sequence->SetLabel(block, text.toStdString(), list);
-  if (column == 1) {
-    bool number = false;
-    const unsigned long length = text.toULong(&number);
-    if (!number || length == 0) {
-      list.Add(1, Dstring::Format("\"%s\" is no block length: a whole number of vectors above 0.", text.toStdString().c_str()));
-      return 1;
-    }
-    return sequence->SetBlockLength(block, length, list);
-  }
-  const CSequence::SeqSegType kind = KindOf(text);
-  // The sequence takes any name; the instrument would only find out at the run.
-  if (kind == CSequence::SEG_NAMED) {
-    bool exists = false;
-    if (int status = QenSegmentPool::Exists(text.toStdString(), exists, list)) return status;
-    if (!exists) {
-      list.Add(1, Dstring::Format("There is no segment \"%s\" on the instrument: make it in the segment editor first.",
-                                  text.toStdString().c_str()));
-      return 1;
-    }
-  }
-  return sequence->SetSegment(block, static_cast<unsigned long>(column - kFirstPortColumn + 1), text.toStdString(), list, kind);
+  if (column == 1) return SequenceCellEdit::SetLength(*sequence, block, text.toStdString(), list);
+  return SequenceCellEdit::SetSegment(*sequence, block, static_cast<unsigned long>(column - kFirstPortColumn + 1),
+                                      text.toStdString(), list);
 }
 
 void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
-  const Dstring before = GetSequence()->GetLastExpression();
-  mEditing = true;
-  const int status = command(list);
-  mEditing = false;
-  // A step that changed what the instrument holds can be taken back.
-  if (status == 0 && GetSequence()->GetLastExpression() != before && !before.empty()) {
-    mUndo.push_back(before);
-    if (mUndo.size() > kMaxSteps) mUndo.erase(mUndo.begin());
-    mRedo.clear();
-  }
+  const int status = mUndo->Run(command, list);
   // A refusal shows what the instrument holds; a step shows what it holds now.
-  if (status != 0 || mStale) Rebuild();
+  if (status != 0 || mFollower->IsStale()) Rebuild();
   BoundControl::Report(list);
 }
 
-int SmseqeditWin::Undo(ConditionList& list) { return Step(mUndo, mRedo, list); }
-int SmseqeditWin::Redo(ConditionList& list) { return Step(mRedo, mUndo, list); }
+bool SmseqeditWin::CanUndo() const { return mUndo && mUndo->CanUndo(); }
 
-// The sequence as it was is written whole and read back; the text it replaces goes on the
-// other stack.
-int SmseqeditWin::Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& list) {
-  if (from.empty() || !IsEditable()) return 0;
-  CSequence* sequence = GetSequence();
-  const Dstring now = sequence->GetLastExpression();
-  mEditing = true;
-  int status = sequence->fromExpression(from.back(), list);
-  if (status == 0) status = sequence->WriteSequence(list);
-  mEditing = false;
-  if (status == 0) {
-    from.pop_back();
-    to.push_back(now);
-  }
+// A sequence with loops is not this editor's to change, not even back.
+int SmseqeditWin::Undo(ConditionList& list) {
+  const int status = IsEditable() ? mUndo->Undo(list) : 0;
   Rebuild();
   return status;
 }
 
-void SmseqeditWin::ForgetSteps() {
-  mUndo.clear();
-  mRedo.clear();
+int SmseqeditWin::Redo(ConditionList& list) {
+  const int status = IsEditable() ? mUndo->Redo(list) : 0;
+  Rebuild();
+  return status;
 }
 
 // Cut, copy and paste of whole blocks, on the table's keys and its context menu; the keys are

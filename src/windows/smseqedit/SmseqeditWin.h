@@ -9,6 +9,8 @@
 #include "support/Dstring.h"
 
 class CSequence;
+class SequenceFollower;
+class SequenceUndo;
 class QLabel;
 class QPushButton;
 class QTableWidget;
@@ -39,12 +41,10 @@ class SmseqeditWin : public QWidget {
   // are forgotten when another client changes the sequence.
   int Undo(ConditionList& list);
   int Redo(ConditionList& list);
-  bool CanUndo() const { return !mUndo.empty(); }
+  bool CanUndo() const;
 
  private:
-  class Observer;
   static constexpr int kFirstPortColumn = 2;
-  static constexpr std::size_t kMaxSteps = 50;
 
   // An edited cell goes to the model; a refusal is shown and the line put back.
   void HitCellChanged(int row, int column);
@@ -56,19 +56,13 @@ class SmseqeditWin : public QWidget {
   int AddBlock(ConditionList& list);
   int DeleteBlock(ConditionList& list);
   int MoveBlock(long distance, ConditionList& list);
-  void MarkStale();
   void AddBlockActions();
-  int Step(std::vector<Dstring>& from, std::vector<Dstring>& to, ConditionList& list);
-  void ForgetSteps();
   void HitPButOpenSegment();
 
   QTableWidget* mTable = nullptr;
   QLabel* mState = nullptr;
   QPushButton* mOpenSegment = nullptr;
-  std::unique_ptr<Observer> mObserver;
+  std::unique_ptr<SequenceFollower> mFollower;
   bool mFilling = false;
-  bool mEditing = false;
-  bool mStale = false;
-  std::vector<Dstring> mUndo;
-  std::vector<Dstring> mRedo;
+  std::unique_ptr<SequenceUndo> mUndo;
 };

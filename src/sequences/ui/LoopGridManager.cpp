@@ -1,0 +1,540 @@
+#include "sequences/ui/LoopGridManager.h"
+
+#include <QAction>
+#include <QCompleter>
+#include <QDataStream>
+#include <QKeyEvent>
+#include <QLineEdit>
+#include <QMimeData>
+#include <QPainter>
+#include <algorithm>
+
+#include "segments/ui/GridDisp.h"
+#include "segments/ui/NameDisp.h"
+#include "sequences/CLoop.h"
+#include "sequences/CSequence.h"
+#include "sequences/CSequenceBlock.h"
+#include "sequences/SequenceUndo.h"
+#include "sequences/ui/SequenceFollower.h"
+#include "toolkit/qt/WidgetClassTable.h"
+
+namespace {
+
+const QLatin1String kBlocks("blocks");
+const QLatin1String kLoops("loops");
+const QLatin1String kLabels("labels");
+const QLatin1String kLengths("lengths");
+const QLatin1String kMarks("marks");
+const QLatin1String kPortPrefix("port");
+
+QString CountText(unsigned long iterations) {
+  return iterations == 0 ? QStringLiteral("\u221E") : QStringLiteral("\u00D7%1").arg(iterations);
+}
+
+}  // namespace
+
+LoopGridManager::LoopGridManager(QWidget* parent)
+    : GridManager(parent),
+      mFollower(std::make_unique<SequenceFollower>(this, [this] { Sync(); })),
+      mEditor(new QLineEdit(this)) {
+  setObjectName(QString::fromLatin1(Class()));
+  setAcceptDrops(true);
+  mEditor->hide();
+  mEditor->installEventFilter(this);
+  AddActions();
+}
+
+LoopGridManager::~LoopGridManager() {
+  Detach();
+}
+
+void LoopGridManager::CppRegister() {
+  WidgetClassTable::AddFactory(Class(),
+                               [](QWidget* parent) -> QWidget* { return new LoopGridManager(parent); });
+}
+
+void LoopGridManager::Detach() {
+  mUndo.reset();
+  mFollower->Follow(nullptr);
+  mSequence = nullptr;
+}
+
+void LoopGridManager::SetSequence(CSequence* sequence) {
+  Detach();
+  mSequence = sequence;
+  mField = static_cast<int>(sequence == nullptr ? 0 : CSequence::GetNumLoopLevels());
+  if (mSequence != nullptr) {
+    mFollower->Follow(mSequence);
+    mUndo = std::make_unique<SequenceUndo>(*mSequence);
+  }
+  Sync();
+}
+
+// --- Fields ------------------------------------------------------------------------------------
+
+int LoopGridManager::NumFields() const {
+  return static_cast<int>(mLevels + 2 + mPorts);
+}
+int LoopGridManager::LabelField() const {
+  return static_cast<int>(mLevels);
+}
+int LoopGridManager::LengthField() const {
+  return static_cast<int>(mLevels) + 1;
+}
+int LoopGridManager::LaneField(unsigned long level) const {
+  return static_cast<int>(mLevels - level);
+}
+int LoopGridManager::PortField(unsigned long port) const {
+  return static_cast<int>(mLevels + 1 + port);
+}
+
+unsigned long LoopGridManager::LevelOf(int field) const {
+  return field >= 0 && field < LabelField() ? mLevels - static_cast<unsigned long>(field) : 0;
+}
+
+unsigned long LoopGridManager::PortOf(int field) const {
+  return field > LengthField() && field < NumFields() ? static_cast<unsigned long>(field - LengthField()) : 0;
+}
+
+bool LoopGridManager::IsSelected(unsigned long block) const {
+  return mRow != mAnchor && block >= FirstSelected() && block <= LastSelected();
+}
+
+unsigned long LoopGridManager::FirstSelected() const {
+  return static_cast<unsigned long>(std::min(mRow, mAnchor)) + 1;
+}
+unsigned long LoopGridManager::LastSelected() const {
+  return static_cast<unsigned long>(std::max(mRow, mAnchor)) + 1;
+}
+
+void LoopGridManager::SetCursor(unsigned long block, int field, bool extend) {
+  const long lines = DispLineCount();
+  if (lines == 0) return;
+  mRow = std::clamp(static_cast<long>(block) - 1, 0L, lines - 1);
+  mField = std::clamp(field, 0, NumFields() - 1);
+  if (!extend) mAnchor = mRow;
+  ShowLine(mRow);
+  Refresh();
+  emit StateChanged();
+}
+
+QString LoopGridManager::CellText(unsigned long block, int field) const {
+  if (mSequence == nullptr || block < 1 || block > mSequence->GetNumBlocks()) return {};
+  if (field == LabelField()) return QString::fromStdString(mSequence->GetLabel(block));
+  if (field == LengthField()) return QString::number(mSequence->GetBlockLength(block));
+  if (const unsigned long port = PortOf(field))
+    return QString::fromStdString(mSequence->GetSegment(block, port));
+  if (const unsigned long level = LevelOf(field)) {
+    if (mSequence->GetLoopStatus(block, level) == CSequence::LOOP_NONE) return {};
+    const unsigned long iterations = mSequence->GetNumIterations(block, level);
+    return iterations == 0 ? QStringLiteral("INF") : QString::number(iterations);
+  }
+  return {};
+}
+
+QString LoopGridManager::MarksOf(const CSequence& sequence, unsigned long block) {
+  QStringList marks;
+  if (sequence.GetBlockMeasurementStart(block) != 0) marks << QStringLiteral("M");
+  if (sequence.GetBlockSync(block) != 0) marks << QStringLiteral("S");
+  if (sequence.GetBlockTrigger(block) != 0)
+    marks << QStringLiteral("T%1").arg(sequence.GetBlockTrigger(block));
+  if (const unsigned long n = sequence.GetBlockNumBranches(block)) marks << QStringLiteral("R%1").arg(n);
+  return marks.join(QLatin1Char(' '));
+}
+
+// --- Following the model -----------------------------------------------------------------------
+
+void LoopGridManager::Sync() {
+  mFollower->Refreshed();
+  SyncColumns();
+  const long lines = DispLineCount();
+  mRow = std::clamp(mRow, 0L, std::max(0L, lines - 1));
+  mAnchor = std::clamp(mAnchor, 0L, std::max(0L, lines - 1));
+  mField = std::clamp(mField, 0, std::max(0, NumFields() - 1));
+  mFirst = std::clamp(mFirst, 0L, std::max(0L, lines - VisibleLines()));
+  Refresh();
+  emit StateChanged();
+}
+
+// A column per data port, added or taken away when the number of ports changes; the loop lanes
+// as wide as the levels need.
+void LoopGridManager::SyncColumns() {
+  const unsigned long ports = mSequence == nullptr ? 0 : mSequence->GetNumPorts();
+  mLevels = mSequence == nullptr ? 0 : CSequence::GetNumLoopLevels();
+  if (auto* loops = findChild<GridDisp*>(kLoops, Qt::FindDirectChildrenOnly)) {
+    if (loops->Cells() != static_cast<int>(mLevels) * kLaneCells)
+      loops->SetCells(static_cast<int>(mLevels) * kLaneCells);
+  }
+  if (ports == mPorts) return;
+  for (GridDisp* disp : Disps()) {
+    if (disp->objectName().startsWith(kPortPrefix)) delete disp;
+  }
+  for (unsigned long p = 1; p <= ports; ++p) {
+    auto* disp = new NameDisp(this);
+    disp->setObjectName(kPortPrefix + QString::number(p));
+    disp->show();
+  }
+  mPorts = ports;
+  LayoutDisps();
+}
+
+long LoopGridManager::DispLineCount() const {
+  return mSequence == nullptr ? 0 : static_cast<long>(mSequence->GetNumBlocks());
+}
+
+// --- Drawing -----------------------------------------------------------------------------------
+
+int LoopGridManager::FieldAt(const GridDisp& disp, int cell) const {
+  const QString name = disp.objectName();
+  if (name == kLoops) return mLevels == 0 ? -1 : std::min(cell / kLaneCells, static_cast<int>(mLevels) - 1);
+  if (name == kLabels) return LabelField();
+  if (name == kLengths) return LengthField();
+  if (name.startsWith(kPortPrefix)) return PortField(name.mid(kPortPrefix.size()).toULong());
+  return -1;
+}
+
+QString LoopGridManager::DispHeader(const GridDisp& disp, int) const {
+  const QString name = disp.objectName();
+  if (name == kBlocks) return QStringLiteral("Block");
+  if (name == kLabels) return QStringLiteral("Label");
+  if (name == kLengths) return QStringLiteral("Length");
+  if (name == kMarks) return QStringLiteral("Marks");
+  if (name.startsWith(kPortPrefix) && mPortHeader) return mPortHeader(name.mid(kPortPrefix.size()).toULong());
+  return name.startsWith(kPortPrefix) ? QStringLiteral("Port %1").arg(name.mid(kPortPrefix.size()))
+                                      : QString();
+}
+
+GridCell LoopGridManager::DispCell(const GridDisp& disp, long line, int cell) const {
+  GridCell out;
+  const auto block = static_cast<unsigned long>(line) + 1;
+  const int field = FieldAt(disp, cell);
+  if (disp.objectName() == kBlocks) {
+    out.text = QString::number(block);
+  } else if (disp.objectName() == kMarks) {
+    out.text = MarksOf(*mSequence, block);
+  } else if (field >= 0) {
+    out.text = CellText(block, field);
+    const unsigned long port = PortOf(field);
+    out.dim = port != 0 && mSequence->GetType(block, port) != CSequence::SEG_NAMED;
+    out.cursor = line == mRow && field == mField && !IsEditing();
+  }
+  // A run of blocks shows as selected; a single block by its number.
+  out.selected = IsSelected(block) || (line == mRow && disp.objectName() == kBlocks);
+  return out;
+}
+
+void LoopGridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const {
+  if (disp.objectName() == kLoops) return PaintLoops(disp, painter, area);
+  GridManager::DispPaint(disp, painter, area);
+}
+
+// A lane per level, the top level on the left. A loop is a bracket beside its blocks, with its
+// count at its first block; a loop that starts above the lines shown repeats its count, dimmed,
+// at the first line shown.
+void LoopGridManager::PaintLoops(const GridDisp& disp, QPainter& painter, const QRect& area) const {
+  const QPalette& pal = disp.palette();
+  painter.fillRect(area, pal.base());
+  const int top = GetOffY();
+  const int dy = GetDY();
+  if (mLevels == 0 || dy <= 0) return;
+  const int lane = disp.width() / static_cast<int>(mLevels);
+  painter.fillRect(QRect(0, 0, disp.width(), top), pal.window());
+  painter.setPen(pal.windowText().color());
+  for (unsigned long level = mLevels; level >= 1; --level) {
+    const int x = LaneField(level) * lane;
+    painter.drawText(QRect(x, 0, lane, top), Qt::AlignCenter,
+                     level == mLevels ? QStringLiteral("Loop %1\n(top)").arg(level)
+                                      : QStringLiteral("Loop %1").arg(level));
+  }
+  const long count = DispLineCount();
+  const QColor dimText = pal.color(QPalette::Disabled, QPalette::Text);
+  for (long i = std::max(0, (area.top() - top) / dy); mFirst + i < count; ++i) {
+    const int y = top + static_cast<int>(i) * dy;
+    if (y > area.bottom()) break;
+    const long line = mFirst + i;
+    const auto block = static_cast<unsigned long>(line) + 1;
+    const bool selected = IsSelected(block);
+    for (unsigned long level = 1; level <= mLevels; ++level) {
+      const int field = LaneField(level);
+      const QRect box(field * lane, y, lane, dy);
+      const bool cursor = line == mRow && field == mField;
+      if (cursor) {
+        painter.fillRect(box, pal.highlight());
+      } else if (selected) {
+        painter.fillRect(box, pal.highlight().color().lighter(170));
+      }
+      const CSequence::LOOP_STATUS status = mSequence->GetLoopStatus(block, level);
+      if (status == CSequence::LOOP_NONE) continue;
+      const bool starts = status == CSequence::LOOP_START || status == CSequence::LOOP_SINGLE;
+      const bool ends = status == CSequence::LOOP_END || status == CSequence::LOOP_SINGLE;
+      const int x = box.left() + 5;
+      const int y0 = starts ? box.top() + 3 : box.top();
+      const int y1 = ends ? box.bottom() - 3 : box.bottom() + 1;
+      painter.setPen(QPen(cursor ? pal.highlightedText().color() : pal.text().color(), 2));
+      painter.drawLine(x, y0, x, y1);
+      if (starts) painter.drawLine(x, y0, x + 5, y0);
+      if (ends) painter.drawLine(x, y1, x + 5, y1);
+      if (starts || i == 0) {
+        painter.setPen(cursor ? pal.highlightedText().color() : starts ? pal.text().color() : dimText);
+        const QString text = painter.fontMetrics().elidedText(
+            CountText(mSequence->GetNumIterations(block, level)), Qt::ElideRight, box.width() - 14);
+        painter.drawText(box.adjusted(10, 0, -2, 0), Qt::AlignLeft | Qt::AlignVCenter, text);
+      }
+    }
+  }
+}
+
+// --- Pointer -----------------------------------------------------------------------------------
+
+void LoopGridManager::DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers) {
+  if (IsEditing()) CommitEdit();
+  const int field = FieldAt(disp, cell);
+  SetCursor(static_cast<unsigned long>(line) + 1, field >= 0 ? field : mField, modifiers & Qt::ShiftModifier);
+}
+
+void LoopGridManager::DispMove(const GridDisp& disp, long line, int cell) {
+  const int field = FieldAt(disp, cell);
+  SetCursor(static_cast<unsigned long>(line) + 1, field >= 0 ? field : mField, true);
+}
+
+bool LoopGridManager::CellAt(const QPoint& point, long& line, int& field) const {
+  for (GridDisp* disp : Disps()) {
+    if (!disp->geometry().contains(point)) continue;
+    int cell = 0;
+    if (!disp->HitCell(disp->mapFrom(this, point), line, cell)) return false;
+    field = FieldAt(*disp, cell);
+    return field >= 0;
+  }
+  return false;
+}
+
+QRect LoopGridManager::CellRect(long line, int field) const {
+  const int y = GetOffY() + static_cast<int>(line - mFirst) * GetDY();
+  for (GridDisp* disp : Disps()) {
+    const QString name = disp->objectName();
+    if (name == kLoops && LevelOf(field) != 0) {
+      const int lane = disp->width() / static_cast<int>(mLevels);
+      return QRect(disp->x() + field * lane, y, lane, GetDY());
+    }
+    if (name != kLoops && FieldAt(*disp, 0) == field) return QRect(disp->x(), y, disp->width(), GetDY());
+  }
+  return {};
+}
+
+QString LoopGridManager::DroppedName(const QMimeData* mime) {
+  // A list's items travel as the model's item data; their display text is the name.
+  const QString listFormat = QStringLiteral("application/x-qabstractitemmodeldatalist");
+  if (mime->hasFormat(listFormat)) {
+    QByteArray bytes = mime->data(listFormat);
+    QDataStream stream(&bytes, QIODevice::ReadOnly);
+    int row = 0;
+    int column = 0;
+    QMap<int, QVariant> roles;
+    stream >> row >> column >> roles;
+    return roles.value(Qt::DisplayRole).toString();
+  }
+  return mime->hasText() ? mime->text().trimmed() : QString();
+}
+
+void LoopGridManager::dragEnterEvent(QDragEnterEvent* event) {
+  if (mSequence != nullptr && !DroppedName(event->mimeData()).isEmpty()) event->acceptProposedAction();
+}
+
+void LoopGridManager::dragMoveEvent(QDragMoveEvent* event) {
+  long line = 0;
+  int field = 0;
+  if (CellAt(event->position().toPoint(), line, field) && PortOf(field) != 0) {
+    event->acceptProposedAction();
+  } else {
+    event->ignore();
+  }
+}
+
+void LoopGridManager::dropEvent(QDropEvent* event) {
+  long line = 0;
+  int field = 0;
+  const QString name = DroppedName(event->mimeData());
+  if (name.isEmpty() || !CellAt(event->position().toPoint(), line, field) || PortOf(field) == 0) return;
+  event->acceptProposedAction();
+  SetCursor(static_cast<unsigned long>(line) + 1, field);
+  SetCellText(static_cast<unsigned long>(line) + 1, field, name);
+}
+
+// --- Keys --------------------------------------------------------------------------------------
+
+// The commands are the grid's actions, so they have their keys while the grid has the focus and
+// make its context menu.
+void LoopGridManager::AddActions() {
+  struct Entry {
+    const char* name;
+    const char* text;
+    QList<QKeySequence> keys;
+    std::function<void()> run;
+  };
+  const Entry entries[] = {
+      {"EditCell", "&Edit Cell", {QKeySequence(Qt::Key_F2)}, [this] { BeginEdit(); }},
+      {"InsertAfter", "&Insert Block After", {QKeySequence(Qt::Key_Insert)}, [this] { InsertBlock(false); }},
+      {"InsertBefore",
+       "Insert Block &Before",
+       {QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_Insert)},
+       [this] { InsertBlock(true); }},
+      {"Delete",
+       "&Delete Block (Loop on a Lane)",
+       {QKeySequence(QKeySequence::Delete)},
+       [this] { LevelOf(mField) != 0 ? RemoveLoop() : DeleteBlock(); }},
+      {"MoveUp", "Move Block &Up", {QKeySequence(Qt::CTRL | Qt::Key_Up)}, [this] { MoveBlock(-1); }},
+      {"MoveDown", "Move Block Do&wn", {QKeySequence(Qt::CTRL | Qt::Key_Down)}, [this] { MoveBlock(1); }},
+      {"Cut", "Cu&t Block", QKeySequence::keyBindings(QKeySequence::Cut), [this] { CutBlock(); }},
+      {"Copy", "&Copy Block", QKeySequence::keyBindings(QKeySequence::Copy), [this] { CopyBlock(); }},
+      {"Paste", "&Paste Block After", QKeySequence::keyBindings(QKeySequence::Paste),
+       [this] { PasteBlock(); }},
+      {"AddLoop", "&Loop Selected Blocks", {QKeySequence(Qt::CTRL | Qt::Key_L)}, [this] { AddLoop(); }},
+      {"RemoveLoop",
+       "&Remove Loop",
+       {QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_L)},
+       [this] { RemoveLoop(); }},
+      {"Undo", "&Undo", QKeySequence::keyBindings(QKeySequence::Undo), [this] { Undo(); }},
+      {"Redo",
+       "Re&do",
+       {QKeySequence(Qt::CTRL | Qt::Key_Y), QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_Z)},
+       [this] { Redo(); }},
+      {"OpenSegment",
+       "&Open Segment",
+       {QKeySequence(Qt::CTRL | Qt::Key_E)},
+       [this] {
+         if (PortOf(mField) != 0 &&
+             mSequence->GetType(CursorBlock(), PortOf(mField)) == CSequence::SEG_NAMED) {
+           emit OpenSegmentRequested(CursorBlock(), PortOf(mField));
+         }
+       }},
+      {"OpenEvents",
+       "Block E&vents...",
+       {QKeySequence(Qt::CTRL | Qt::Key_R)},
+       [this] { emit OpenEventsRequested(CursorBlock()); }},
+  };
+  for (const Entry& e : entries) {
+    auto* action = new QAction(QString::fromUtf8(e.text), this);
+    action->setObjectName(QLatin1String(e.name));
+    action->setShortcuts(e.keys);
+    action->setShortcutContext(Qt::WidgetShortcut);
+    addAction(action);
+    connect(action, &QAction::triggered, this, [this, run = e.run] {
+      if (mSequence != nullptr && DispLineCount() > 0) run();
+    });
+  }
+  setContextMenuPolicy(Qt::ActionsContextMenu);
+}
+
+void LoopGridManager::keyPressEvent(QKeyEvent* event) {
+  if (mSequence == nullptr) return GridManager::keyPressEvent(event);
+  const bool extend = event->modifiers() & Qt::ShiftModifier;
+  const long page = std::max(1L, VisibleLines() - 1);
+  const unsigned long block = CursorBlock();
+  const bool ctrl = event->modifiers() & Qt::ControlModifier;
+  switch (event->key()) {
+    case Qt::Key_Up:
+      SetCursor(block > 1 ? block - 1 : 1, mField, extend);
+      break;
+    case Qt::Key_Down:
+      SetCursor(block + 1, mField, extend);
+      break;
+    case Qt::Key_Left:
+      SetCursor(block, std::max(0, mField - 1), extend);
+      break;
+    case Qt::Key_Right:
+      SetCursor(block, mField + 1, extend);
+      break;
+    case Qt::Key_PageUp:
+      SetCursor(block > static_cast<unsigned long>(page) ? block - page : 1, mField, extend);
+      break;
+    case Qt::Key_PageDown:
+      SetCursor(block + page, mField, extend);
+      break;
+    case Qt::Key_Home:
+      ctrl ? SetCursor(1, mField, extend) : SetCursor(block, LabelField(), extend);
+      break;
+    case Qt::Key_End:
+      ctrl ? SetCursor(DispLineCount(), mField, extend) : SetCursor(block, NumFields() - 1, extend);
+      break;
+    case Qt::Key_Return:
+    case Qt::Key_Enter:
+      BeginEdit();
+      break;
+    default:
+      // Typing starts the cell's editor with what was typed, as a table does.
+      if (!event->text().isEmpty() && event->text().at(0).isPrint() &&
+          !(event->modifiers() & (Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier))) {
+        BeginEdit(event->text());
+        break;
+      }
+      GridManager::keyPressEvent(event);
+      return;
+  }
+  event->accept();
+}
+
+// --- The cell editor ---------------------------------------------------------------------------
+
+void LoopGridManager::BeginEdit(const QString& text) {
+  if (mSequence == nullptr || DispLineCount() == 0) return;
+  const unsigned long level = LevelOf(mField);
+  if (level != 0 && mSequence->GetLoopStatus(CursorBlock(), level) == CSequence::LOOP_NONE) return;
+  ShowLine(mRow);
+  const QRect box = CellRect(mRow, mField);
+  if (box.isEmpty()) return;
+  mEditField = mField;
+  mEditRow = mRow;
+  mEditor->setCompleter(nullptr);
+  if (PortOf(mField) != 0) {
+    QStringList words = mSegmentNames;
+    for (int type = CSequence::SEG_PAUSE; type <= CSequence::SEG_DONTCARE; ++type) {
+      words << QLatin1String(CSequence::CSequenceBlock::KeywordOf(static_cast<CSequence::SeqSegType>(type)));
+    }
+    auto* completer = new QCompleter(words, mEditor);
+    completer->setCaseSensitivity(Qt::CaseInsensitive);
+    completer->setFilterMode(Qt::MatchContains);
+    mEditor->setCompleter(completer);
+  }
+  mEditor->setGeometry(box.adjusted(0, -2, 0, 2));
+  mEditor->setText(text.isNull() ? CellText(CursorBlock(), mField) : text);
+  mEditor->show();
+  mEditor->setFocus();
+  Refresh();
+}
+
+// Enter and Tab commit the cell's text, Escape drops it; neither reaches the grid, which would
+// take Enter for another edit.
+bool LoopGridManager::eventFilter(QObject* watched, QEvent* event) {
+  if (watched != mEditor || event->type() != QEvent::KeyPress)
+    return GridManager::eventFilter(watched, event);
+  switch (static_cast<QKeyEvent*>(event)->key()) {
+    case Qt::Key_Return:
+    case Qt::Key_Enter:
+    case Qt::Key_Tab:
+      CommitEdit();
+      return true;
+    case Qt::Key_Escape:
+      CancelEdit();
+      return true;
+    default:
+      return false;
+  }
+}
+
+void LoopGridManager::CommitEdit() {
+  if (!IsEditing()) return;
+  const int field = std::exchange(mEditField, -1);
+  const QString text = mEditor->text().trimmed();
+  mEditor->hide();
+  setFocus();
+  const auto block = static_cast<unsigned long>(mEditRow) + 1;
+  if (text != CellText(block, field)) SetCellText(block, field, text);
+  Refresh();
+}
+
+void LoopGridManager::CancelEdit() {
+  mEditField = -1;
+  mEditor->hide();
+  setFocus();
+  Refresh();
+}

@@ -1,0 +1,159 @@
+#include "windows/loopgridedit/LoopGridEditWin.h"
+
+#include <QLabel>
+#include <QLayout>
+#include <QListWidget>
+#include <QPushButton>
+#include <QSplitter>
+
+#include "core/uiapp.h"
+#include "params/ui/BoundControl.h"
+#include "segments/QenSegmentPool.h"
+#include "sequences/CPortInfo.h"
+#include "sequences/CSequence.h"
+#include "sequences/SequenceLoopRules.h"
+#include "sequences/ui/LoopGridManager.h"
+#include "sequences/ui/SequenceFollower.h"
+#include "toolkit/WaitCursor.h"
+#include "toolkit/qt/ResourceLibrary.h"
+#include "windows/PortHeader.h"
+#include "windows/seqedit/SequenceWindows.h"
+
+LoopGridEditWin::LoopGridEditWin(QWidget* parent)
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { ShowState(); })) {
+  setObjectName(QStringLiteral("LoopGridEditWin"));
+}
+
+LoopGridEditWin::~LoopGridEditWin() = default;
+
+CSequence* LoopGridEditWin::GetSequence() {
+  return CPortInfo::GetSequence();
+}
+
+int LoopGridEditWin::Load(ConditionList& list) {
+  if (int status = ResourceLibrary::LoadInto("LoopGridEdit.Win", this, list)) return status;
+  mGrid = findChild<LoopGridManager*>(QStringLiteral("GridLoops"));
+  mSegments = findChild<QListWidget*>(QStringLiteral("ListSegments"));
+  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
+  CSequence* sequence = GetSequence();
+  if (mGrid == nullptr || mSegments == nullptr || mState == nullptr || sequence == nullptr) {
+    list.Add(1,
+             "The window resource \"LoopGridEdit.Win\" lacks its grid, list or state line, or there is no "
+             "sequence.");
+    return 1;
+  }
+  layout()->setContentsMargins(8, 6, 8, 6);
+  if (auto* split = findChild<QSplitter*>(QStringLiteral("Split"))) split->setStretchFactor(1, 1);
+  setFocusProxy(mGrid);
+  struct Button {
+    const char* name;
+    std::function<void()> run;
+  };
+  const Button buttons[] = {
+      {"PButAddLoop", [this] { mGrid->AddLoop(); }},
+      {"PButRemoveLoop", [this] { mGrid->RemoveLoop(); }},
+      {"PButOpenSegment",
+       [this] { HitPButOpenSegment(mGrid->CursorBlock(), mGrid->PortOf(mGrid->CursorField())); }},
+      {"PButEvents", [this] { HitPButEvents(mGrid->CursorBlock()); }},
+      {"PButSequence", [this] { SequenceWindows::OpenSequence(this); }},
+      {"PButRun", [this] { RunAction(&uiapp::Run); }},
+      {"PButStop", [this] { RunAction(&uiapp::Stop); }},
+      {"PButForce", [this] { RunAction(&uiapp::SequenceForce); }},
+      {"PButRefresh",
+       [this] {
+         ConditionList l;
+         FillSegments(l);
+         BoundControl::Report(l);
+       }},
+  };
+  for (const Button& b : buttons) {
+    auto* button = findChild<QPushButton*>(QLatin1String(b.name));
+    if (button == nullptr) continue;
+    // The keys belong to the grid: a button leaves the focus where it was.
+    button->setFocusPolicy(Qt::NoFocus);
+    connect(button, &QPushButton::clicked, this, [this, run = b.run] {
+      run();
+      mGrid->setFocus();
+    });
+  }
+  connect(mGrid, &LoopGridManager::OpenSegmentRequested, this, &LoopGridEditWin::HitPButOpenSegment);
+  connect(mGrid, &LoopGridManager::OpenEventsRequested, this, &LoopGridEditWin::HitPButEvents);
+  connect(mGrid, &GridManager::StateChanged, this, &LoopGridEditWin::ShowState);
+  connect(mSegments, &QListWidget::itemActivated, this, &LoopGridEditWin::HitSegmentDoubleClicked);
+  // The columns are narrow: the place goes down a line a part.
+  mGrid->SetPortHeader([](unsigned long port) {
+    return PortHeader(port).replace(QStringLiteral(" \u203A "), QStringLiteral("\n"));
+  });
+  // The levels are asked once a connection; when another client held the instrument then, now.
+  if (!CSequence::IsNumLoopLevelsInitialized()) CSequence::InitNumLoopLevels(list);
+  // Without the instrument's limit, the instrument refuses a count itself when it is written.
+  unsigned long largest = 0;
+  ConditionList ignored;
+  if (SequenceLoopRules::ReadLargestCount(largest, ignored) == 0) mGrid->SetLargestCount(largest);
+  mFollower->Follow(sequence);
+  int status = sequence->ReadSequence(list, 0);
+  mGrid->SetSequence(sequence);
+  if (int rc = FillSegments(list); status == 0) status = rc;
+  ShowState();
+  return status;
+}
+
+int LoopGridEditWin::FillSegments(ConditionList& list) {
+  std::vector<Dstring> names;
+  const int status = QenSegmentPool::Catalog(names, list);
+  QStringList items;
+  for (const Dstring& name : names) items << QString::fromStdString(name);
+  mSegments->clear();
+  mSegments->addItems(items);
+  mGrid->SetSegmentNames(items);
+  return status;
+}
+
+void LoopGridEditWin::ShowState() {
+  const CSequence* sequence = GetSequence();
+  if (sequence == nullptr || mState == nullptr) return;
+  const unsigned long blocks = sequence->GetNumBlocks();
+  QString cursor;
+  if (mGrid->FirstSelected() != mGrid->LastSelected()) {
+    cursor =
+        QStringLiteral("Blocks %1\u2013%2 selected. ").arg(mGrid->FirstSelected()).arg(mGrid->LastSelected());
+  } else if (mGrid->CursorBlock() != 0) {
+    cursor = QStringLiteral("Block %1. ").arg(mGrid->CursorBlock());
+  }
+  mState->setText(QStringLiteral("%1%2 %3, %4 loop levels (the top runs for ever). Marks: M measure, S sync, "
+                                 "T trigger, R reactions.")
+                      .arg(cursor)
+                      .arg(blocks)
+                      .arg(blocks == 1 ? QStringLiteral("block") : QStringLiteral("blocks"))
+                      .arg(CSequence::GetNumLoopLevels()));
+  const bool named =
+      mGrid->PortOf(mGrid->CursorField()) != 0 &&
+      sequence->GetType(mGrid->CursorBlock(), mGrid->PortOf(mGrid->CursorField())) == CSequence::SEG_NAMED;
+  if (auto* open = findChild<QPushButton*>(QStringLiteral("PButOpenSegment"))) open->setEnabled(named);
+}
+
+void LoopGridEditWin::RunAction(int (*action)(ConditionList&)) {
+  ConditionList list;
+  {
+    WaitCursor wait;
+    action(list);
+  }
+  BoundControl::Report(list);
+}
+
+void LoopGridEditWin::HitPButOpenSegment(unsigned long block, unsigned long port) {
+  if (block != 0 && port != 0) SequenceWindows::OpenSegment(this, block, port);
+}
+
+void LoopGridEditWin::HitPButEvents(unsigned long block) {
+  if (block != 0) SequenceWindows::OpenEvents(this, block);
+}
+
+// The segment goes into the cell under the cursor, as a drop there would put it.
+void LoopGridEditWin::HitSegmentDoubleClicked() {
+  QListWidgetItem* item = mSegments->currentItem();
+  const int field = mGrid->CursorField();
+  if (item == nullptr || mGrid->PortOf(field) == 0) return;
+  mGrid->SetCellText(mGrid->CursorBlock(), field, item->text());
+  mGrid->setFocus();
+}

@@ -1,0 +1,412 @@
+#include <gtest/gtest.h>
+
+#include <QApplication>
+#include <QCoreApplication>
+#include <QLabel>
+#include <QLineEdit>
+#include <QListWidget>
+#include <QMdiArea>
+#include <QMdiSubWindow>
+#include <QMimeData>
+#include <QTableWidget>
+#include <QTest>
+#include <memory>
+
+#include "common/gui/GuiSimFixture.h"
+#include "segments/QenSegmentPool.h"
+#include "segments/ui/GridDisp.h"
+#include "sequences/CPortInfo.h"
+#include "sequences/CSequence.h"
+#include "sequences/SequenceBlockInstanceInfo.h"
+#include "sequences/SequenceUndo.h"
+#include "sequences/ui/LoopGridManager.h"
+#include "windows/InstanceWindows.h"
+#include "windows/MainWin.h"
+#include "windows/loopgridedit/LoopGridEditWin.h"
+#include "windows/seqedit/SeqeditEventWin.h"
+#include "windows/seqedit/SeqeditSeqEdWin.h"
+#include "windows/seqedit/SequenceWindows.h"
+
+namespace {
+
+// The loop grid editor in the main window against qensim, whose sequence starts as one block.
+class LoopGridTest : public GuiSimFixture {
+ protected:
+  void SetUp() override {
+    GuiSimFixture::SetUp();
+    // Every test starts from the sequence qensim starts with: one qensim serves the suite.
+    static const Dstring initial = Other(":SGEN:GLOB:SEQ?");
+    mInitial = initial;
+    Other(":SGEN:GLOB:SEQ " + initial);
+    Poll();
+    mMain = std::make_unique<MainWin>();
+    mMain->Attach();
+    mMain->resize(1400, 700);
+    mMain->show();
+    QApplication::setActiveWindow(mMain.get());
+    mWin = qobject_cast<LoopGridEditWin*>(mMain->OpenWindow(QStringLiteral("LoopGridEdit.Win")));
+    ASSERT_NE(mWin, nullptr) << (mAlerts.empty() ? "" : mAlerts.back()) << mList.ToText();
+    mGrid = mWin->Grid();
+    mGrid->setFocus();
+  }
+  void TearDown() override {
+    mMain.reset();
+    GuiSimFixture::TearDown();
+  }
+  // The element of qensim's first block: a new block plays the same.
+  Dstring Block() const { return Dstring(mInitial.substr(8, mInitial.size() - 9)); }
+  Dstring Server() { return Other(":SGEN:GLOB:SEQ?"); }
+  void Key(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier) {
+    QTest::keyClick(mGrid, key, modifiers);
+    QCoreApplication::processEvents();
+  }
+  void Select(unsigned long first, unsigned long last, int field) {
+    mGrid->SetCursor(first, field);
+    mGrid->SetCursor(last, field, true);
+  }
+  void PollAndShow() {
+    Poll();
+    QCoreApplication::processEvents();
+  }
+  // Puts a sequence of four blocks, a loop on level 2 over blocks 2 .. 4 holding one on level 1
+  // over 2 .. 3, on the instrument as another client, and waits for the grid to show it.
+  void LoadNested() {
+    const Dstring b = Block();
+    mNested = "(3.0,\"\",(SEQ," + b + ",\"\",(LOOP2,0,3,\"\",(SEQ,(LOOP1,0,4,\"\",(SEQ," + b + ",\"\"," + b +
+              ")),\"\"," + b + "))))";
+    Other(":SGEN:GLOB:SEQ " + mNested);
+    for (int i = 0; i < 20 && mGrid->DispLineCount() != 4; ++i) PollAndShow();
+    ASSERT_EQ(mGrid->DispLineCount(), 4);
+    mAlerts.clear();
+  }
+
+  Dstring mInitial;
+  Dstring mNested;
+  std::unique_ptr<MainWin> mMain;
+  LoopGridEditWin* mWin = nullptr;
+  LoopGridManager* mGrid = nullptr;
+};
+
+}  // namespace
+
+// Blocks and nested loops made with the grid's keys are what another client reads, exactly.
+TEST_F(LoopGridTest, NestedLoopsBuiltInTheGridAreWhatTheInstrumentHolds) {
+  ASSERT_EQ(mGrid->DispLineCount(), 1);
+  ASSERT_EQ(CSequence::GetNumLoopLevels(), 3u);
+  for (int i = 0; i < 3; ++i) Key(Qt::Key_Insert);
+  ASSERT_EQ(mGrid->DispLineCount(), 4);
+  EXPECT_EQ(mGrid->CursorBlock(), 4u);
+
+  Select(2, 3, mGrid->LabelField());
+  Key(Qt::Key_L, Qt::ControlModifier);  // the lowest level that fits: 1
+  mGrid->SetCursor(2, mGrid->LaneField(1));
+  Key(Qt::Key_F2);
+  ASSERT_TRUE(mGrid->IsEditing());
+  mGrid->Editor()->setText(QStringLiteral("4"));
+  QTest::keyClick(mGrid->Editor(), Qt::Key_Return);
+  QCoreApplication::processEvents();
+  Select(2, 4, mGrid->LabelField());
+  Key(Qt::Key_L, Qt::ControlModifier);  // holds the loop on level 1: level 2
+  EXPECT_EQ(mGrid->SetCellText(3, mGrid->LaneField(2), QStringLiteral("3")), 0);
+  Select(1, 4, mGrid->LabelField());
+  Key(Qt::Key_L, Qt::ControlModifier);  // the top level, endless
+  mGrid->SetCursor(2, mGrid->LabelField());
+  Key(Qt::Key_I);  // typing opens the cell's editor with what was typed
+  mGrid->Editor()->setText(QStringLiteral("inner"));
+  QTest::keyClick(mGrid->Editor(), Qt::Key_Return);
+  QCoreApplication::processEvents();
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+
+  const Dstring b = Block();
+  EXPECT_EQ(Server(), "(3.0,\"\",(LOOP3,0,INF,\"\",(SEQ," + b +
+                          ",\"inner\",(LOOP2,0,3,\"\",(SEQ,(LOOP1,0,4,\"\",(SEQ," + b + ",\"\"," + b +
+                          ")),\"\"," + b + ")))))");
+  EXPECT_EQ(mGrid->CellText(2, mGrid->LaneField(1)), QStringLiteral("4"));
+  EXPECT_EQ(mGrid->CellText(4, mGrid->LaneField(3)), QStringLiteral("INF"));
+  EXPECT_EQ(mGrid->CellText(1, mGrid->LaneField(1)), QString());
+}
+
+struct Refusal {
+  const char* name;
+  std::function<int(LoopGridManager&)> edit;
+  const char* text;  // in the message shown
+};
+
+class LoopGridRefusals : public LoopGridTest, public testing::WithParamInterface<Refusal> {};
+
+// A refused edit is shown, nothing reaches the instrument, and the grid shows what it holds.
+TEST_P(LoopGridRefusals, ShowTheConditionAndWriteNothing) {
+  LoadNested();
+  EXPECT_NE(GetParam().edit(*mGrid), 0);
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find(GetParam().text), std::string::npos) << mAlerts[0];
+  EXPECT_EQ(Server(), mNested);
+  EXPECT_EQ(CPortInfo::GetSequence()->GetLastExpression(), mNested);
+  EXPECT_EQ(mGrid->CellText(2, mGrid->LaneField(1)), QStringLiteral("4"));
+  EXPECT_EQ(mGrid->CellText(1, mGrid->PortField(1)), QStringLiteral("PAUSE"));
+  EXPECT_FALSE(mGrid->Steps()->CanUndo());
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Table, LoopGridRefusals,
+    testing::Values(
+        Refusal{"CrossingLoop",
+                [](LoopGridManager& g) {
+                  g.SetCursor(3, g.LaneField(1));
+                  g.SetCursor(4, g.LaneField(1), true);
+                  return g.AddLoop();
+                },
+                "already in a loop on that level"},
+        Refusal{"CrossingLowerLoop",
+                [](LoopGridManager& g) {
+                  g.SetCursor(3, g.LaneField(3));
+                  g.SetCursor(4, g.LaneField(3), true);
+                  return g.AddLoop();
+                },
+                "would cross the loop on level"},
+        Refusal{"NoLevelLeft",
+                [](LoopGridManager& g) {
+                  g.SetCursor(3, g.LabelField());
+                  g.SetCursor(4, g.LabelField(), true);
+                  return g.AddLoop();
+                },
+                "can loop on no level"},
+        Refusal{"ZeroCount",
+                [](LoopGridManager& g) { return g.SetCellText(2, g.LaneField(1), QStringLiteral("0")); },
+                "\"0\" is no loop count: type how many times the loop runs, 1 to 1048576"},
+        Refusal{
+            "CountAboveTheLimit",
+            [](LoopGridManager& g) { return g.SetCellText(2, g.LaneField(2), QStringLiteral("1048577")); },
+            "1 to 1048576"},
+        Refusal{"TopLevelCount",
+                [](LoopGridManager& g) { return g.SetCellText(1, g.LaneField(3), QStringLiteral("5")); },
+                "the top level, always runs for ever"},
+        Refusal{"MissingSegment",
+                [](LoopGridManager& g) {
+                  return g.SetCellText(1, g.PortField(1), QStringLiteral("Grid/Missing"));
+                },
+                "no segment \"Grid/Missing\""},
+        Refusal{"NoLength",
+                [](LoopGridManager& g) { return g.SetCellText(1, g.LengthField(), QStringLiteral("0")); },
+                "no block length"}),
+    [](const testing::TestParamInfo<Refusal>& info) { return std::string(info.param.name); });
+
+// The grid's edits are taken back on the instrument and done again; another client's change
+// forgets them.
+TEST_F(LoopGridTest, UndoPutsTheInstrumentsSequenceBack) {
+  LoadNested();
+  mGrid->SetCursor(2, mGrid->LaneField(2));
+  Key(Qt::Key_Delete);  // on a lane: the loop goes
+  ASSERT_EQ(mGrid->CellText(2, mGrid->LaneField(2)), QString());
+  const Dstring without = Server();
+  ASSERT_NE(without, mNested);
+  Key(Qt::Key_Z, Qt::ControlModifier);
+  EXPECT_EQ(Server(), mNested);
+  EXPECT_EQ(mGrid->CellText(2, mGrid->LaneField(2)), QStringLiteral("3"));
+  Key(Qt::Key_Y, Qt::ControlModifier);
+  EXPECT_EQ(Server(), without);
+  Key(Qt::Key_Z, Qt::ControlModifier);
+  EXPECT_EQ(Server(), mNested);
+  EXPECT_TRUE(mGrid->Steps()->CanRedo());
+
+  Other(":SGEN:GLOB:SEQ " + mInitial);
+  for (int i = 0; i < 20 && mGrid->DispLineCount() != 1; ++i) PollAndShow();
+  EXPECT_EQ(mGrid->DispLineCount(), 1);
+  EXPECT_FALSE(mGrid->Steps()->CanUndo());
+  EXPECT_FALSE(mGrid->Steps()->CanRedo());
+}
+
+// Another client's sequence shows in the grid within the poll, loops and all.
+TEST_F(LoopGridTest, AnotherClientsChangeIsFollowed) {
+  LoadNested();
+  EXPECT_EQ(mGrid->CellText(3, mGrid->LaneField(2)), QStringLiteral("3"));
+  EXPECT_EQ(mGrid->CellText(4, mGrid->LaneField(1)), QString());
+  EXPECT_EQ(mGrid->CellText(1, mGrid->LengthField()), QStringLiteral("512"));
+}
+
+// Under another client's lock an edit reaches nothing, and the grid and its steps stay as they were.
+TEST_F(LoopGridTest, AnEditUnderALockLeavesEverything) {
+  LoadNested();
+  Control(":TEST:LOCK ON");
+  mGrid->SetCursor(1, mGrid->LengthField());
+  EXPECT_NE(mGrid->SetCellText(1, mGrid->LengthField(), QStringLiteral("1111")), 0);
+  EXPECT_NE(mGrid->SetCellText(2, mGrid->LaneField(1), QStringLiteral("9")), 0);
+  mGrid->SetCursor(3, mGrid->LabelField());
+  Key(Qt::Key_Insert);
+  EXPECT_EQ(mGrid->CellText(1, mGrid->LengthField()), QStringLiteral("512"));
+  EXPECT_EQ(mGrid->CellText(2, mGrid->LaneField(1)), QStringLiteral("4"));
+  EXPECT_EQ(mGrid->DispLineCount(), 4);
+  Control(":TEST:LOCK OFF");
+  EXPECT_EQ(Server(), mNested);
+  EXPECT_FALSE(mGrid->Steps()->CanUndo());
+}
+
+// A segment is put into a cell by typing, from the list, or by dropping its name.
+TEST_F(LoopGridTest, SegmentsAreTypedPickedAndDropped) {
+  MakeSegment("Grid/A", 512, 1);
+  MakeSegment("Grid/B", 512, 1);
+  ConditionList list;
+  ASSERT_EQ(mWin->FillSegments(list), 0);
+  ASSERT_GE(mWin->Segments()->count(), 2);
+  Key(Qt::Key_Insert);
+  mGrid->SetCursor(1, mGrid->PortField(1));
+  Key(Qt::Key_F2);
+  mGrid->Editor()->setText(QStringLiteral("Grid/A"));
+  QTest::keyClick(mGrid->Editor(), Qt::Key_Return);
+  QCoreApplication::processEvents();
+  EXPECT_EQ(mGrid->CellText(1, mGrid->PortField(1)), QStringLiteral("Grid/A"));
+
+  mGrid->SetCursor(2, mGrid->PortField(2));
+  mWin->Segments()->setCurrentItem(
+      mWin->Segments()->findItems(QStringLiteral("Grid/B"), Qt::MatchExactly).front());
+  emit mWin->Segments()->itemActivated(mWin->Segments()->currentItem());
+  EXPECT_EQ(mGrid->CellText(2, mGrid->PortField(2)), QStringLiteral("Grid/B"));
+
+  // A drop onto the third port's cell of block 1.
+  QRect cell;
+  for (GridDisp* disp : mGrid->Disps()) {
+    if (disp->objectName() == QLatin1String("port3"))
+      cell = QRect(disp->x(), mGrid->GetOffY(), disp->width(), mGrid->GetDY());
+  }
+  ASSERT_FALSE(cell.isEmpty());
+  QMimeData mime;
+  mime.setText(QStringLiteral("Grid/B"));
+  QDragEnterEvent enter(cell.center(), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
+  QCoreApplication::sendEvent(mGrid, &enter);
+  ASSERT_TRUE(enter.isAccepted());
+  QDropEvent drop(QPointF(cell.center()), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
+  QCoreApplication::sendEvent(mGrid, &drop);
+  QCoreApplication::processEvents();
+  EXPECT_EQ(mGrid->CellText(1, mGrid->PortField(3)), QStringLiteral("Grid/B"));
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+
+  const Dstring server = Server();
+  EXPECT_NE(server.find("(),\"Grid/A\",0,0,PAUSE,0,0,\"Grid/B\",0,0,PAUSE,"), std::string::npos) << server;
+  EXPECT_NE(server.find("(),PAUSE,0,0,\"Grid/B\",0,0,PAUSE,"), std::string::npos) << server;
+  QenSegmentPool::Delete("Grid/A", mList);
+  QenSegmentPool::Delete("Grid/B", mList);
+}
+
+// A second request for a window of an equal record raises the one open.
+TEST_F(LoopGridTest, ASecondOpenOfTheSameRecordRaisesTheOneWindow) {
+  Key(Qt::Key_Insert);
+  const int before = static_cast<int>(mMain->Area()->subWindowList().size());
+  QWidget* events = SequenceWindows::OpenEvents(mWin, 2);
+  ASSERT_NE(events, nullptr);
+  QWidget* sequence = SequenceWindows::OpenSequence(mWin);
+  ASSERT_NE(sequence, nullptr);
+  mMain->Area()->setActiveSubWindow(mMain->Area()->subWindowList().front());
+  EXPECT_EQ(SequenceWindows::OpenEvents(mWin, 2), events);
+  EXPECT_EQ(mMain->Area()->activeSubWindow()->widget(), events);
+  EXPECT_EQ(SequenceWindows::OpenSequence(mWin), sequence);
+  EXPECT_EQ(mMain->OpenWindow(QStringLiteral("seqedit.SeqEdWin")), sequence);
+  EXPECT_EQ(mMain->Area()->subWindowList().size(), before + 2);
+  QWidget* other = SequenceWindows::OpenEvents(mWin, 1);
+  EXPECT_NE(other, events);
+  EXPECT_EQ(mMain->Area()->subWindowList().size(), before + 3);
+  const auto* record =
+      dynamic_cast<const SequenceBlockInstanceInfo*>(InstanceWindows::GetInstanceInfo(events));
+  ASSERT_NE(record, nullptr);
+  EXPECT_EQ(record->GetBlockNum(), 2u);
+
+  MakeSegment("Grid/Open", 256, 1);
+  ASSERT_EQ(mGrid->SetCellText(1, mGrid->PortField(1), QStringLiteral("Grid/Open")), 0);
+  QWidget* segment = SequenceWindows::OpenSegment(mWin, 1, 1);
+  ASSERT_NE(segment, nullptr);
+  EXPECT_EQ(SequenceWindows::OpenSegment(mWin, 1, 1), segment);
+  EXPECT_EQ(SequenceWindows::OpenSegment(mWin, 1, 2), nullptr) << "a kind word is no segment to open";
+  EXPECT_EQ(mMain->Area()->subWindowList().size(), before + 4);
+  mMain->Area()->closeAllSubWindows();
+  QenSegmentPool::Delete("Grid/Open", mList);
+}
+
+// A block's reactions edited in its event window reach the instrument.
+TEST_F(LoopGridTest, EventWindowEditsReachTheInstrument) {
+  Key(Qt::Key_Insert);
+  auto* events = qobject_cast<SeqeditEventWin*>(SequenceWindows::OpenEvents(mWin, 2));
+  ASSERT_NE(events, nullptr);
+  ASSERT_EQ(events->NewReaction(), 0);
+  ASSERT_EQ(events->Table()->rowCount(), 1);
+  events->Table()->item(0, 0)->setText(QStringLiteral("ERR"));
+  events->Table()->item(0, 1)->setText(QStringLiteral("start"));
+  events->Table()->item(0, 2)->setText(QStringLiteral("5"));
+  QCoreApplication::processEvents();
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+  EXPECT_NE(Server().find(",((\"ERR\",\"start\",5,\"\")),"), std::string::npos) << Server();
+  events->Table()->item(0, 2)->setText(QStringLiteral("five"));
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_EQ(events->Table()->item(0, 2)->text(), QStringLiteral("5"));
+  EXPECT_EQ(LoopGridManager::MarksOf(*CPortInfo::GetSequence(), 2), QStringLiteral("R1"));
+  ASSERT_EQ(events->SetSync(true), 0);
+  EXPECT_NE(Server().find(",SYNC,"), std::string::npos);
+  EXPECT_EQ(events->Table()->rowCount(), 0);
+}
+
+// Blocks are inserted, moved, copied, pasted and deleted on the grid's keys, loops keeping their
+// blocks; the sequence editor sums up what the instrument then holds.
+TEST_F(LoopGridTest, BlocksMoveWithTheirKeysAndTheSequenceEditorFollows) {
+  LoadNested();
+  mGrid->SetCursor(1, mGrid->LengthField());
+  Key(Qt::Key_Insert, Qt::ControlModifier | Qt::ShiftModifier);  // before block 1
+  ASSERT_EQ(mGrid->DispLineCount(), 5);
+  EXPECT_EQ(mGrid->CursorBlock(), 1u);
+  ASSERT_EQ(mGrid->SetCellText(1, mGrid->LengthField(), QStringLiteral("777")), 0);
+  Key(Qt::Key_Down, Qt::ControlModifier);
+  EXPECT_EQ(mGrid->CursorBlock(), 2u);
+  EXPECT_EQ(mGrid->CellText(2, mGrid->LengthField()), QStringLiteral("777"));
+  Key(Qt::Key_C, Qt::ControlModifier);
+  mGrid->SetCursor(6 - 1, mGrid->LabelField());
+  Key(Qt::Key_V, Qt::ControlModifier);  // after the last block, outside the loops
+  ASSERT_EQ(mGrid->DispLineCount(), 6);
+  EXPECT_EQ(mGrid->CellText(6, mGrid->LengthField()), QStringLiteral("777"));
+  EXPECT_EQ(mGrid->CellText(6, mGrid->LaneField(2)), QString());
+  EXPECT_EQ(mGrid->CellText(3, mGrid->LaneField(1)), QStringLiteral("4"));
+  mGrid->SetCursor(2, mGrid->LabelField());
+  Key(Qt::Key_Delete);
+  EXPECT_EQ(mGrid->DispLineCount(), 5);
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+  const Dstring b = Block();
+  Dstring copied = b;
+  copied.replace(copied.find(",512,"), 5, ",777,");
+  EXPECT_EQ(Server(), "(3.0,\"\",(SEQ," + b + ",\"\",(LOOP2,0,3,\"\",(SEQ,(LOOP1,0,4,\"\",(SEQ," + b +
+                          ",\"\"," + b + ")),\"\"," + b + ")),\"\"," + copied + "))");
+
+  auto* sequence = qobject_cast<SeqeditSeqEdWin*>(SequenceWindows::OpenSequence(mWin));
+  ASSERT_NE(sequence, nullptr);
+  ASSERT_EQ(sequence->Table()->rowCount(), 5);
+  EXPECT_EQ(SeqeditSeqEdWin::LoopsOf(3), QStringLiteral("L2 \u00D73 2\u20134   L1 \u00D74 2\u20133"));
+  EXPECT_EQ(sequence->Table()->item(4, 1)->text(), QStringLiteral("777"));
+  EXPECT_TRUE(sequence->Summary()->text().startsWith(QStringLiteral("5 blocks, 2 loops on 3 loop levels")));
+  Other(":SGEN:GLOB:SEQ " + mInitial);
+  for (int i = 0; i < 20 && sequence->Table()->rowCount() != 1; ++i) PollAndShow();
+  EXPECT_EQ(sequence->Table()->rowCount(), 1);
+}
+
+// The grid base's editing commands, as a pattern-editor window asks the grid with the focus.
+TEST_F(LoopGridTest, TheGridBaseCommandsWorkOnWholeBlocks) {
+  CSequence::ClearClipboard();
+  EXPECT_TRUE(mGrid->IsCopyPossible());
+  EXPECT_FALSE(mGrid->IsPastePossible());
+  EXPECT_FALSE(mGrid->IsFillPossible());
+  ConditionList list;
+  ASSERT_EQ(mGrid->SetCellText(1, mGrid->LengthField(), QStringLiteral("640")), 0);
+  ASSERT_EQ(mGrid->ModifyInsert(VectorTrace::kVector, InsertMode::kAfter, 2, list), 0) << list.ToText();
+  EXPECT_EQ(mGrid->DispLineCount(), 3);
+  ASSERT_EQ(mGrid->ModifyCopy(list), 0);
+  EXPECT_TRUE(mGrid->IsPastePossible());
+  mGrid->SetCursor(3, mGrid->LabelField());
+  ASSERT_EQ(mGrid->ModifyPaste(list), 0) << list.ToText();
+  const Dstring b = Block();
+  Dstring copied = b;
+  copied.replace(copied.find(",512,"), 5, ",640,");
+  EXPECT_EQ(Server(), "(3.0,\"\",(SEQ," + copied + ",\"\"," + b + ",\"\"," + b + ",\"\"," + copied + "))");
+  mGrid->SetCursor(1, mGrid->LabelField());
+  ASSERT_EQ(mGrid->ModifyDelete(list), 0);
+  EXPECT_EQ(mGrid->DispLineCount(), 3);
+  EXPECT_EQ(mGrid->CellText(3, mGrid->LengthField()), QStringLiteral("640"));
+  ASSERT_EQ(mGrid->Undo(), 0);
+  EXPECT_EQ(mGrid->DispLineCount(), 4);
+  EXPECT_TRUE(list.IsEmpty()) << list.ToText();
+}
