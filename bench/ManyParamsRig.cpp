@@ -2,11 +2,15 @@
 
 #include <filesystem>
 #include <fstream>
+#include <string>
+
+#include <unistd.h>
 
 #include "core/uiapp.h"
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenTcpInstrument.h"
+#include "support/QenEnvironment.h"
 
 ManyParamsRig& ManyParamsRig::Get() {
   static ManyParamsRig rig;
@@ -14,7 +18,10 @@ ManyParamsRig& ManyParamsRig::Get() {
 }
 
 ManyParamsRig::ManyParamsRig() {
-  const auto config = std::filesystem::temp_directory_path() / "qen-bench-many.qsc";
+  mDir = std::filesystem::temp_directory_path() / ("qen-bench-" + std::to_string(getpid()));
+  std::filesystem::create_directories(mDir);
+  QenEnvironment::SetLogDirectory(Dstring(mDir.string()));
+  const auto config = mDir / "many.qsc";
   std::ofstream out(config);
   out << "unit V -3 0 0 0.1\n";
   for (int i = 0; i < kManyParams; ++i) {
@@ -32,7 +39,8 @@ ManyParamsRig::ManyParamsRig() {
     for (int m = 1; m <= 2; ++m) out << "module " << m << " K2270A\nport 1 PDAT\nport 2 PDAT\n";
   }
   out.close();
-  mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--test-control", "--config", config.string()});
+  mSim.Start(QenSimProcess::FindBesideExecutable(),
+             {"--quiet", "--test-control", "--config", config.string(), "--data-dir", (mDir / "data").string()});
   ConditionList list;
   uiapp::Init(list);
   auto tcp = std::make_unique<QenTcpInstrument>();
@@ -43,6 +51,12 @@ ManyParamsRig::ManyParamsRig() {
   Dstring handle = "_BENCH";
   AppHandle::Create(QenGuiInst::GetInstrument(), handle, "BENCH", list);
   QenGuiInst::SetAppHandle(handle);
+}
+
+ManyParamsRig::~ManyParamsRig() {
+  mSim.Stop();
+  std::error_code error;
+  std::filesystem::remove_all(mDir, error);
 }
 
 bool ManyParamsRig::Ok() const { return mSim.Port() != 0 && !QenGuiInst::GetAppHandle().empty(); }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <chrono>
+#include <filesystem>
 #include <memory>
 
 #include "instrument/QenInstrument.h"
@@ -28,9 +29,10 @@ class CountingInstrument : public QenInstrument {
 };
 
 // qensim with a configuration of kManyParams numeric parameters in volts, in groups of
-// kGroupSize as the parameters of a port are (":BENCH:G<g>:P<i>"), and a rack of
-// kAnalyserPorts analyser ports,
-// and the application started against it through a counting connection. One per program.
+// kGroupSize as the parameters of a port are (":BENCH:G<g>:P<i>"), a rack of kAnalyserPorts
+// analyser ports and a data directory of its own for segments, and the application started
+// against it through a counting connection. One per program: every benchmark that needs the
+// instrument uses this one, so none replaces another's connection.
 class ManyParamsRig {
  public:
   static constexpr int kManyParams = 1000;
@@ -41,10 +43,13 @@ class ManyParamsRig {
   bool Ok() const;
   long Calls() const { return mCounter->mCalls; }
   CountingInstrument& Counter() { return *mCounter; }
+  unsigned short Port() const { return mSim.Port(); }
 
  private:
   ManyParamsRig();
+  ~ManyParamsRig();
 
+  std::filesystem::path mDir;
   QenSimProcess mSim;
   CountingInstrument* mCounter = nullptr;
 };

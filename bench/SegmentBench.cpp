@@ -4,10 +4,7 @@
 // plain text cells.
 #include <benchmark/benchmark.h>
 
-#include <unistd.h>
-
 #include <chrono>
-#include <filesystem>
 #include <memory>
 #include <string>
 
@@ -18,8 +15,6 @@
 
 #include "BenchApp.h"
 #include "ManyParamsRig.h"
-#include "instrument/QenGuiInst.h"
-#include "instrument/QenSimProcess.h"
 #include "instrument/QenTcpInstrument.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
@@ -27,7 +22,6 @@
 #include "segments/ui/AddrDisp.h"
 #include "segments/ui/DigitDisp.h"
 #include "segments/ui/SegmentGridManager.h"
-#include "support/QenEnvironment.h"
 
 namespace {
 
@@ -42,8 +36,8 @@ double Seconds(Clock::time_point from) {
   return std::chrono::duration<double>(Clock::now() - from).count();
 }
 
-// One qensim with its own data directory, the call path connected to it, and a second plain
-// client for the raw baseline. Built on first use, shared by the benchmarks.
+// The program's one qensim and call path (ManyParamsRig, whose start-up also starts the segment
+// pool), with a second plain client for the raw baseline. Built on first use, shared.
 class Server {
  public:
   static Server& Get() {
@@ -53,7 +47,7 @@ class Server {
 
   bool IsUp() const { return mUp; }
   QenTcpInstrument& Raw() { return mRaw; }
-  CountingInstrument& Counter() { return *mCounter; }
+  CountingInstrument& Counter() { return mRig.Counter(); }
 
   // The 16M x 64 segment, made once.
   bool MakeBig() {
@@ -89,34 +83,12 @@ class Server {
   }
 
  private:
-  Server() {
-    const std::string dir =
-        std::filesystem::temp_directory_path() / ("qen-segment-bench-" + std::to_string(getpid()));
-    mDir = dir;
-    QenEnvironment::SetLogDirectory(Dstring(dir));
-    std::filesystem::create_directories(dir);
-    mSim.Start(QenSimProcess::FindBesideExecutable(), {"--quiet", "--test-control", "--data-dir", dir});
-    auto client = std::make_unique<CountingInstrument>(std::make_unique<QenTcpInstrument>());
-    mCounter = client.get();
-    Dstring handle;
-    mUp = mSim.Port() != 0 && client->Connect("127.0.0.1", mSim.Port()) == 0 &&
-          client->Call(":QEN:INST:HAND:CRE? _B,\"PSX\",\"BENCH\"", handle) == 0 &&
-          mRaw.Connect("127.0.0.1", mSim.Port()) == 0;
-    QenGuiInst::Init();
-    QenGuiInst::SetInstrument(std::move(client));
-    QenGuiInst::SetAppHandle(handle);
-    QenSegmentPool::Init();
-  }
-  ~Server() {
-    mSim.Stop();
-    std::error_code error;
-    std::filesystem::remove_all(mDir, error);
+  Server() : mRig(ManyParamsRig::Get()) {
+    mUp = mRig.Ok() && mRaw.Connect("127.0.0.1", mRig.Port()) == 0;
   }
 
-  QenSimProcess mSim;
+  ManyParamsRig& mRig;
   QenTcpInstrument mRaw;
-  CountingInstrument* mCounter = nullptr;
-  std::filesystem::path mDir;
   bool mUp = false;
   bool mBigMade = false;
 };

@@ -1,5 +1,7 @@
 #include "instrument/CommandText.h"
 
+#include <array>
+
 #include "instrument/QenStatus.h"
 #include "support/ConditionListLoader.h"
 
@@ -29,8 +31,18 @@ int CommandText::CheckArgument(std::string_view text, ConditionList& list) {
 }
 
 int CommandText::CheckValue(std::string_view text, ConditionList& list) {
+  // Most of a long value (a sequence of thousands of blocks) is plain text: it is passed over
+  // by a table before the quote rules look at a character.
+  static const auto kPlain = [] {
+    std::array<bool, 256> plain{};
+    for (int c = 0; c < 256; ++c) {
+      plain[static_cast<std::size_t>(c)] = Offence(static_cast<char>(c)) == nullptr && c != '\'';
+    }
+    return plain;
+  }();
   char quote = 0;
   for (char c : text) {
+    if (kPlain[static_cast<unsigned char>(c)]) continue;
     if (quote == 0 && (c == '"' || c == '\'')) {
       quote = c;
     } else if (c == quote) {

@@ -718,7 +718,7 @@ int CSequence::Read(ConditionList& cond, unsigned force, const Dstring* written)
   const bool eventsChanged = !(mEvents == eventsBefore);
   Dstring reply;
   if (int status = QenGuiInst::Call(Command(":%s:SGEN:GLOB:SEQ?"), reply, cond)) return status;
-  reply = reply.Trimmed();
+  reply.Trim();
   const bool same = reply == mLastExpression;
   if (same && !force) return eventsChanged ? ReportEvents(cond) : 0;
   if (written != nullptr && !same && reply == *written) {

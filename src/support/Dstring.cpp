@@ -194,10 +194,20 @@ Dstring Dstring::ToUpper() const {
 }
 
 Dstring Dstring::Trimmed() const {
+  Dstring copy(*this);
+  copy.Trim();
+  return copy;
+}
+
+void Dstring::Trim() {
   const char* blanks = " \t\r\n";
-  auto first = find_first_not_of(blanks);
-  if (first == npos) return {};
-  return Dstring(substr(first, find_last_not_of(blanks) - first + 1));
+  const auto first = find_first_not_of(blanks);
+  if (first == npos) {
+    clear();
+    return;
+  }
+  erase(find_last_not_of(blanks) + 1);
+  erase(0, first);
 }
 
 namespace {

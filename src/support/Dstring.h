@@ -25,6 +25,8 @@ class Dstring : public std::string {
 
   Dstring ToUpper() const;
   Dstring Trimmed() const;
+  // The same in place, without a copy (a reply may be megabytes long).
+  void Trim();
   bool StartsWith(std::string_view prefix) const { return std::string_view(*this).starts_with(prefix); }
   bool EndsWith(std::string_view suffix) const { return std::string_view(*this).ends_with(suffix); }
 
