@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QString>
+#include <utility>
 
 #include "sequences/CPortInfo.h"
 #include "windows/PlaceName.h"
@@ -23,4 +24,12 @@ inline QString PortHeader(unsigned long port, QString* toolTip = nullptr) {
     return place + QLatin1Char('\n') + kind;
   }
   return {};
+}
+
+// The same heading in short words, for narrow columns: "G1\nM2\nP1\ngen".
+inline QString ShortPortHeader(QString header) {
+  static const std::pair<const char*, const char*> kShort[] = {
+      {"Group ", "G"}, {"Module ", "M"}, {"Port ", "P"}, {"generator", "gen"}, {"analyser", "ana"}};
+  for (const auto& [word, brief] : kShort) header.replace(QLatin1String(word), QLatin1String(brief));
+  return header;
 }

@@ -199,7 +199,9 @@ QString LoopGridManager::DispHeader(const GridDisp& disp, int) const {
   if (name == kLabels) return QStringLiteral("Label");
   if (name == kLengths) return QStringLiteral("Length");
   if (name == kMarks) return QStringLiteral("Marks");
-  if (name.startsWith(kPortPrefix) && mPortHeader) return mPortHeader(name.mid(kPortPrefix.size()).toULong());
+  // The header is drawn with a margin of six points each side.
+  if (name.startsWith(kPortPrefix) && mPortHeader)
+    return mPortHeader(name.mid(kPortPrefix.size()).toULong(), disp.width() - 12);
   return name.startsWith(kPortPrefix) ? QStringLiteral("Port %1").arg(name.mid(kPortPrefix.size()))
                                       : QString();
 }

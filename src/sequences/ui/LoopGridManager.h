@@ -41,7 +41,8 @@ class LoopGridManager : public GridManager {
   void SetSequence(CSequence* sequence);
   CSequence* GetSequence() const { return mSequence; }
   // How a port's column is headed (the windows know the rack's place names).
-  void SetPortHeader(std::function<QString(unsigned long port)> header) { mPortHeader = std::move(header); }
+  // The heading of a port's column, given the width its text has.
+  void SetPortHeader(std::function<QString(unsigned long port, int width)> header) { mPortHeader = std::move(header); }
   // The largest count a loop may have on the instrument; 0 when not known.
   void SetLargestCount(unsigned long largest) { mLargestCount = largest; }
   // The names the cell editor of a port offers, besides the built-in kinds.
@@ -156,7 +157,7 @@ class LoopGridManager : public GridManager {
   CSequence* mSequence = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
   std::unique_ptr<SequenceUndo> mUndo;
-  std::function<QString(unsigned long)> mPortHeader;
+  std::function<QString(unsigned long, int)> mPortHeader;
   QStringList mSegmentNames;
   unsigned long mLargestCount = 0;
   QLineEdit* mEditor = nullptr;

@@ -1,5 +1,6 @@
 #include "windows/loopgridedit/LoopGridEditWin.h"
 
+#include <QFontMetrics>
 #include <QLabel>
 #include <QLayout>
 #include <QListWidget>
@@ -80,9 +81,15 @@ int LoopGridEditWin::Load(ConditionList& list) {
   connect(mGrid, &LoopGridManager::OpenEventsRequested, this, &LoopGridEditWin::HitPButEvents);
   connect(mGrid, &GridManager::StateChanged, this, &LoopGridEditWin::ShowState);
   connect(mSegments, &QListWidget::itemActivated, this, &LoopGridEditWin::HitSegmentDoubleClicked);
-  // The columns are narrow: the place goes down a line a part.
-  mGrid->SetPortHeader([](unsigned long port) {
-    return PortHeader(port).replace(QStringLiteral(" \u203A "), QStringLiteral("\n"));
+  // The columns are narrow: the place goes down a line a part, in short words ("G1", "M2",
+  // "P1", "gen") when even a part is wider than the column; the tool tip has it whole.
+  mGrid->SetPortHeader([this](unsigned long port, int width) {
+    QString header = PortHeader(port).replace(QStringLiteral(" \u203A "), QStringLiteral("\n"));
+    const QFontMetrics metrics(mGrid->font());
+    for (const QString& line : header.split(QLatin1Char('\n'))) {
+      if (metrics.horizontalAdvance(line) > width) return ShortPortHeader(header);
+    }
+    return header;
   });
   // The levels are asked once a connection; when another client held the instrument then, now.
   if (!CSequence::IsNumLoopLevelsInitialized()) CSequence::InitNumLoopLevels(list);
