@@ -22,7 +22,8 @@ std::string MakeStream(FuzzedDataProvider& in) {
     FrameHeader header;
     switch (in.ConsumeIntegralInRange(0, 2)) {
       case 0:
-        header.type = in.ConsumeBool() ? FrameHeader::kRequest : FrameHeader::kReply;
+        header.type = in.ConsumeIntegralInRange<std::uint8_t>(FrameHeader::kRequest, FrameHeader::kCancel);
+        header.flags = in.ConsumeBool() ? FrameHeader::kFlagProgress : 0;
         header.id = in.ConsumeIntegral<std::uint32_t>();
         header.status = in.ConsumeIntegral<std::int32_t>();
         stream += EncodeFrame(header, in.ConsumeBytesAsString(in.ConsumeIntegralInRange(0, 300)));
@@ -60,7 +61,8 @@ void CheckFrame(const std::string& stream, std::size_t& offset, const FrameHeade
   FrameHeader expected;
   Check(DecodeFrameHeader(reinterpret_cast<const unsigned char*>(stream.data()) + offset, expected) ==
         FrameError::None);
-  Check(header.type == expected.type && header.flags == 0 && header.id == expected.id &&
+  Check(header.type == expected.type && header.flags == expected.flags &&
+        (header.flags & ~FrameHeader::kFlagProgress) == 0 && header.id == expected.id &&
         header.status == expected.status && header.length == expected.length);
   Check(header.length <= FrameHeader::kMaxPayload && payload.size() == header.length);
   Check(payload == stream.substr(offset + FrameHeader::kSize, header.length));
@@ -82,6 +84,11 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     fed += piece;
     FrameHeader header;
     std::string payload;
+    // A complete frame is seen where it waits before it is taken.
+    bool whole = false;
+    if (broken == FrameError::None && Expected(stream, offset, fed, header, whole) == FrameError::None && whole) {
+      Check(decoder.Holds(header.type, header.id));
+    }
     while (decoder.Next(header, payload)) {
       Check(broken == FrameError::None);
       CheckFrame(stream, offset, header, payload);
