@@ -210,10 +210,13 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
     painter.setPen(pal.windowText().color());
     const Qt::Alignment align = digits ? Qt::AlignCenter : disp.Alignment();
     for (int c = 0; c < cells; ++c) {
-      // A name that does not fit ends in an ellipsis rather than being cut off; a header line
-      // by line.
+      // A name that does not fit ends in an ellipsis rather than being cut off, a header line
+      // by line. A digit's heading (a trace number every few digits) is centred over its
+      // digit and may reach over the neighbours, whose headings are empty.
       QStringList lines = DispHeader(disp, c).split(QLatin1Char('\n'));
-      for (QString& line : lines) line = painter.fontMetrics().elidedText(line, Qt::ElideRight, dx - 2 * pad);
+      if (!digits) {
+        for (QString& line : lines) line = painter.fontMetrics().elidedText(line, Qt::ElideRight, dx - 2 * pad);
+      }
       painter.drawText(QRect(c * dx + pad, 0, dx - 2 * pad, top), align, lines.join(QLatin1Char('\n')));
     }
   }
