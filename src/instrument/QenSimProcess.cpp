@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <poll.h>
+#include <sys/prctl.h>
 #include <sys/wait.h>
 #include <thread>
 #include <unistd.h>
@@ -45,8 +46,12 @@ bool QenSimProcess::Start(const std::string& program, const std::vector<std::str
   std::vector<char*> cargv;
   for (auto& a : argv) cargv.push_back(a.data());
   cargv.push_back(nullptr);
+  const pid_t parent = getpid();
   mPid = fork();
   if (mPid == 0) {
+    // A private simulator ends with the program that started it, however that program ends.
+    prctl(PR_SET_PDEATHSIG, SIGTERM);
+    if (getppid() != parent) _exit(0);
     dup2(out[1], STDOUT_FILENO);
     close(out[0]);
     close(out[1]);
