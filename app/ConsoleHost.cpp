@@ -4,6 +4,7 @@
 #include <ostream>
 #include <string>
 
+#include "InterruptWaiter.h"
 #include "instrument/CommandText.h"
 #include "instrument/QenGuiInst.h"
 #include "support/ConditionList.h"
@@ -12,10 +13,10 @@ int ConsoleHost::Run() {
   mOut << "Connected; application handle " << QenGuiInst::GetAppHandle() << ". Type help for help.\n";
   std::string line;
   while (mOut << "qen> " << std::flush, std::getline(mIn, line)) {
-    if (!HandleLine(Dstring(line).Trimmed())) break;
+    if (!HandleLine(Dstring(line).Trimmed()) || InterruptWaiter::IsInterrupted()) break;
   }
   mOut << "\n";
-  return 0;
+  return InterruptWaiter::IsInterrupted() ? kInterruptedExitCode : 0;
 }
 
 bool ConsoleHost::HandleLine(const Dstring& line) {

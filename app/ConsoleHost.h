@@ -10,7 +10,10 @@ class ConsoleHost {
  public:
   ConsoleHost(std::istream& in, std::ostream& out) : mIn(in), mOut(out) {}
 
-  // Runs until end of input or "quit"; returns the process exit code.
+  // The shell's code for a program ended by Ctrl+C.
+  static constexpr int kInterruptedExitCode = 130;
+
+  // Runs until end of input, "quit" or Ctrl+C; returns the process exit code.
   int Run();
   // Handles one line ("::TRIG:MODE?" stands for ":<handle>:TRIG:MODE?"); false when the
   // console should end.

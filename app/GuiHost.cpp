@@ -2,6 +2,7 @@
 
 #include <QApplication>
 #include <QMessageBox>
+#include <QLineEdit>
 #include <QMdiArea>
 #include <QPixmap>
 #include <iostream>
@@ -24,12 +25,13 @@
 
 namespace {
 
-// The server to use: as given, the simulator, or the one the user picks. False when cancelled
-// or the simulator would not start.
-bool ChooseServer(HostOptions& options, QenSimProcess& sim) {
+// The server to use: as given, the simulator, or the one the user picks (with `typed` in the
+// address field). False when cancelled or the simulator would not start.
+bool ChooseServer(HostOptions& options, QenSimProcess& sim, const QString& typed) {
   if (options.askServer) {
     ConnectDialog dialog;
     dialog.Search();
+    if (!typed.isEmpty()) dialog.AddressField()->setText(typed);
     if (dialog.exec() != QDialog::Accepted) return false;
     options.simulate = dialog.UseSimulator();
     if (!options.simulate) {
@@ -75,6 +77,38 @@ int Screenshot(MainWin& window, const HostOptions& options) {
   return 0;
 }
 
+// Connected and with the handle: the first setting, the main window and its loop. Sets
+// `reconnect` when the user gave the connection up and wants another.
+int RunSession(const HostOptions& options, bool& reconnect) {
+  uiapp::RegistrationFinished();
+  // The status bar shows the error counts while running: the service is set up at once. A
+  // server without analyser ports just has none to show.
+  ConditionList ber;
+  uiapp::GetBerSvr()->Init(ber);
+  auto window = std::make_unique<MainWin>();
+  window->Attach();
+  if (!options.screenshot.empty()) return Screenshot(*window, options);
+  uiapp::StartPolling();
+  window->show();
+  // Where most work starts; the frame is never empty on a first run.
+  if (QWidget* editor = window->OpenWindow(QStringLiteral("paramedit.ParamEd"))) editor->parentWidget()->showMaximized();
+  uiapp::MainLoop();
+  uiapp::EndPolling();
+  reconnect = window->EndedToReconnect();
+  return 0;
+}
+
+// Ends the services of a connection that was given up and starts them anew for the next.
+void Restart(ConditionList& list) {
+  ErrorJournal::Uninstall();
+  uiapp::End(list);
+  list.Clear();
+  uiapp::Init(list);
+  ErrorJournal::Install();
+  if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
+  list.Clear();
+}
+
 }  // namespace
 
 int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim) {
@@ -100,37 +134,31 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
   uiapp::RegisterWindows();
   uiapp::Init(list);
   ErrorJournal::Install();
-  int code = 1;
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
   list.Clear();
-  if (ChooseServer(options, sim)) {
-    if (HostConnection::Open(options.host, options.port, options.resource, list) == 0) {
-      uiapp::RegistrationFinished();
-      // The status bar shows the error counts while running: the service is set up at once. A
-      // server without analyser ports just has none to show.
-      ConditionList ber;
-      uiapp::GetBerSvr()->Init(ber);
-      auto window = std::make_unique<MainWin>();
-      window->Attach();
-      if (!options.screenshot.empty()) {
-        code = Screenshot(*window, options);
-      } else {
-        uiapp::StartPolling();
-        window->show();
-        // Where most work starts; the frame is never empty on a first run.
-        if (QWidget* editor = window->OpenWindow(QStringLiteral("paramedit.ParamEd"))) editor->parentWidget()->showMaximized();
-        uiapp::MainLoop();
-        uiapp::EndPolling();
-        code = 0;
-      }
-      window.reset();
-    } else {
-      QenGuiInst::ShowErrorDlg(list, 1);
+  int code = 1;
+  QString typed;
+  for (;;) {
+    if (!ChooseServer(options, sim, typed)) {
+      code = options.askServer ? 0 : 1;
+      break;
     }
-  } else if (!options.askServer) {
-    code = 1;
-  } else {
-    code = 0;
+    if (HostConnection::Open(options.host, options.port, options.resource, list) != 0) {
+      QenGuiInst::ShowErrorDlg(list, 1);
+      list.Clear();
+      if (!options.screenshot.empty()) break;
+      // The user corrects the address instead of starting the program again.
+      typed = options.simulate ? QString() : QStringLiteral("%1:%2").arg(QString::fromStdString(options.host)).arg(options.port);
+      options.askServer = true;
+      continue;
+    }
+    bool reconnect = false;
+    code = RunSession(options, reconnect);
+    if (!reconnect) break;
+    // The user gave up a connection that did not answer and asks for another.
+    Restart(list);
+    typed.clear();
+    options.askServer = true;
   }
   ErrorJournal::Uninstall();
   list.Clear();

@@ -76,6 +76,10 @@ int HostOptions::Parse(const std::vector<std::string>& args, HostOptions& out, C
       double seconds = 0;
       if (!Dstring(args[++i]).ToDouble(seconds) || seconds <= 0) return Bad(list, a + " " + args[i]);
       out.seconds = seconds;
+    } else if (a == "--reply-timeout" && hasValue) {
+      double seconds = 0;
+      if (!Dstring(args[++i]).ToDouble(seconds) || seconds <= 0 || seconds > 86400) return Bad(list, a + " " + args[i]);
+      out.replyTimeout = seconds;
     } else if (a == "--resource" && hasValue) {
       out.resource = args[++i];
     } else if (a == "--log-dir" && hasValue) {
@@ -122,6 +126,7 @@ const char* HostOptions::Usage() {
          "                       dtecmd.CmdWin, error.ErrorWin); may be given several times\n"
          "  --size WxH           with --screenshot: the main window's size (1280x800)\n"
          "  --resource NAME      instrument resource name the application handle is made from (QEN1)\n"
+         "  --reply-timeout S    how long a reply is awaited, in seconds (else QEN_REPLY_TIMEOUT, or 30)\n"
          "  --log-dir DIR        directory of qengui.log (else QEN_LOG_DIR)\n"
          "  --param-set N        configuration parameter set (else QEN_CONFIG_PARAM_SET)\n";
 }

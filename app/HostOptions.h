@@ -21,6 +21,8 @@ struct HostOptions {
   std::optional<unsigned long> paramSet;
   std::vector<std::string> watch;
   double seconds = 0.0;
+  // --reply-timeout: how long a reply is awaited, in seconds (else QEN_REPLY_TIMEOUT, or 30).
+  std::optional<double> replyTimeout;
   // --screenshot: the PNG to write, the windows to open first and the window size.
   std::string screenshot;
   std::vector<std::string> open;

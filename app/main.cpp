@@ -9,6 +9,7 @@
 #include "HeadlessHost.h"
 #include "HostConnection.h"
 #include "HostOptions.h"
+#include "InterruptWaiter.h"
 #include "core/uiapp.h"
 #include "instrument/AppHandle.h"
 #include "instrument/QenGuiInst.h"
@@ -27,15 +28,29 @@ void PrintConditions(const ConditionList& list) {
 }
 
 void OnStopSignal(int) {
+  InterruptWaiter::Interrupt();
   HeadlessHost::RequestStop();
   if (gToolkit) gToolkit->Interrupt();
 }
 
+// Without SA_RESTART, so that a read of the console's input ends at Ctrl+C too.
+void CatchStopSignals() {
+  struct sigaction action {};
+  action.sa_handler = OnStopSignal;
+  sigemptyset(&action.sa_mask);
+  sigaction(SIGINT, &action, nullptr);
+  sigaction(SIGTERM, &action, nullptr);
+}
+
 int RunConsole(const HostOptions& options) {
   ConditionList list;
+  CatchStopSignals();
+  InterruptWaiter waiter;
   QenGuiInst::Init();
+  QenGuiInst::SetCallWaiter(&waiter);
   if (HostConnection::Open(options.host, options.port, options.resource, list) != QenStatus::kOk) {
     PrintConditions(list);
+    QenGuiInst::SetCallWaiter(nullptr);
     QenGuiInst::End();
     return 1;
   }
@@ -43,6 +58,7 @@ int RunConsole(const HostOptions& options) {
   int code = console.Run();
   AppHandle::Destroy(QenGuiInst::GetInstrument(), QenGuiInst::GetAppHandle(), list);
   QenGuiInst::DisconnectFromServer(list);
+  QenGuiInst::SetCallWaiter(nullptr);
   QenGuiInst::End();
   return code;
 }
@@ -52,14 +68,15 @@ int RunHeadless(const HostOptions& options) {
   HeadlessToolkit toolkit;
   gToolkit = &toolkit;
   Toolkit::Install(&toolkit);
-  std::signal(SIGINT, OnStopSignal);
-  std::signal(SIGTERM, OnStopSignal);
+  CatchStopSignals();
+  InterruptWaiter waiter;
   ConditionList list;
   uiapp::RegisterConstants();
   uiapp::RegisterEvents();
   uiapp::RegisterVerbs();
   uiapp::RegisterWindows();
   uiapp::Init(list);
+  QenGuiInst::SetCallWaiter(&waiter);
   int code = 1;
   if (HostConnection::Open(options.host, options.port, options.resource, list) == QenStatus::kOk) {
     uiapp::RegistrationFinished();
@@ -68,6 +85,7 @@ int RunHeadless(const HostOptions& options) {
   } else {
     PrintConditions(list);
   }
+  QenGuiInst::SetCallWaiter(nullptr);
   uiapp::End(list);
   uiapp::UnregisterWindows();
   Toolkit::Install(nullptr);
@@ -91,6 +109,7 @@ int main(int argc, char** argv) {
   }
   if (options.logDir) QenEnvironment::SetLogDirectory(Dstring(*options.logDir));
   if (options.paramSet) QenEnvironment::SetConfigParamSet(*options.paramSet);
+  if (options.replyTimeout) QenInstrument::SetDefaultReplyTimeoutMs(static_cast<int>(*options.replyTimeout * 1000.0));
 
   QenSimProcess sim;
   if (options.simulate) {

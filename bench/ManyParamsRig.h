@@ -15,6 +15,7 @@ class CountingInstrument : public QenInstrument {
   int Connect(const Dstring& host, unsigned short port) override { return mInner->Connect(host, port); }
   int Disconnect() override { return mInner->Disconnect(); }
   bool IsConnected() const override { return mInner->IsConnected(); }
+  void SetCallWaiter(CallWaiter* waiter) override { mInner->SetCallWaiter(waiter); }
   int Call(const Dstring& cmd, Dstring& reply) override {
     ++mCalls;
     if (mRecording) mRecorded.push_back(cmd);

@@ -304,11 +304,21 @@ void uiapp::AsyncTimeOut() {
     }
     return;
   }
+  if (blocked == FWBlocker::kBusy && QenGuiInst::IsWaiting()) {
+    QenGuiInst::RunAfterWait(&uiapp::NfyHeldPoll, nullptr);
+    return;
+  }
   if (blocked) return;
   if (mGuiLockDs->IsLocked() && AfterLockReleased(dropped) != 0) return;
   if (!mDirtyFlagDs->IsDirty() && mDirtyFlagDs->UpdateFromFW(dropped) != 0) return;
   const SysStateEnum state = mSystemStateDs->GetState();
   if (state >= kSysRunning && state <= kSysSync) mBerSvr->UpdateFromFW(BerSvr::kReadResults, dropped);
+}
+
+void uiapp::NfyHeldPoll(void*) {
+  if (isProcessingSyncAlarmProc) return;
+  callSyncAlarmProc = 1;
+  AsyncTimeOut();
 }
 
 void uiapp::SyncTimeOut() {

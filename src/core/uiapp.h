@@ -101,6 +101,8 @@ class uiapp {
 
  private:
   static void AsyncTimeOut();
+  // The poll that came due while a call waited for its reply, run once the wait is over.
+  static void NfyHeldPoll(void*);
   static int AfterLockReleased(ConditionList& list);
 
   static RunStopDs* mRunStopDs;

@@ -1,9 +1,13 @@
 #include "instrument/QenGuiInst.h"
 
+#include <algorithm>
 #include <cctype>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
+#include <optional>
+#include <utility>
+#include <vector>
 
 #include "instrument/QenStatus.h"
 #include "support/Condition.h"
@@ -16,8 +20,47 @@ std::unique_ptr<QenInstrument> QenGuiInst::mInstrument;
 Dstring QenGuiInst::mAppHandle;
 std::FILE* QenGuiInst::errorlog = nullptr;
 bool QenGuiInst::mLocked = false;
+CallWaiter* QenGuiInst::mWaiter = nullptr;
+int QenGuiInst::mWaitDepth = 0;
 
 namespace {
+
+struct HeldProc {
+  QenGuiInst::Proc proc;
+  void* client;
+  bool operator==(const HeldProc&) const = default;
+};
+
+std::vector<HeldProc>& HeldProcs() {
+  static std::vector<HeldProc> held;
+  return held;
+}
+
+// A call on the application's connection while events run: the waiter is told when it ends,
+// and what was held off meanwhile runs after the outermost wait.
+class WaitedCall {
+ public:
+  WaitedCall(QenInstrument* instrument, CallWaiter* waiter, int& depth)
+      : mInstrument(instrument), mWaiter(waiter), mDepth(depth) {
+    ++mDepth;
+    mInstrument->SetCallWaiter(mWaiter);
+  }
+  ~WaitedCall() {
+    // The connection may have been replaced while events ran.
+    if (mInstrument == QenGuiInst::GetInstrument()) mInstrument->SetCallWaiter(nullptr);
+    --mDepth;
+    mWaiter->WaitEnded();
+    for (const HeldProc& held : std::exchange(HeldProcs(), {})) Toolkit::Get().CallDeferred(held.proc, held.client);
+  }
+  WaitedCall(const WaitedCall&) = delete;
+  WaitedCall& operator=(const WaitedCall&) = delete;
+
+ private:
+  QenInstrument* mInstrument;
+  CallWaiter* mWaiter;
+  int& mDepth;
+  FWBlocker::WaitScope mScope;
+};
 
 // A server that keeps answering with errors must not keep the caller here for ever.
 constexpr int kMaxErrorReads = 256;
@@ -75,10 +118,24 @@ void QenGuiInst::SetInstrument(std::unique_ptr<QenInstrument> instrument) {
   mInstrument = std::move(instrument);
 }
 
+void QenGuiInst::SetCallWaiter(CallWaiter* waiter) { mWaiter = waiter; }
+
+void QenGuiInst::RunAfterWait(Proc proc, void* client) {
+  if (mWaitDepth == 0) {
+    Toolkit::Get().CallDeferred(proc, client);
+    return;
+  }
+  const HeldProc held{proc, client};
+  auto& procs = HeldProcs();
+  if (std::find(procs.begin(), procs.end(), held) == procs.end()) procs.push_back(held);
+}
+
 int QenGuiInst::IsConnectedToServer() { return mInstrument ? 1 : 0; }
 
 int QenGuiInst::DisconnectFromServer(ConditionList&) {
   if (!mInstrument) return QenStatus::kOk;
+  // The waiting call still runs inside the connection: close it, and let the call end.
+  if (mWaitDepth > 0) return mInstrument->Disconnect();
   int status = mInstrument->Disconnect();
   mInstrument.reset();
   return status;
@@ -106,6 +163,10 @@ int QenGuiInst::Call(QenInstrument* instrument, const Dstring& cmd, Dstring& rep
     char stamp[32];
     std::strftime(stamp, sizeof stamp, "%H:%M:%S", std::localtime(&now));
     trace.Printf("%s\nCommand : %s\n", stamp, cmd.c_str());
+  }
+  std::optional<WaitedCall> waited;
+  if (instrument && mWaiter && instrument == mInstrument.get() && mWaitDepth == 0) {
+    waited.emplace(instrument, mWaiter, mWaitDepth);
   }
   int status = instrument ? instrument->Call(cmd, reply) : QenStatus::kNotConnected;
   if (instrument == mInstrument.get() && (status == QenStatus::kLocked || status >= QenStatus::kOk)) {
@@ -255,7 +316,9 @@ int QenGuiInst::ShowErrorDlg(ConditionList& list, int) {
   return 0;
 }
 
-void QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) { DeathHandler() = std::move(handler); }
+QenGuiInst::ServerDeathHandler QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) {
+  return std::exchange(DeathHandler(), std::move(handler));
+}
 
 void QenGuiInst::SetErrorListener(ErrorListenerProc listener) { ErrorListener() = std::move(listener); }
 

@@ -46,7 +46,8 @@ class QenGuiInst {
   // What happens when the server has died (-18): the message is shown and the process ends
   // with exit code 0. The GUI installs its own alert; tests install one that records.
   using ServerDeathHandler = std::function<void(const Dstring& message)>;
-  static void SetServerDeathHandler(ServerDeathHandler handler);
+  // Returns the handler it replaces.
+  static ServerDeathHandler SetServerDeathHandler(ServerDeathHandler handler);
   // Told of every condition that a failed command brought, with the command: the session's
   // error list. Null removes it.
   using ErrorListenerProc = std::function<void(const Dstring& cmd, const Condition& condition)>;
@@ -62,6 +63,17 @@ class QenGuiInst {
   // operation guards ask the server again (a harmless query) until the lock is gone.
   static bool IsInstrumentLocked();
 
+  // The waiter of every call on the application's connection (not owned; null for none):
+  // while a call waits, the host's events run and every guarded operation they would start
+  // is held off (FWBlocker::WaitScope).
+  static void SetCallWaiter(CallWaiter* waiter);
+  // Whether a call is waiting for its reply while events run.
+  static bool IsWaiting() { return mWaitDepth > 0; }
+  // Runs `proc(client)` from the event loop once no call waits any more: at once (deferred)
+  // when none waits, else after the wait. Asked twice during one wait, it runs once.
+  using Proc = void (*)(void* client);
+  static void RunAfterWait(Proc proc, void* client);
+
   static constexpr const char* kServerDeathMessage =
       "The user interface will be terminated\nbecause the firmware server has died.";
 
@@ -72,4 +84,6 @@ class QenGuiInst {
   static Dstring mAppHandle;
   static std::FILE* errorlog;
   static bool mLocked;
+  static CallWaiter* mWaiter;
+  static int mWaitDepth;
 };

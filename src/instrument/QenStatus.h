@@ -13,6 +13,8 @@ inline constexpr int kBadCommand = -6;
 inline constexpr int kCommError = -7;
 // A call was made while another one on the same connection still waits for its reply.
 inline constexpr int kCallBusy = -8;
+// The user stopped waiting for a reply; the connection has been closed.
+inline constexpr int kAbandoned = -9;
 inline constexpr int kServerTerminated = -18;
 inline constexpr int kLocked = -19;
 // The error the server queues for a long command the client cancelled.

@@ -42,7 +42,7 @@ int ConnectOne(const addrinfo* ai, long long deadline) {
 
 }  // namespace
 
-QenTcpInstrument::QenTcpInstrument() {
+QenTcpInstrument::QenTcpInstrument() : mReplyTimeoutMs(GetDefaultReplyTimeoutMs()) {
   // A peer that vanishes must give EPIPE, not end the process.
   std::signal(SIGPIPE, SIG_IGN);
 }
@@ -55,13 +55,18 @@ int QenTcpInstrument::Connect(const Dstring& host, unsigned short port) {
   hints.ai_family = AF_UNSPEC;
   hints.ai_socktype = SOCK_STREAM;
   addrinfo* found = nullptr;
+  mConnectFailure = ConnectFailure::None;
   if (getaddrinfo(host.c_str(), std::to_string(port).c_str(), &hints, &found) != 0) {
+    mConnectFailure = ConnectFailure::UnknownHost;
     return QenStatus::kConnectFailed;
   }
   const long long deadline = NowMs() + mConnectTimeoutMs;
   for (addrinfo* ai = found; ai && mFd < 0; ai = ai->ai_next) mFd = ConnectOne(ai, deadline);
   freeaddrinfo(found);
-  if (mFd < 0) return QenStatus::kConnectFailed;
+  if (mFd < 0) {
+    mConnectFailure = ConnectFailure::NoAnswer;
+    return QenStatus::kConnectFailed;
+  }
   int on = 1;
   setsockopt(mFd, IPPROTO_TCP, TCP_NODELAY, &on, sizeof on);
   setsockopt(mFd, SOL_SOCKET, SO_KEEPALIVE, &on, sizeof on);
@@ -85,12 +90,14 @@ int QenTcpInstrument::Drop(int status) {
 
 int QenTcpInstrument::WaitFor(short events, long long deadline) {
   for (;;) {
-    long long left = deadline - NowMs();
-    if (left <= 0) return QenStatus::kTimeOut;
+    // Past the deadline the bytes may still be there (a modal dialog kept the waiter busy): one
+    // look without waiting before it counts as a time-out.
+    const long long left = std::max(0LL, deadline - NowMs());
     pollfd p{mFd, events, 0};
     int n = poll(&p, 1, static_cast<int>(left));
     if (n > 0) return QenStatus::kOk;
     if (n < 0 && errno != EINTR) return Drop(QenStatus::kServerTerminated);
+    if (n == 0 && left == 0) return QenStatus::kTimeOut;
   }
 }
 
@@ -143,8 +150,21 @@ int QenTcpInstrument::ReadReply(std::uint32_t id, Dstring& reply, long long dead
   }
 }
 
+int QenTcpInstrument::WaitWithWaiter(long long deadline) {
+  for (;;) {
+    const int status = WaitFor(POLLIN, std::min(deadline, NowMs() + kWaitSliceMs));
+    if (status != QenStatus::kTimeOut || NowMs() >= deadline) return status;
+    if (mWaiter->Wait(*mCommand, NowMs() - mCallStart)) {
+      Disconnect();
+      return QenStatus::kAbandoned;
+    }
+    // The waiter may have let a disconnect through; the stream is gone then.
+    if (mFd < 0) return QenStatus::kNotConnected;
+  }
+}
+
 int QenTcpInstrument::WaitForReply(std::uint32_t id, long long& deadline) {
-  if (!mProgress) return WaitFor(POLLIN, deadline);
+  if (!mProgress) return mWaiter ? WaitWithWaiter(deadline) : WaitFor(POLLIN, deadline);
   for (;;) {
     const int status = WaitFor(POLLIN, std::min(deadline, NowMs() + kTickMs));
     if (status != QenStatus::kTimeOut || NowMs() >= deadline) return status;
@@ -187,9 +207,13 @@ int QenTcpInstrument::Call(const Dstring& cmd, Dstring& reply) {
   header.id = mNextId++;
   mCancelSent = false;
   mDone = mTotal = -1;
-  const long long deadline = NowMs() + mReplyTimeoutMs;
-  if (int status = SendAll(EncodeFrame(header, cmd), deadline); status != QenStatus::kOk) return status;
-  int status = ReadReply(header.id, reply, deadline);
+  mCommand = &cmd;
+  mCallStart = NowMs();
+  NoteTimeOut(Dstring(), 0);
+  const long long deadline = mCallStart + mReplyTimeoutMs;
+  int status = SendAll(EncodeFrame(header, cmd), deadline);
+  if (status == QenStatus::kOk) status = ReadReply(header.id, reply, deadline);
+  if (status == QenStatus::kTimeOut) NoteTimeOut(cmd, mReplyTimeoutMs);
   trace.Printf("id=%u status=%d bytes=%zu\n", header.id, status, reply.size());
   return status;
 }

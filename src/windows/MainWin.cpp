@@ -7,11 +7,14 @@
 #include <QIcon>
 #include <QMdiArea>
 #include <QPixmap>
+#include <QPointer>
 #include <QMdiSubWindow>
 #include <QMenuBar>
 #include <QMessageBox>
 #include <QToolBar>
 #include <QVBoxLayout>
+#include <utility>
+#include <vector>
 
 #include "core/SelfTest.h"
 #include "core/uiapp.h"
@@ -21,6 +24,7 @@
 #include "settings/SettingFile.h"
 #include "support/ConditionList.h"
 #include "toolkit/WaitCursor.h"
+#include "windows/InstrumentWaitView.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -47,8 +51,22 @@ class MainWin::LockView : public QenDsView {
   MainWin& mWindow;
 };
 
+namespace {
+
+// Windows whose close waits for a reply; a window freed meanwhile drops out by itself.
+std::vector<QPointer<QWidget>>& HeldCloses() {
+  static std::vector<QPointer<QWidget>> held;
+  return held;
+}
+
+}  // namespace
+
 MainWin::MainWin(QWidget* parent)
-    : QMainWindow(parent), mArea(new QMdiArea), mBanner(new QLabel), mStatus(new StateStatusBar) {
+    : QMainWindow(parent),
+      mArea(new QMdiArea),
+      mBanner(new QLabel),
+      mStatus(new StateStatusBar),
+      mWait(new InstrumentWaitView(mStatus)) {
   setObjectName(QStringLiteral("MainWin"));
   auto* central = new QWidget;
   auto* layout = new QVBoxLayout(central);
@@ -60,6 +78,8 @@ MainWin::MainWin(QWidget* parent)
   mBanner->setStyleSheet(QStringLiteral("background: #fff3c4; color: #5c4400; padding: 6px; border-bottom: 1px solid #e0c060"));
   mBanner->hide();
   layout->addWidget(mBanner);
+  layout->addWidget(mWait);
+  connect(mWait, &InstrumentWaitView::Abandoned, this, &MainWin::NfyWaitAbandoned, Qt::QueuedConnection);
   mArea->setViewMode(QMdiArea::SubWindowView);
   mArea->setBackground(QColor(0x5a, 0x63, 0x70));
   layout->addWidget(mArea, 1);
@@ -84,6 +104,7 @@ class MainWin::SelfTestTool : public SelfTest::Tool {
 };
 
 MainWin::~MainWin() {
+  QenGuiInst::SetCallWaiter(nullptr);
   if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
   if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
     ConditionList list;
@@ -100,6 +121,12 @@ void MainWin::Attach() {
   uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
   ShowLock(uiapp::GetGuiLockDs()->IsLocked());
   UpdateTitle();
+  QenGuiInst::SetCallWaiter(mWait);
+}
+
+void MainWin::NfyWaitAbandoned() {
+  mEndedToReconnect = true;
+  close();
 }
 
 void MainWin::BuildMenus() {
@@ -208,6 +235,7 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
 QMdiSubWindow* MainWin::Adopt(QWidget* window, const QString& resource, const QString& title) {
   window->setAttribute(Qt::WA_DeleteOnClose);
   QMdiSubWindow* sub = mArea->addSubWindow(window);
+  sub->installEventFilter(this);
   sub->setProperty(kResourceProperty, resource);
   sub->setWindowTitle(title);
   sub->setWindowIcon(QIcon(QPixmap(1, 1)));
@@ -300,8 +328,30 @@ void MainWin::UpdateTitle() {
 
 // Every window is asked first: one with unsaved work may keep the program open.
 void MainWin::closeEvent(QCloseEvent* event) {
+  if (HoldCloseDuringWait(this, event)) return;
   mArea->closeAllSubWindows();
   if (!mArea->subWindowList().isEmpty()) return event->ignore();
   uiapp::MainLoopExit();
   QMainWindow::closeEvent(event);
+}
+
+bool MainWin::eventFilter(QObject* watched, QEvent* event) {
+  if (event->type() == QEvent::Close && watched->isWidgetType()) {
+    return HoldCloseDuringWait(static_cast<QWidget*>(watched), event);
+  }
+  return QMainWindow::eventFilter(watched, event);
+}
+
+bool MainWin::HoldCloseDuringWait(QWidget* window, QEvent* event) {
+  if (!QenGuiInst::IsWaiting()) return false;
+  event->ignore();
+  HeldCloses().emplace_back(window);
+  QenGuiInst::RunAfterWait(&MainWin::NfyCloseHeld, nullptr);
+  return true;
+}
+
+void MainWin::NfyCloseHeld(void*) {
+  for (const QPointer<QWidget>& window : std::exchange(HeldCloses(), {})) {
+    if (window) window->close();
+  }
 }

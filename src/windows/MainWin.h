@@ -8,6 +8,7 @@ class QLabel;
 class QMdiArea;
 class QMdiSubWindow;
 class QMenu;
+class InstrumentWaitView;
 class StateStatusBar;
 class ConditionList;
 
@@ -34,9 +35,13 @@ class MainWin : public QMainWindow {
   bool IsShowingLock() const;
   // Follows the lock state of the instrument.
   void ShowLock(bool locked);
+  InstrumentWaitView* WaitView() const { return mWait; }
+  // Whether the window closed because the user gave up the connection and wants another.
+  bool EndedToReconnect() const { return mEndedToReconnect; }
 
  protected:
   void closeEvent(QCloseEvent* event) override;
+  bool eventFilter(QObject* watched, QEvent* event) override;
 
  private:
   class LockView;
@@ -55,11 +60,18 @@ class MainWin : public QMainWindow {
   void HitSaveSettingAs();
   void HitAbout();
   void UpdateTitle();
+  void NfyWaitAbandoned();
+  // A window closed while a command waits for the instrument would be freed under the code
+  // that waits: it closes once the reply is in.
+  bool HoldCloseDuringWait(QWidget* window, QEvent* event);
+  static void NfyCloseHeld(void*);
 
   QMdiArea* mArea;
   QLabel* mBanner;
   StateStatusBar* mStatus;
+  InstrumentWaitView* mWait;
   QMenu* mRecent = nullptr;
   std::unique_ptr<LockView> mLockView;
   std::unique_ptr<SelfTestTool> mSelfTest;
+  bool mEndedToReconnect = false;
 };

@@ -8,9 +8,11 @@
 #include <thread>
 #include <unistd.h>
 
-HostProcess::HostProcess(const std::vector<std::string>& args) {
+HostProcess::HostProcess(const std::vector<std::string>& args, const std::string& input) {
   int out[2];
+  int in[2] = {-1, -1};
   if (pipe(out) != 0) return;
+  if (!input.empty() && pipe(in) != 0) return;
   std::vector<std::string> argv = {QENGUI_PATH};
   argv.insert(argv.end(), args.begin(), args.end());
   // The host keeps its registry under the configuration directory: never the user's own.
@@ -22,6 +24,11 @@ HostProcess::HostProcess(const std::vector<std::string>& args) {
     dup2(out[1], STDERR_FILENO);
     close(out[0]);
     close(out[1]);
+    if (in[0] >= 0) {
+      dup2(in[0], STDIN_FILENO);
+      close(in[0]);
+      close(in[1]);
+    }
     std::vector<char*> cargv;
     for (auto& a : argv) cargv.push_back(a.data());
     cargv.push_back(nullptr);
@@ -30,6 +37,12 @@ HostProcess::HostProcess(const std::vector<std::string>& args) {
   }
   close(out[1]);
   mFd = out[0];
+  if (in[0] >= 0) {
+    close(in[0]);
+    mInput = in[1];
+    // A short write shows in the host's output, which every test reads.
+    [[maybe_unused]] const ssize_t written = write(mInput, input.data(), input.size());
+  }
 }
 
 HostProcess::~HostProcess() {
@@ -38,6 +51,7 @@ HostProcess::~HostProcess() {
     waitpid(mPid, nullptr, 0);
   }
   if (mFd >= 0) close(mFd);
+  if (mInput >= 0) close(mInput);
 }
 
 bool HostProcess::ReadSome(int timeoutMs) {

@@ -7,7 +7,8 @@
 // The built qengui host as a child process whose output a test reads as it comes.
 class HostProcess {
  public:
-  explicit HostProcess(const std::vector<std::string>& args);
+  // `input` is the host's standard input; the pipe stays open, so the host never reads its end.
+  explicit HostProcess(const std::vector<std::string>& args, const std::string& input = {});
   ~HostProcess();
   HostProcess(const HostProcess&) = delete;
   HostProcess& operator=(const HostProcess&) = delete;
@@ -24,5 +25,6 @@ class HostProcess {
 
   pid_t mPid = -1;
   int mFd = -1;
+  int mInput = -1;
   std::string mOutput;
 };
