@@ -491,10 +491,17 @@ void SimCommandProcessor::TestLock(const SimCommand& cmd) {
 void SimCommandProcessor::TestDelay(const SimCommand& cmd) {
   DataParcel items;
   long ms = 0, count = 1;
-  if (!ReadArgs(cmd, items, 1, 2)) return;
-  if (!items[0].GetLong(ms) || (items.size() == 2 && !items[1].GetLong(count))) return Error(-104);
+  if (!ReadArgs(cmd, items, 1, 3)) return;
+  if (!items[0].GetLong(ms) || (items.size() >= 2 && !items[1].GetLong(count))) return Error(-104);
+  // ALL: every connection open now is slowed, so that a client without test commands of its
+  // own (a host, a script) can be seen waiting.
+  const bool all = items.size() == 3;
+  if (all && Dstring(items[2].GetText()).ToUpper() != "ALL") return Error(-224);
   if (ms < 0 || ms > kMaxDelayMs || count < 1 || count > INT_MAX) return Error(-222);
-  mSessions[mConnection].ArmDelay(static_cast<int>(ms), static_cast<int>(count));
+  if (!all) return mSessions[mConnection].ArmDelay(static_cast<int>(ms), static_cast<int>(count));
+  for (auto& [connection, session] : mSessions) {
+    if (connection != mConnection) session.ArmDelay(static_cast<int>(ms), static_cast<int>(count));
+  }
 }
 
 void SimCommandProcessor::TestDrop(const SimCommand&) {

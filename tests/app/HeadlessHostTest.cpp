@@ -89,3 +89,14 @@ TEST_F(HeadlessHostTest, TimeLimitEndsTheHostInOrder) {
   ASSERT_EQ(mOther.Call(":QEN:INST:HAND:CRE? _QEN1X,\"PSX\",\"QEN1\"", handle), 0);
   EXPECT_EQ(handle, "_QEN1X");
 }
+
+TEST_F(HeadlessHostTest, CtrlCEndsTheHostAtOnceWhileTheInstrumentIsSlow) {
+  HostProcess host(Args({}));
+  ASSERT_TRUE(host.WaitForOutput("run: OFF\n", kPatience)) << host.Output();
+  // The host's next poll is answered in a minute.
+  ASSERT_EQ(Other(":TEST:DELAY 60000,1,ALL"), 0);
+  // Within one poll period the host is waiting for that reply.
+  EXPECT_FALSE(host.WaitForOutput("not printed", 1500));
+  host.Signal(SIGINT);
+  EXPECT_EQ(host.WaitForExit(2000), 0) << host.Output();
+}

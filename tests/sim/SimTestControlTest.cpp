@@ -33,6 +33,14 @@ TEST_F(SimTestControlTest, DelayAppliesToTheNextRepliesOfThatConnection) {
   EXPECT_EQ(Reply(":_H:CGR1:PER?").delayMs, 0);
 }
 
+TEST_F(SimTestControlTest, DelayOfAllSlowsEveryOtherConnectionOpenNow) {
+  Reply(":_H:CGR1:PER?", 2);
+  EXPECT_EQ(Reply(":TEST:DELAY 300,1,ALL").delayMs, 0);
+  EXPECT_EQ(Reply(":_H:CGR1:PER?").delayMs, 0) << "not the connection that asked";
+  EXPECT_EQ(Reply(":_H:CGR1:PER?", 2).delayMs, 300);
+  EXPECT_EQ(Reply(":_H:CGR1:PER?", 2).delayMs, 0);
+}
+
 TEST_F(SimTestControlTest, MalformedReplyReplacesOneMatchingReplyOnly) {
   EXPECT_EQ(Text(":TEST:MALF \":syst:err?\",\"garbage, \"\"quoted\"\"\""), "");
   EXPECT_EQ(Text(":_H:CGR1:PER?"), "1.000000000000E-09");
@@ -74,6 +82,7 @@ TEST_F(SimTestControlTest, BadArgumentsQueueOnTheConnection) {
       {":TEST:DELAY x", "-104,\"Data type error\""},
       {":TEST:DELAY -1", "-222,\"Data out of range\""},
       {":TEST:DELAY 10,0", "-222,\"Data out of range\""},
+      {":TEST:DELAY 10,1,SOME", "-224,\"Illegal parameter value\""},
       {":TEST:ERR _NOPE,1,\"x\"", "-224,\"Illegal parameter value\""},
       {":TEST:ERR _H,x,\"x\"", "-104,\"Data type error\""},
       {":TEST:ERR _H,1", "-109,\"Missing parameter\""},
