@@ -77,6 +77,12 @@ int Screenshot(MainWin& window, const HostOptions& options) {
   return 0;
 }
 
+// The address to offer again in the connect dialog; the simulator is chosen from its list.
+QString TypedAddress(const HostOptions& options) {
+  if (options.simulate) return {};
+  return QStringLiteral("%1:%2").arg(QString::fromStdString(options.host)).arg(options.port);
+}
+
 // Connected and with the handle: the first setting, the main window and its loop. Sets
 // `reconnect` when the user gave the connection up and wants another.
 int RunSession(const HostOptions& options, bool& reconnect) {
@@ -148,16 +154,16 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
       list.Clear();
       if (!options.screenshot.empty()) break;
       // The user corrects the address instead of starting the program again.
-      typed = options.simulate ? QString() : QStringLiteral("%1:%2").arg(QString::fromStdString(options.host)).arg(options.port);
+      typed = TypedAddress(options);
       options.askServer = true;
       continue;
     }
     bool reconnect = false;
     code = RunSession(options, reconnect);
     if (!reconnect) break;
-    // The user gave up a connection that did not answer and asks for another.
+    // The user gave up a connection that did not answer and asks for another (or the same).
     Restart(list);
-    typed.clear();
+    typed = TypedAddress(options);
     options.askServer = true;
   }
   ErrorJournal::Uninstall();

@@ -16,10 +16,10 @@ constexpr int kShownCommandChars = 60;
 // The command as the user knows it: without the handle, and short.
 QString ShownCommand(const Dstring& cmd) {
   QString text = QString::fromStdString(cmd);
-  const QString handle = QStringLiteral(":") + QString::fromStdString(QenGuiInst::GetAppHandle());
-  if (!QenGuiInst::GetAppHandle().empty() && text.startsWith(handle + QLatin1Char(':'), Qt::CaseInsensitive)) {
-    text.remove(0, handle.size());
-  }
+  // Commands name the handle first, with or without the leading colon.
+  const QString handle = QString::fromStdString(QenGuiInst::GetAppHandle()) + QLatin1Char(':');
+  const int colon = text.startsWith(QLatin1Char(':')) ? 1 : 0;
+  if (handle.size() > 1 && text.mid(colon).startsWith(handle, Qt::CaseInsensitive)) text.remove(0, colon + handle.size() - 1);
   // A data block is bytes, not words.
   const int block = text.indexOf(QLatin1Char('#'));
   text.truncate(block < 0 ? kShownCommandChars : qMin(block, kShownCommandChars));

@@ -167,7 +167,7 @@ TEST_F(InstrumentWaitTest, RunClickedDuringTheWaitIsRefusedInWordsAndNothingIsIn
   EXPECT_EQ(reply, "SEQ");
   ASSERT_EQ(recorder->mCalls.size(), 2u) << "the delay and the query, nothing of Run";
   ASSERT_FALSE(mAlerts.empty());
-  EXPECT_NE(mAlerts.back().find("uiapp::Run was not started: the instrument is still answering an earlier command."),
+  EXPECT_NE(mAlerts.back().find("Not done: the instrument is still answering an earlier command; try again when it has answered (uiapp::Run)."),
             std::string::npos)
       << mAlerts.back();
 }
@@ -209,4 +209,22 @@ TEST_F(InstrumentWaitTest, AfterFiveSecondsTheBarOffersDisconnectAndTheWindowAsk
   QCoreApplication::processEvents();
   EXPECT_TRUE(mWin->EndedToReconnect());
   EXPECT_FALSE(mWin->isVisible());
+}
+
+TEST(InstrumentWaitText, NamesTheCommandAsTheUserKnowsIt) {
+  QenGuiInst::SetAppHandle("_QEN1X");
+  struct Case {
+    const char* cmd;
+    long long ms;
+    const char* text;
+  };
+  const Case cases[] = {
+      {":_QEN1X:SGEN:GLOB:SYST:TEST?", 3999, "Waiting for the instrument: :SGEN:GLOB:SYST:TEST?… 3 s"},
+      {"_QEN1X:DFL?", 500, "Waiting for the instrument: :DFL?… 0 s"},
+      {":VC:_QEN1X:CGR1:PER 1E-9", 1000, "Waiting for the instrument: :VC:_QEN1X:CGR1:PER 1E-9… 1 s"},
+      {":_QEN1X:EDIT:SEGM1:PATT:DATA 0,0,1,8,#18\x01\x02", 2000,
+       "Waiting for the instrument: :EDIT:SEGM1:PATT:DATA 0,0,1,8,… 2 s"},
+  };
+  for (const Case& c : cases) EXPECT_EQ(InstrumentWaitView::WaitingText(c.cmd, c.ms).toStdString(), c.text) << c.cmd;
+  QenGuiInst::SetAppHandle("");
 }
