@@ -189,3 +189,39 @@ TEST_F(CallWaitTest, ADisconnectAskedDuringTheWaitEndsTheCallWithoutFreeingItsCo
 }
 
 }  // namespace
+
+namespace {
+
+TEST(CallWaitDeath, TheServerDyingDuringAWaitEndsAsAServerDeath) {
+  SimProcess sim;
+  ASSERT_NE(sim.Port(), 0);
+  HeadlessToolkit toolkit;
+  Toolkit::Install(&toolkit);
+  QenGuiInst::Init();
+  std::vector<Dstring> deaths;
+  QenGuiInst::SetServerDeathHandler([&](const Dstring& m) { deaths.push_back(m); });
+  auto inst = std::make_unique<QenTcpInstrument>();
+  ASSERT_EQ(inst->Connect("127.0.0.1", sim.Port()), 0);
+  QenGuiInst::SetInstrument(std::move(inst));
+  ScriptedWaiter waiter;
+  QenTcpInstrument killer;
+  ASSERT_EQ(killer.Connect("127.0.0.1", sim.Port()), 0);
+  waiter.mOnSlice = [&] {
+    Dstring ignored;
+    if (waiter.mSlices == 1) killer.Call(":TEST:DIE", ignored);
+    return false;
+  };
+  QenGuiInst::SetCallWaiter(&waiter);
+  ConditionList list;
+  Dstring reply;
+  ASSERT_EQ(QenGuiInst::Call(":TEST:DELAY 10000,1", reply, list), 0);
+  EXPECT_EQ(QenGuiInst::Call(":QEN:INST:HAND:CRE? _D,\"PSX\",\"D\"", reply, list), QenStatus::kServerTerminated);
+  ASSERT_EQ(deaths.size(), 1u);
+  EXPECT_EQ(deaths[0], QenGuiInst::kServerDeathMessage);
+  EXPECT_EQ(waiter.mEnded, 2);
+  QenGuiInst::SetCallWaiter(nullptr);
+  QenGuiInst::End();
+  Toolkit::Install(nullptr);
+}
+
+}  // namespace
