@@ -149,29 +149,27 @@ class GuiPath {
   ConditionList mList;
 };
 
+// The application and its connection, shared with the other benchmarks; false when qensim failed.
+bool StartGuiPath(benchmark::State& state) {
+  BenchApp();
+  if (ManyParamsRig::Get().Ok()) return true;
+  state.SkipWithError("qensim did not start");
+  return false;
+}
+
 // The whole path of the window host: QenGuiInst::Call with the window's waiter, which lets the
 // event loop run while a reply is slow and must cost nothing when it is fast.
 void BM_ShortQueryGuiPathVsRaw(benchmark::State& state) {
-  BenchApp();
-  ManyParamsRig& rig = ManyParamsRig::Get();
-  if (!rig.Ok()) {
-    state.SkipWithError("qensim did not start");
-    return;
-  }
+  if (!StartGuiPath(state)) return;
   GuiPath path;
-  RunComparison(state, rig.Port(), {":TEST:ECHO SEQ", 3},
+  RunComparison(state, ManyParamsRig::Get().Port(), {":TEST:ECHO SEQ", 3},
                 [&](const Dstring& cmd, Dstring& reply) { return path.Call(cmd, reply); });
 }
 
 // The longest the event loop stands still (the largest gap between ticks of a 10 ms timer)
 // while QenGuiInst::Call waits 2 s for a delayed reply, against the same loop left idle for 2 s.
 void BM_EventLoopStallDuringSlowReplyVsIdle(benchmark::State& state) {
-  BenchApp();
-  ManyParamsRig& rig = ManyParamsRig::Get();
-  if (!rig.Ok()) {
-    state.SkipWithError("qensim did not start");
-    return;
-  }
+  if (!StartGuiPath(state)) return;
   GuiPath path;
   double waitGap = 0;
   double idleGap = 0;
