@@ -34,11 +34,15 @@ class SimConnection {
 
   bool IsClosed() const { return mClosed; }
   void Close() { mClosed = true; }
+  // The client closed its sending side: what it sent is still answered before the close.
+  void EndInput() { mInputEnded = true; }
+  bool IsInputEnded() const { return mInputEnded; }
 
  private:
   int mFd;
   int mId;
   bool mClosed = false;
+  bool mInputEnded = false;
   FrameDecoder mDecoder;
   SimScpiReader mScpiReader;
   std::unique_ptr<SimScpiSession> mScpi;

@@ -125,7 +125,7 @@ int SimServer::Run() {
     fds.assign({pollfd{mListenFd, POLLIN, 0}, pollfd{mScpiFd, POLLIN, 0}});
     polled.clear();
     for (auto& [id, c] : mConnections) {
-      short events = c->Pending() < kMaxPendingOut ? POLLIN : 0;
+      short events = c->Pending() < kMaxPendingOut && !c->IsInputEnded() ? POLLIN : 0;
       if (c->Pending() > 0) events |= POLLOUT;
       fds.push_back(pollfd{c->GetFd(), events, 0});
       polled.push_back(c.get());
@@ -175,7 +175,9 @@ void SimServer::Serve(SimConnection& connection, short events) {
     } else {
       HandleFrames(connection);
     }
-    if (!open) connection.Close();
+    if (!open) connection.EndInput();
+    // Hung up both ways or reset: nothing more can reach the client.
+    if (events & (POLLHUP | POLLERR)) connection.Close();
   }
   if (!connection.IsClosed() && connection.Pending() > 0 && !connection.Flush()) connection.Close();
 }
@@ -244,6 +246,9 @@ void SimServer::FireTimers() {
 }
 
 void SimServer::Reap() {
+  for (auto& [id, c] : mConnections) {
+    if (c->IsInputEnded() && c->Pending() == 0 && !HasTimers(id)) c->Close();
+  }
   for (auto it = mConnections.begin(); it != mConnections.end();) {
     if (!it->second->IsClosed()) {
       ++it;
@@ -252,6 +257,10 @@ void SimServer::Reap() {
     mProcessor.Disconnect(it->first);
     it = mConnections.erase(it);
   }
+}
+
+bool SimServer::HasTimers(int connection) const {
+  return std::any_of(mTimers.begin(), mTimers.end(), [&](const Timer& t) { return t.connection == connection; });
 }
 
 int SimServer::PollTimeoutMs() const {

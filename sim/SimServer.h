@@ -44,7 +44,10 @@ class SimServer {
   void HandleFrames(SimConnection& connection);
   void HandleScpi(SimConnection& connection);
   void FireTimers();
+  // Closes the connections that are done (also those whose client finished sending and has
+  // all its answers) and forgets the closed ones.
   void Reap();
+  bool HasTimers(int connection) const;
   int PollTimeoutMs() const;
   void Log(const char* what, int connection) const;
 

@@ -127,3 +127,64 @@ TEST_F(SimServerTest, DieAndTerminateBothExitWithZero) {
 }
 
 }  // namespace
+
+namespace {
+
+// Sends `bytes` on a fresh socket to `port`, closes the sending side and reads until the server
+// closes: what a client such as `nc -q1` gets.
+std::string SendAndHalfClose(unsigned short port, const std::string& bytes) {
+  int fd = socket(AF_INET, SOCK_STREAM, 0);
+  sockaddr_in addr{};
+  addr.sin_family = AF_INET;
+  addr.sin_port = htons(port);
+  addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  std::string got;
+  if (connect(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr) == 0 &&
+      send(fd, bytes.data(), bytes.size(), MSG_NOSIGNAL) == static_cast<ssize_t>(bytes.size()) &&
+      shutdown(fd, SHUT_WR) == 0) {
+    char buf[4096];
+    pollfd p{fd, POLLIN, 0};
+    for (ssize_t n = 1; n > 0 && poll(&p, 1, 10000) == 1;) {
+      n = recv(fd, buf, sizeof buf, 0);
+      if (n > 0) got.append(buf, static_cast<std::size_t>(n));
+    }
+  }
+  close(fd);
+  return got;
+}
+
+}  // namespace
+
+TEST_F(SimServerTest, EveryReplyQueuedBeforeTheClientsHalfCloseIsSentBeforeTheClose) {
+  FrameHeader delay{FrameHeader::kRequest, 0, 1, 0, 0};
+  FrameHeader query{FrameHeader::kRequest, 0, 2, 0, 0};
+  const std::string got = SendAndHalfClose(
+      mSim.Port(), EncodeFrame(delay, ":TEST:DELAY 300,1") + EncodeFrame(query, ":QEN:INST:HAND:CRE? _Q,\"PSX\",\"Q\""));
+  FrameDecoder decoder;
+  decoder.Feed(got.data(), got.size());
+  FrameHeader header;
+  std::string payload;
+  ASSERT_TRUE(decoder.Next(header, payload));
+  EXPECT_EQ(header.id, 1u);
+  ASSERT_TRUE(decoder.Next(header, payload)) << "the delayed reply came before the close";
+  EXPECT_EQ(header.id, 2u);
+  EXPECT_EQ(payload, "_Q");
+}
+
+TEST(SimScpiHalfClose, TheReplyToTheLastQueryArrivesWhenTheClientClosesItsSendingSide) {
+  // A port free a moment ago: the SCPI socket's number is not printed where the fixture reads.
+  int probe = socket(AF_INET, SOCK_STREAM, 0);
+  sockaddr_in addr{};
+  addr.sin_family = AF_INET;
+  addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  bind(probe, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
+  socklen_t len = sizeof addr;
+  getsockname(probe, reinterpret_cast<sockaddr*>(&addr), &len);
+  const unsigned short scpi = ntohs(addr.sin_port);
+  close(probe);
+  SimProcess sim({"--scpi-port", std::to_string(scpi)});
+  ASSERT_NE(sim.Port(), 0);
+  for (int run = 0; run < 20; ++run) {
+    EXPECT_EQ(SendAndHalfClose(scpi, "*IDN?\n").substr(0, 8), "Corvane,") << "run " << run;
+  }
+}
