@@ -210,6 +210,16 @@ SimReply SimCommandProcessor::FinishFrame(int delayMs) {
   return reply;
 }
 
+// Queries that make or open something: under another client's lock they are writes.
+bool SimCommandProcessor::ChangesTheInstrument(const SimCommand& cmd) const {
+  static const char* const kChangingQueries[] = {":EDIT:SEGM:CRE?", ":EDIT:SEGM:OPEN?"};
+  const Dstring bare = BareHeader(cmd);
+  for (const char* header : kChangingQueries) {
+    if (bare == header) return true;
+  }
+  return false;
+}
+
 bool SimCommandProcessor::IsRefused(std::string_view text) const {
   if (mLockHolder == kNobody || mLockHolder == mConnection) return false;
   const bool queriesPass = mQueriesPassLock.contains(mConnection);
@@ -221,7 +231,8 @@ bool SimCommandProcessor::IsRefused(std::string_view text) const {
   for (std::string_view part : parts) {
     SimCommand cmd(part);
     if (cmd.GetPath().empty()) continue;
-    const bool passes = (mTestControl && cmd.GetPath()[0] == "TEST") || (queriesPass && cmd.IsQuery());
+    const bool passes =
+        (mTestControl && cmd.GetPath()[0] == "TEST") || (queriesPass && cmd.IsQuery() && !ChangesTheInstrument(cmd));
     if (!passes) return true;
   }
   return false;

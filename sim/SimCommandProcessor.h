@@ -118,6 +118,7 @@ class SimCommandProcessor : public SimContext {
   // Parses the arguments into min..max items; queues -109 or -104 and returns false otherwise.
   bool ReadArgs(const SimCommand& cmd, DataParcel& items, std::size_t min, std::size_t max);
   void UseFrameTarget(std::string_view text);
+  bool ChangesTheInstrument(const SimCommand& cmd) const;
   Dstring BareHeader(const SimCommand& cmd) const;
   // Tells every handle but `except` (a handle name, or empty for all) of changed headers.
   void MarkDirty(const Dstring& header, const Dstring& except);

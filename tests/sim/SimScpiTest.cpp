@@ -143,6 +143,12 @@ TEST_F(SimScpiTest, ALockRefusesWritesWithAnErrorAndLetsQueriesThrough) {
   EXPECT_EQ(Send("*RST;*ESR?"), "144");
   EXPECT_EQ(Send("SYST:ERR?;SYST:ERR?;SYST:ERR?"),
             "-203,\"Command protected\";-203,\"Command protected\";0,\"No error\"");
+  // Queries that make or open something are writes as far as the lock goes.
+  EXPECT_EQ(Send("EDIT:SEGM:CRE? \"scpi/locked\",MEM"), "<none>");
+  EXPECT_EQ(Send("EDIT:SEGM:OPEN? \"scpi/locked\""), "<none>");
+  EXPECT_EQ(Send("edit:segm:exis? \"scpi/locked\""), "FALSE");
+  EXPECT_EQ(Send("SYST:ERR?;SYST:ERR?;SYST:ERR?"),
+            "-203,\"Command protected\";-203,\"Command protected\";0,\"No error\"");
   EXPECT_EQ(Reply(":_H:SYST:LOCK OFF").status, 0);
   EXPECT_EQ(Send("CGR1:PER 2E-9;CGR1:PER?"), "2.000000000000E-09");
 }
