@@ -55,11 +55,14 @@ class MainWin : public QMainWindow {
   void HitSaveSettingAs();
   void HitAbout();
   void UpdateTitle();
+  // The active window's own Ctrl+S, when it has one, wins over the setting's.
+  void FollowActiveWindow(QMdiSubWindow* sub);
 
   QMdiArea* mArea;
   QLabel* mBanner;
   StateStatusBar* mStatus;
   QMenu* mRecent = nullptr;
+  QAction* mSaveSetting = nullptr;
   std::unique_ptr<LockView> mLockView;
   std::unique_ptr<SelfTestTool> mSelfTest;
 };
