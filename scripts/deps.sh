@@ -40,5 +40,6 @@ qen_quiet() {
   rm -f "$log"
 }
 
-# The scripting test drives qensim through PyVISA over its raw SCPI socket.
-QEN_TEST_PACKAGES=(python3 python3-pyvisa-py)
+# The scripting test drives qensim through PyVISA over its raw SCPI socket; the VCD tests read
+# the exported files with sigrok-cli, as a logic analyser program reads them.
+QEN_TEST_PACKAGES=(python3 python3-pyvisa-py sigrok-cli)

@@ -1,5 +1,6 @@
 #include "capture/VcdWriter.h"
 
+#include <algorithm>
 #include <cmath>
 
 #include "support/ExportFile.h"
@@ -13,12 +14,6 @@ void AddChange(Dstring& changes, bool high, const Dstring& id) {
   changes += high ? '1' : '0';
   changes += id;
   changes += '\n';
-}
-
-Dstring BusBits(const CaptureData& data, long low, long high, long vector) {
-  Dstring bits = "b";
-  for (long t = high; t >= low; --t) bits += data.Bit(t, vector) ? '1' : '0';
-  return bits;
 }
 
 }  // namespace
@@ -49,38 +44,40 @@ void VcdWriter::Write(const CaptureData& data, const Dstring& scope, const Range
   const bool wholePs = std::fabs(ps - std::round(ps)) < 1e-6 * ps;
   // Times are rounded vector by vector, so that a long capture does not drift.
   const long double tick = wholePs ? std::round(ps) : static_cast<long double>(ps) * 1000.0L;
-  auto timeOf = [&](long vectors) { return static_cast<unsigned long long>(std::llround(vectors * tick)); };
+  auto timeOf = [&](long vector) { return static_cast<unsigned long long>(std::llround(vector * tick)); };
   const long width = data.GetWidth();
-  const bool bus = range.busLow <= range.busHigh;
+  const long busLow = std::max(0L, range.busLow);
+  const long busHigh = std::min(width - 1, range.busHigh);
   const Dstring errorId = Identifier(static_cast<std::size_t>(width));
-  const Dstring busId = Identifier(static_cast<std::size_t>(width) + 1);
+  // The bus's bit of trace t, right after the error wire.
+  auto busId = [&](long t) { return Identifier(static_cast<std::size_t>(width + 1 + t - busLow)); };
+  auto inBus = [&](long t) { return t >= busLow && t <= busHigh; };
 
-  out << "$version qengui capture $end\n$timescale 1 " << (wholePs ? "ps" : "fs") << " $end\n";
+  out << "$version qengui capture $end\n";
+  out << "$comment vectors " << range.from << " to " << range.to - 1 << " of " << data.GetLength()
+      << "; vector 0 is at time 0 $end\n";
+  out << "$timescale 1 " << (wholePs ? "ps" : "fs") << " $end\n";
   out << "$scope module " << ScopeName(scope, "capture") << " $end\n";
   for (long t = 0; t < width; ++t) out << "$var wire 1 " << Identifier(static_cast<std::size_t>(t)) << " d" << t << " $end\n";
   out << "$var wire 1 " << errorId << " error $end\n";
-  if (bus) {
-    out << "$var wire " << range.busHigh - range.busLow + 1 << ' ' << busId << " bus[" << range.busHigh << ':'
-        << range.busLow << "] $end\n";
-  }
+  for (long t = busHigh; t >= busLow; --t) out << "$var wire 1 " << busId(t) << " bus [" << t << "] $end\n";
   out << "$upscope $end\n$enddefinitions $end\n";
   for (long v = range.from; v < range.to; ++v) {
     Dstring changes;
     for (long t = 0; t < width; ++t) {
-      if (v == range.from || data.Bit(t, v) != data.Bit(t, v - 1)) AddChange(changes, data.Bit(t, v), Identifier(static_cast<std::size_t>(t)));
+      const bool high = data.Bit(t, v);
+      if (v != range.from && high == data.Bit(t, v - 1)) continue;
+      AddChange(changes, high, Identifier(static_cast<std::size_t>(t)));
+      if (inBus(t)) AddChange(changes, high, busId(t));
     }
     const bool error = data.HasError(v, v + 1);
     if (v == range.from || error != data.HasError(v - 1, v)) AddChange(changes, error, errorId);
-    if (bus && (v == range.from || data.Value(range.busLow, range.busHigh, v) !=
-                                       data.Value(range.busLow, range.busHigh, v - 1))) {
-      changes += BusBits(data, range.busLow, range.busHigh, v) + " " + busId + "\n";
-    }
     if (changes.empty()) continue;
-    out << '#' << timeOf(v - range.from) << '\n';
+    out << '#' << timeOf(v) << '\n';
     if (v == range.from) out << "$dumpvars\n" << changes << "$end\n";
     else out << changes;
   }
-  out << '#' << timeOf(range.to - range.from) << '\n';
+  out << '#' << timeOf(range.to) << '\n';
 }
 
 int VcdWriter::WriteFile(const CaptureData& data, const Dstring& scope, const Range& range, const Dstring& path,

@@ -7,10 +7,14 @@
 #include "support/Dstring.h"
 
 // Writes vectors [from, to) of a capture as a Value Change Dump, which the common waveform
-// viewers open: a wire per trace ("d0" …), the bus shown in the window as a vector wire
-// ("bus[high:low]"), and a wire "error" high on the vectors with an error. Time 0 is the
-// first vector; the time scale is 1 ps, or 1 fs when the clock period is no whole number of
-// picoseconds. Only changes are written, so a quiet capture makes a small file.
+// viewers open: a wire per trace ("d0" …), a wire "error" high on the vectors with an error,
+// and the bus shown in the window as one scalar wire per trace ("bus [7]" … "bus [0]").
+// A vector wire would read the same in some viewers, but the sigrok VCD input of the Linux
+// distributions stops at the first value of a vector wider than one bit, so the bus goes bit
+// by bit; viewers that join bits of one name (GTKWave) show it as "bus[7:0]".
+// Times are those of the whole capture: vector 0 is time 0, so a range keeps its place, and
+// a comment in the header names the range. The time scale is 1 ps, or 1 fs when the clock
+// period is no whole number of picoseconds. Only changes are written.
 class VcdWriter {
  public:
   struct Range {

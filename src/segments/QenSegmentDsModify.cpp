@@ -191,10 +191,13 @@ int QenSegmentDs::FindPattern(long& vector, long& trace, long startVector, long 
   const char* findWord = SegmentKeywords::FindCommand(direction);
   if (int status = WordFor(findWord, "FindDirection", static_cast<int>(direction), command, list))
     return status;
-  if (InfoOf(format).tracesPerDigit == 0) {
-    return WordFor("", "DataFormat", static_cast<int>(format), command, list);
+  const DataFormatInfo& info = InfoOf(format);
+  if (info.tracesPerDigit == 0) return WordFor("", "DataFormat", static_cast<int>(format), command, list);
+  if (!IsPatternOf(pattern, format)) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTDS_BAD_PATTERN", {pattern, info.name, info.digitsText},
+                                SegmentStatus::kBadArgument);
   }
-  const Dstring number = pattern + InfoOf(format).suffix;
+  const Dstring number = pattern + info.suffix;
   const Dstring tail =
       direction == FindDirection::kFirst
           ? Dstring::Format(":PATT:%s \"%s\", %s, RVS", command.c_str(), number.c_str(), whichWord.c_str())

@@ -81,6 +81,11 @@ MainWin::MainWin(QWidget* parent)
   layout->addWidget(mWait);
   connect(mWait, &InstrumentWaitView::Abandoned, this, &MainWin::NfyWaitAbandoned, Qt::QueuedConnection);
   mArea->setViewMode(QMdiArea::SubWindowView);
+  // Windows larger than the area scroll: without the bars the area would ask for their size,
+  // and Tile would grow the frame past the screen to give it.
+  mArea->setHorizontalScrollBarPolicy(Qt::ScrollBarAsNeeded);
+  mArea->setVerticalScrollBarPolicy(Qt::ScrollBarAsNeeded);
+  connect(mArea, &QMdiArea::subWindowActivated, this, &MainWin::FollowActiveWindow);
   mArea->setBackground(QColor(0x5a, 0x63, 0x70));
   layout->addWidget(mArea, 1);
   setCentralWidget(central);
@@ -105,6 +110,8 @@ class MainWin::SelfTestTool : public SelfTest::Tool {
 
 MainWin::~MainWin() {
   QenGuiInst::SetCallWaiter(nullptr);
+  // The area tells of its windows going while the frame's part of the object is already gone.
+  disconnect(mArea, nullptr, this, nullptr);
   if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
   if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
     ConditionList list;
@@ -143,7 +150,8 @@ void MainWin::BuildFileMenu() {
   file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting);
   mRecent = file->addMenu(QStringLiteral("Recent &Settings"));
   connect(mRecent, &QMenu::aboutToShow, this, &MainWin::FillRecentMenu);
-  file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
+  mSaveSetting =
+      file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
   file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
   file->addSeparator();
   file->addAction(QStringLiteral("&Quit"), QKeySequence::Quit, this, &QWidget::close);
@@ -239,11 +247,25 @@ QMdiSubWindow* MainWin::Adopt(QWidget* window, const QString& resource, const QS
   sub->setProperty(kResourceProperty, resource);
   sub->setWindowTitle(title);
   sub->setWindowIcon(QIcon(QPixmap(1, 1)));
-  sub->resize(window->sizeHint().expandedTo(window->size()));
+  // As large as it asks, but no larger than the area shows once it shows (it scrolls beyond).
+  const QSize room = mArea->viewport()->isVisible()
+                         ? mArea->viewport()->size().expandedTo(sub->minimumSizeHint())
+                         : QSize(QWIDGETSIZE_MAX, QWIDGETSIZE_MAX);
+  sub->resize(window->sizeHint().expandedTo(window->size()).boundedTo(room));
   sub->setEnabled(!IsShowingLock());
   sub->show();
   window->setFocus();
   return sub;
+}
+
+void MainWin::FollowActiveWindow(QMdiSubWindow* sub) {
+  const QKeySequence save(QKeySequence::Save);
+  bool ownSave = false;
+  if (sub != nullptr && sub->widget() != nullptr) {
+    for (const QAction* action : sub->widget()->findChildren<QAction*>())
+      ownSave = ownSave || action->shortcuts().contains(save);
+  }
+  mSaveSetting->setShortcut(ownSave ? QKeySequence() : save);
 }
 
 bool MainWin::IsShowingLock() const { return mBanner->isVisibleTo(this); }

@@ -65,12 +65,15 @@ class MainWin : public QMainWindow {
   // that waits: it closes once the reply is in.
   bool HoldCloseDuringWait(QWidget* window, QEvent* event);
   static void NfyCloseHeld(void*);
+  // The active window's own Ctrl+S, when it has one, wins over the setting's.
+  void FollowActiveWindow(QMdiSubWindow* sub);
 
   QMdiArea* mArea;
   QLabel* mBanner;
   StateStatusBar* mStatus;
   InstrumentWaitView* mWait;
   QMenu* mRecent = nullptr;
+  QAction* mSaveSetting = nullptr;
   std::unique_ptr<LockView> mLockView;
   std::unique_ptr<SelfTestTool> mSelfTest;
   bool mEndedToReconnect = false;

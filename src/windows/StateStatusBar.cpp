@@ -10,6 +10,7 @@
 #include "data/QenDsView.h"
 #include "data/RunStopDs.h"
 #include "data/SystemStateDs.h"
+#include "support/NumberText.h"
 
 namespace {
 
@@ -104,8 +105,8 @@ void StateStatusBar::ShowState() {
   }
   mBer->setVisible(running);
   mBer->setText(QStringLiteral("BER %1 (%2 errors)")
-                    .arg(compared == 0 ? QStringLiteral("-") : QString::number(double(errors) / double(compared), 'e', 2))
-                    .arg(errors));
+                    .arg(QString::fromStdString(NumberText::Ratio(errors, compared)),
+                         QString::fromStdString(NumberText::Grouped(errors))));
 }
 
 QString StateStatusBar::Text() const {

@@ -12,6 +12,7 @@
 #include <sstream>
 #include <string>
 
+#include "common/SigrokCli.h"
 #include "common/SimProcess.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
@@ -500,6 +501,35 @@ TEST_F(SegmentSimTest, TheValueChangeDumpHoldsEveryState) {
     now[static_cast<std::size_t>(ids[line.substr(1)])] = line[0];
   }
   EXPECT_EQ(time, 90);
+  ds->Close(mList);
+  QenSegmentPool::FreeDs(ds);
+}
+
+// A logic analyser program reads the file the editor exports: a sample a vector, the states of
+// every trace as bits (a state that is neither, X, as 0) and the error wire.
+TEST_F(SegmentSimTest, SigrokReadsEveryStateOfTheExportedSegment) {
+  if (!SigrokCli::IsInstalled()) GTEST_SKIP() << "sigrok-cli is not installed";
+  QenSegmentDs* ds = Make("Vcd/Sigrok", "npkrX", 300, 100);
+  const std::string states = Scribble(ds, Window(ds, 0, 300), "npkrX", 3);
+  ASSERT_EQ(ds->Write(mList), 0);
+  const Dstring path = mDir + "/sigrok.vcd";
+  ASSERT_EQ(SegmentVcdWriter::WriteFile(*ds, path, mList), 0) << mList.ToText();
+  std::map<std::string, std::string> channels;
+  std::string error;
+  ASSERT_TRUE(SigrokCli::Read(path, "", channels, error)) << error;
+  ASSERT_EQ(channels.size(), 101u);
+  std::string errored(300, '0');
+  for (long t = 0; t < 100; ++t) {
+    const std::string& samples = channels["t" + std::to_string(t)];
+    ASSERT_EQ(samples.size(), 300u) << t;
+    for (long v = 0; v < 300; ++v) {
+      const char s = states[static_cast<std::size_t>(t * 300 + v)];
+      if (s == 'k' || s == 'r') errored[static_cast<std::size_t>(v)] = '1';
+      ASSERT_EQ(samples[static_cast<std::size_t>(v)], s == 'p' || s == 'r' ? '1' : '0')
+          << "trace " << t << ", vector " << v;
+    }
+  }
+  EXPECT_EQ(channels["error"], errored);
   ds->Close(mList);
   QenSegmentPool::FreeDs(ds);
 }

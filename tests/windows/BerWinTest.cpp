@@ -3,6 +3,7 @@
 #include <QChart>
 #include <QLineSeries>
 #include <QPushButton>
+#include <QRegularExpression>
 #include <QTableWidget>
 #include <QTest>
 #include <cstdio>
@@ -13,6 +14,8 @@
 #include "common/gui/GuiSimFixture.h"
 #include "core/uiapp.h"
 #include "data/BerSvr.h"
+#include "support/NumberText.h"
+#include "windows/StateStatusBar.h"
 #include "windows/ber/BerBerWin.h"
 
 namespace {
@@ -103,4 +106,30 @@ TEST_F(BerWinTest, ExportsTheTableAndTheHistoryAndNamesAPathItCannotWrite) {
   ConditionList refused;
   EXPECT_NE(mWin->ExportTable("/nonexistent-dir/ber.csv", refused), 0);
   EXPECT_NE(refused.ToText().find("/nonexistent-dir/ber.csv"), std::string::npos) << refused.ToText();
+}
+
+// A ratio and a count read the same in the table and in the status bar: "1.00E-02", "12 345".
+TEST_F(BerWinTest, TheTableAndTheStatusBarWriteRatiosAndCountsInOneForm) {
+  StateStatusBar bar;
+  bar.Attach();
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  PollUntilErrors();
+  bar.ShowState();
+  unsigned long long compared = 0;
+  unsigned long long errors = 0;
+  for (const BerSvr::PortResult& r : uiapp::GetBerSvr()->GetResults()) {
+    compared += r.compared;
+    errors += r.errors;
+  }
+  const BerSvr::PortResult& first = uiapp::GetBerSvr()->GetResults()[0];
+  const QRegularExpression ratio(QStringLiteral("^\\d\\.\\d\\dE-\\d\\d$"));
+  EXPECT_TRUE(ratio.match(QString::fromStdString(Cell(0, 3))).hasMatch()) << Cell(0, 3);
+  EXPECT_EQ(Cell(0, 3), NumberText::Ratio(first.errors, first.compared));
+  EXPECT_EQ(Cell(0, 2), NumberText::Grouped(first.errors));
+  const QString summary = QStringLiteral("BER %1 (%2 errors)")
+                              .arg(QString::fromStdString(NumberText::Ratio(errors, compared)),
+                                   QString::fromStdString(NumberText::Grouped(errors)));
+  EXPECT_TRUE(ratio.match(QString::fromStdString(NumberText::Ratio(errors, compared))).hasMatch());
+  EXPECT_TRUE(bar.Text().contains(summary)) << bar.Text().toStdString() << " lacks " << summary.toStdString();
 }

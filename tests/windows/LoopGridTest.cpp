@@ -8,6 +8,8 @@
 #include <QMdiArea>
 #include <QMdiSubWindow>
 #include <QMimeData>
+#include <QScreen>
+#include <QScrollBar>
 #include <QTableWidget>
 #include <QTest>
 #include <memory>
@@ -409,4 +411,57 @@ TEST_F(LoopGridTest, TheGridBaseCommandsWorkOnWholeBlocks) {
   ASSERT_EQ(mGrid->Undo(), 0);
   EXPECT_EQ(mGrid->DispLineCount(), 4);
   EXPECT_TRUE(list.IsEmpty()) << list.ToText();
+}
+
+// Windows > Tile with five windows: the frame keeps its size (the windows scroll in the area),
+// and the grid, narrower than its columns, scrolls sideways and keeps every port's column.
+TEST_F(LoopGridTest, TiledWithOtherWindowsTheGridScrollsAndKeepsEveryPortColumn) {
+  for (const char* resource : {"error.ErrorWin", "dtecmd.CmdWin", "errstate.ErrStateWin", "ber.BerWin"}) {
+    ASSERT_NE(mMain->OpenWindow(QString::fromLatin1(resource)), nullptr) << resource;
+  }
+  const QSize frame = mMain->size();
+  QAction* tile = nullptr;
+  for (QAction* action : mMain->findChildren<QAction*>()) {
+    if (action->text() == QStringLiteral("&Tile")) tile = action;
+  }
+  ASSERT_NE(tile, nullptr);
+  tile->trigger();
+  QCoreApplication::processEvents();
+  EXPECT_EQ(mMain->size(), frame);
+  const QSize least = mMain->minimumSizeHint();
+  EXPECT_LE(least.width(), frame.width());
+  EXPECT_LE(least.height(), frame.height());
+  const QRect screen = mMain->screen()->availableGeometry();
+  EXPECT_LE(least.width(), screen.width()) << "the frame cannot fit the screen";
+
+  auto* sub = qobject_cast<QMdiSubWindow*>(mWin->parentWidget());
+  ASSERT_NE(sub, nullptr);
+  sub->resize(sub->minimumSizeHint());
+  QCoreApplication::processEvents();
+  const unsigned long ports = CPortInfo::GetSequence()->GetNumPorts();
+  ASSERT_GE(ports, 2u);
+  ASSERT_LT(mGrid->width(), static_cast<int>(ports) * LoopGridManager::kPortCells * mGrid->GetDX());
+  QScrollBar* across = nullptr;
+  QScrollBar* down = nullptr;
+  for (QScrollBar* bar : mGrid->findChildren<QScrollBar*>())
+    (bar->orientation() == Qt::Horizontal ? across : down) = bar;
+  ASSERT_NE(across, nullptr);
+  ASSERT_NE(down, nullptr);
+  EXPECT_TRUE(across->isVisible());
+  for (GridDisp* disp : mGrid->Disps()) {
+    if (disp->objectName().startsWith(QStringLiteral("port"))) {
+      EXPECT_GE(disp->width(), LoopGridManager::kPortCells * mGrid->GetDX())
+          << disp->objectName().toStdString();
+    }
+  }
+  // The cursor on the last port brings its column into view, and back on the first, that one.
+  const int shown = mGrid->width() - down->width();
+  for (const unsigned long port : {ports, 1ul}) {
+    mGrid->SetCursor(1, mGrid->PortField(port));
+    const GridDisp* column = mGrid->findChild<GridDisp*>(QStringLiteral("port%1").arg(port));
+    ASSERT_NE(column, nullptr);
+    EXPECT_GE(column->x(), 0) << port;
+    EXPECT_LE(column->x() + column->width(), shown) << port;
+    EXPECT_EQ(across->value(), mGrid->GetScrollX());
+  }
 }

@@ -2,6 +2,8 @@
 
 #include <QAction>
 #include <QClipboard>
+#include <QComboBox>
+#include <QDir>
 #include <QGuiApplication>
 #include <QLabel>
 #include <QLineEdit>
@@ -126,6 +128,102 @@ TEST_F(SegmentEditTest, EditsFindsAndSavesWhatAFreshWindowReadsBack) {
   ASSERT_EQ(mWin->OpenSegment(kName, mList), 0) << mList.ToText();
   ExpectRows(mWin->Grid(), expected);
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}
+
+// Find: text that is no pattern of the format is refused in the line below the grid, before
+// anything is sent; what is found is selected; a search that went on round the end says so.
+TEST_F(SegmentEditTest, FindRefusesWhatIsNoPatternSelectsWhatItFindsAndSaysWhenItWrapped) {
+  SegmentGridManager* grid = mWin->Grid();
+  auto* find = mWin->findChild<QLineEdit*>(QStringLiteral("EditFind"));
+  ASSERT_EQ(grid->GoToVectorTrace(20, 12, mList), 0);
+  QTest::keyClicks(grid, QStringLiteral("beef"));
+  find->setText(QStringLiteral("zz"));
+  Trigger("FindNext");
+  QCoreApplication::processEvents();
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+  EXPECT_EQ(mWin->MessageText(),
+            QStringLiteral("\"zz\" is not a hexadecimal pattern: use the digits 0\u20139 and "
+                           "A\u2013F, and X for a digit that may be anything; nothing was sent."));
+  EXPECT_FALSE(grid->HasSelection());
+  EXPECT_EQ(grid->CursorVector(), 21);
+
+  // From vector 21 on there is no "ef" up to the end: the one of vector 20 is found round it.
+  find->setText(QStringLiteral("ef"));
+  Trigger("FindNext");
+  EXPECT_EQ(grid->CursorVector(), 20);
+  ASSERT_TRUE(grid->HasSelection());
+  const StateRange found = grid->SelectedRange();
+  EXPECT_EQ(found.GetFirstVector(), 20);
+  EXPECT_EQ(found.GetLastVector(), 20);
+  EXPECT_EQ(found.GetFirstTrace(), 0);
+  EXPECT_EQ(found.GetLastTrace(), 7);
+  EXPECT_EQ(mWin->MessageText(),
+            QStringLiteral("The search passed the end of the segment and went on from its start."));
+
+  // From the start, "beef" is ahead: no word of wrapping; the four digits are selected.
+  ASSERT_EQ(grid->GoToVectorTrace(0, 12, mList), 0);
+  find->setText(QStringLiteral("BEEF"));
+  Trigger("FindNext");
+  EXPECT_EQ(grid->CursorVector(), 20);
+  EXPECT_EQ(grid->SelectedRange().GetLastTrace(), 15);
+  EXPECT_EQ(mWin->MessageText(), QString());
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}
+
+// In binary the digits stand in groups of four from trace 0, half a cell apart; a click on the
+// first digit after a gap is that digit, one in the gap the digit before it.
+TEST_F(SegmentEditTest, BinaryDigitsStandInGroupsOfFour) {
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("beef"));
+  mWin->findChild<QComboBox*>(QStringLiteral("CBoxFormat"))
+      ->setCurrentIndex(static_cast<int>(DataFormat::kBin));
+  ASSERT_EQ(grid->GetDataFormat(0), static_cast<int>(DataFormat::kBin));
+  GridDisp* digits = grid->findChild<GridDisp*>(QStringLiteral("digits"));
+  const int dx = grid->GetDX();
+  for (int cell = 1; cell < 16; ++cell) {
+    EXPECT_EQ(digits->CellLeft(cell) - digits->CellLeft(cell - 1), dx + (cell % 4 == 0 ? dx / 2 : 0)) << cell;
+  }
+  const int y = grid->GetOffY() + grid->GetDY() + 2;
+  QTest::mouseClick(digits, Qt::LeftButton, {}, QPoint(digits->CellLeft(4) + 1, y));
+  EXPECT_EQ(grid->CursorTrace(), 11);
+  EXPECT_EQ(grid->CursorVector(), 1);
+  QTest::mouseClick(digits, Qt::LeftButton, {}, QPoint(digits->CellLeft(4) - 1, y));
+  EXPECT_EQ(grid->CursorTrace(), 12);
+  // The gap is blank; the digits either side are drawn.
+  const QImage image = digits->grab().toImage();
+  const int line0 = grid->GetOffY() + 2;
+  for (int x = digits->CellLeft(3) + dx; x < digits->CellLeft(4); ++x) {
+    for (int row = line0; row < line0 + grid->GetDY() - 4; ++row) {
+      ASSERT_EQ(image.pixelColor(x, row), digits->palette().base().color()) << x << "," << row;
+    }
+  }
+
+  // The picture of the documentation: a find in binary, the digits found selected.
+  const QByteArray dir = qgetenv("QEN_SCREENSHOT_DIR");
+  if (!dir.isEmpty()) {
+    SegmentProperties properties;
+    properties.name = "Demo/Binary";
+    properties.length = 64;
+    properties.width = 32;
+    properties.coding = "01";
+    ASSERT_EQ(mWin->CreateSegment(properties, mList), 0) << mList.ToText();
+    mWin->findChild<QComboBox*>(QStringLiteral("CBoxFormat"))
+        ->setCurrentIndex(static_cast<int>(DataFormat::kHex));
+    for (const char* row :
+         {"01234567", "89abcdef", "deadbeef", "cafef00d", "a5a5a5a5", "0ff00ff0", "12345678", "beef0000"}) {
+      QTest::keyClicks(grid, QString::fromLatin1(row));
+    }
+    mWin->findChild<QComboBox*>(QStringLiteral("CBoxFormat"))
+        ->setCurrentIndex(static_cast<int>(DataFormat::kBin));
+    mWin->findChild<QLineEdit*>(QStringLiteral("EditFind"))->setText(QStringLiteral("1011111011101111"));
+    Trigger("FindNext");
+    mWin->resize(1000, 560);
+    QCoreApplication::processEvents();
+    EXPECT_TRUE(
+        mWin->grab().save(QDir(QString::fromLocal8Bit(dir)).filePath(QStringLiteral("segment-editor.png"))));
+    ASSERT_EQ(grid->Release(mList), 0);
+    QenSegmentPool::Delete("Demo/Binary", mList);
+  }
 }
 
 // A save refused under another user's lock keeps what was typed; it goes out once the lock is gone.

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <QAction>
 #include <QCoreApplication>
 #include <QPushButton>
 #include <QTableWidget>
@@ -9,6 +10,7 @@
 #include "common/gui/GuiSimFixture.h"
 #include "segments/QenSegmentPool.h"
 #include "sequences/CSequence.h"
+#include "sequences/ui/LoopGridManager.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
@@ -144,6 +146,25 @@ TEST_F(SmseqeditTest, StepsAreUndoneAndRedone) {
   for (int i = 0; i < 20 && Cell(0, 1) != QStringLiteral("2000"); ++i) PollAndShow();
   EXPECT_EQ(Cell(0, 1), QStringLiteral("2000"));
   EXPECT_FALSE(mWin->CanUndo());
+}
+
+// Ctrl+Y redoes as Ctrl+Shift+Z does, on every platform: the editor answers the loop grid's keys.
+TEST_F(SmseqeditTest, CtrlYRedoes) {
+  LoopGridManager grid;
+  const QAction* gridRedo = grid.findChild<QAction*>(QStringLiteral("Redo"));
+  const QAction* redo = mWin->Table()->findChild<QAction*>(QStringLiteral("Redo"));
+  ASSERT_NE(gridRedo, nullptr);
+  ASSERT_NE(redo, nullptr);
+  EXPECT_EQ(redo->shortcuts(), gridRedo->shortcuts());
+  EXPECT_TRUE(redo->shortcuts().contains(QKeySequence(Qt::CTRL | Qt::Key_Y)));
+  Type(0, 1, QStringLiteral("1000"));
+  mWin->Table()->setFocus();
+  QTest::keyClick(mWin->Table(), Qt::Key_Z, Qt::ControlModifier);
+  ASSERT_EQ(Cell(0, 1), QStringLiteral("512"));
+  QTest::keyClick(mWin->Table(), Qt::Key_Y, Qt::ControlModifier);
+  EXPECT_EQ(Cell(0, 1), QStringLiteral("1000"));
+  EXPECT_NE(Other(":SGEN:GLOB:SEQ?").find(",1000,"), std::string::npos);
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
 }
 
 // Under another client's lock an edit reaches nothing, and the cell shows the instrument's value.

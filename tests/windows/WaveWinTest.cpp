@@ -10,7 +10,10 @@
 #include <memory>
 #include <sstream>
 
+#include <QSpinBox>
+
 #include "capture/ui/WaveView.h"
+#include "common/SigrokCli.h"
 #include "common/gui/GuiSimFixture.h"
 #include "instrument/QenGuiInst.h"
 #include "windows/TaskFollower.h"
@@ -188,6 +191,69 @@ TEST_F(WaveWinTest, TheVcdExportHoldsTheCapturedBitsAndErrors) {
   std::filesystem::remove(path);
   EXPECT_NE(mWin->ExportVcd("/nonexistent/dir/c.vcd", mList), 0);
   EXPECT_NE(mList.ToText().find("/nonexistent/dir/c.vcd"), std::string::npos);
+}
+
+// What a logic analyser program reads from the exported file: every sample of every trace, the
+// bus's traces and the errors, as the instrument sent them; a range from cursor to cursor at its
+// own time in the capture, with the header naming it.
+TEST_F(WaveWinTest, SigrokReadsTheExportedCaptureAndARangeAtItsTime) {
+  if (!SigrokCli::IsInstalled()) GTEST_SKIP() << "sigrok-cli is not installed";
+  Click("PButCapture");
+  ASSERT_EQ(mWin->Data().GetLength(), kDepth);
+  mWin->findChild<QSpinBox*>(QStringLiteral("SpinBusLow"))->setValue(1);
+  mWin->findChild<QSpinBox*>(QStringLiteral("SpinBusHigh"))->setValue(3);
+  const std::string data = Block("DATA");
+  const std::string errors = Block("ERR");
+  auto anyError = [&](long v) {
+    return BitAt(errors, 0, v) || BitAt(errors, 1, v) || BitAt(errors, 2, v) || BitAt(errors, 3, v);
+  };
+  // How the samples of a channel lie: `size` in all, vector `vector` + i at first + i * step.
+  struct Samples {
+    long size, first, step, vector, count;
+  };
+  auto expect = [&](const std::map<std::string, std::string>& channels, const std::string& name,
+                    const Samples& at, auto bit) {
+    ASSERT_TRUE(channels.count(name)) << name;
+    const std::string& samples = channels.at(name);
+    ASSERT_EQ(static_cast<long>(samples.size()), at.size) << name;
+    for (long i = 0; i < at.count; ++i) {
+      ASSERT_EQ(samples[static_cast<std::size_t>(at.first + i * at.step)] == '1', bit(at.vector + i))
+          << name << " at vector " << at.vector + i;
+    }
+  };
+  auto expectAll = [&](const std::map<std::string, std::string>& channels, const Samples& at) {
+    ASSERT_EQ(channels.size(), 4u + 1u + 3u);
+    for (long t = 0; t < 4; ++t) {
+      auto bit = [&](long v) { return BitAt(data, t, v); };
+      expect(channels, "d" + std::to_string(t), at, bit);
+      if (t >= 1) expect(channels, "bus[" + std::to_string(t) + "]", at, bit);
+    }
+    expect(channels, "error", at, anyError);
+  };
+  const std::string path = (std::filesystem::temp_directory_path() / "qen-wavewin-sigrok.vcd").string();
+  std::map<std::string, std::string> channels;
+  std::string error;
+
+  // The whole capture, a sample a vector (the time scale is 1 ps, the period 1 ns).
+  ASSERT_EQ(mWin->ExportVcd(path, mList), 0) << mList.ToText();
+  ASSERT_TRUE(SigrokCli::Read(path, "downsample=1000", channels, error)) << error;
+  expectAll(channels, {kDepth, 0, 1, 0, kDepth});
+
+  // Vectors 100 to 199: read as sigrok reads by default, from the first time in the file, every
+  // picosecond; and a sample a vector, counted from time 0, where the range starts at 100.
+  mWin->View()->SetCursor(0, 199);
+  mWin->View()->SetCursor(1, 100);
+  ASSERT_EQ(mWin->ExportVcd(path, mList), 0) << mList.ToText();
+  std::ifstream in(path);
+  const std::string text((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+  EXPECT_NE(text.find("$comment vectors 100 to 199 of 4096; vector 0 is at time 0 $end"), std::string::npos)
+      << text.substr(0, 300);
+  EXPECT_NE(text.find("\n#100000\n$dumpvars\n"), std::string::npos);
+  ASSERT_TRUE(SigrokCli::Read(path, "", channels, error)) << error;
+  expectAll(channels, {100 * 1000, 500, 1000, 100, 100});
+  ASSERT_TRUE(SigrokCli::Read(path, "downsample=1000", channels, error)) << error;
+  expectAll(channels, {200, 100, 1, 100, 100});
+  std::filesystem::remove(path);
 }
 
 TEST_F(WaveWinTest, ACaptureWhileNothingRunsIsRefusedAndACancelledOneKeepsTheLast) {

@@ -16,6 +16,11 @@ void GridDisp::SetCells(int cells) {
   if (GridManager* grid = Grid()) grid->Refresh();
 }
 
+void GridDisp::SetMinCells(int cells) {
+  mMinCells = cells < 0 ? 0 : cells;
+  if (GridManager* grid = Grid()) grid->Refresh();
+}
+
 GridManager* GridDisp::Grid() const {
   for (QObject* up = parent(); up != nullptr; up = up->parent()) {
     if (auto* grid = qobject_cast<GridManager*>(up)) return grid;
@@ -26,7 +31,17 @@ GridManager* GridDisp::Grid() const {
 int GridDisp::CellsShown() const {
   const GridManager* grid = Grid();
   if (grid == nullptr || grid->GetDX() <= 0) return 0;
-  return (width() + grid->GetDX() - 1) / grid->GetDX();
+  int cells = 0;
+  for (int left = 0; left < width(); left += grid->GetDX() + grid->DispGap(*this, cells - 1)) ++cells;
+  return cells;
+}
+
+int GridDisp::CellLeft(int cell) const {
+  const GridManager* grid = Grid();
+  if (grid == nullptr) return 0;
+  int left = 0;
+  for (int c = 0; c < cell; ++c) left += grid->GetDX() + grid->DispGap(*this, c);
+  return left;
 }
 
 bool GridDisp::HitCell(const QPoint& point, long& line, int& cell) const {
@@ -34,7 +49,11 @@ bool GridDisp::HitCell(const QPoint& point, long& line, int& cell) const {
   if (grid == nullptr || grid->GetDX() <= 0 || grid->GetDY() <= 0) return false;
   if (point.y() < grid->GetOffY() || point.x() < 0 || point.x() >= width()) return false;
   line = grid->DispFirstLine() + (point.y() - grid->GetOffY()) / grid->GetDY();
-  cell = point.x() / grid->GetDX();
+  // A point in a gap belongs to the cell on its left.
+  cell = 0;
+  for (int left = grid->GetDX() + grid->DispGap(*this, 0); left <= point.x();
+       left += grid->GetDX() + grid->DispGap(*this, cell))
+    ++cell;
   return line < grid->DispLineCount();
 }
 

@@ -10,6 +10,9 @@ class GridDisp : public QWidget {
   Q_OBJECT
   // Width in cells; 0 shares the width the fixed columns leave.
   Q_PROPERTY(int cells READ Cells WRITE SetCells)
+  // The least width, in cells, of a column that shares: below it the grid scrolls sideways
+  // rather than squeeze the column away.
+  Q_PROPERTY(int minCells READ MinCells WRITE SetMinCells)
   // An address or name column's text to the right (numbers) rather than the left.
   Q_PROPERTY(bool right READ IsRight WRITE SetRight)
 
@@ -21,6 +24,8 @@ class GridDisp : public QWidget {
   Kind GetKind() const { return mKind; }
   int Cells() const { return mCells; }
   void SetCells(int cells);
+  int MinCells() const { return mMinCells; }
+  void SetMinCells(int cells);
   bool IsRight() const { return mRight; }
   void SetRight(bool right) { mRight = right; }
   Qt::Alignment Alignment() const { return (mRight ? Qt::AlignRight : Qt::AlignLeft) | Qt::AlignVCenter; }
@@ -30,6 +35,8 @@ class GridDisp : public QWidget {
   bool HitCell(const QPoint& point, long& line, int& cell) const;
   // The cells that fit across the column.
   int CellsShown() const;
+  // The left edge of a cell, after the gaps the grid puts between groups of cells.
+  int CellLeft(int cell) const;
 
  protected:
   void paintEvent(QPaintEvent* event) override;
@@ -39,5 +46,6 @@ class GridDisp : public QWidget {
  private:
   Kind mKind;
   int mCells = 0;
+  int mMinCells = 1;
   bool mRight = false;
 };

@@ -26,15 +26,20 @@ const char* const kDispClasses[] = {"AddrDisp", "DigitDisp", "NameDisp"};
 
 }  // namespace
 
-GridManager::GridManager(QWidget* parent) : QWidget(parent), mScroll(new QScrollBar(Qt::Vertical, this)) {
+GridManager::GridManager(QWidget* parent)
+    : QWidget(parent),
+      mScroll(new QScrollBar(Qt::Vertical, this)),
+      mAcross(new QScrollBar(Qt::Horizontal, this)) {
   setFocusPolicy(Qt::StrongFocus);
   setAutoFillBackground(true);
+  mAcross->hide();
   connect(mScroll, &QScrollBar::valueChanged, this, [this](int value) {
     if (value != DispFirstLine()) {
       DispScrollTo(value);
       for (GridDisp* disp : Disps()) disp->update();
     }
   });
+  connect(mAcross, &QScrollBar::valueChanged, this, &GridManager::SetScrollX);
 }
 
 GridManager::GridManager(const ConstructionRecord& record) : GridManager(record.parent) {
@@ -114,7 +119,26 @@ std::vector<GridDisp*> GridManager::Disps() const {
 
 long GridManager::VisibleLines() const {
   if (mFields.dy <= 0) return 0;
-  return std::max(0, (height() - mFields.offy) / mFields.dy);
+  return std::max(0, (ColumnHeight() - mFields.offy) / mFields.dy);
+}
+
+int GridManager::ColumnHeight() const {
+  return std::max(0, height() - (mAcross->isHidden() ? 0 : mAcross->sizeHint().height()));
+}
+
+void GridManager::SetScrollX(int x) {
+  if (x == mScrollX) return;
+  mScrollX = x;
+  LayoutDisps();
+}
+
+void GridManager::ShowAcross(int left, int right) {
+  const int shown = width() - mScroll->sizeHint().width();
+  int move = right > shown ? right - shown : 0;
+  // When both edges cannot show, the left one does.
+  if (left - move < 0) move = left;
+  mScrollX += move;
+  LayoutDisps();
 }
 
 void GridManager::Refresh() {
@@ -150,13 +174,33 @@ void GridManager::LayoutDisps() {
     }
   }
   const int share = stretching > 0 ? std::max(0, right - mFields.offx - fixed) / stretching : 0;
-  int x = mFields.offx;
+  auto widthOf = [&](const GridDisp* disp) {
+    return disp->Cells() > 0 ? disp->Cells() * mFields.dx : std::max(share, disp->MinCells() * mFields.dx);
+  };
+  int content = mFields.offx;
+  for (const GridDisp* disp : disps) content += widthOf(disp);
+  const int beyond = std::max(0, content - right);
+  mAcross->setVisible(beyond > 0);
+  mScrollX = std::clamp(mScrollX, 0, beyond);
+  {
+    const QSignalBlocker quiet(mAcross);
+    mAcross->setRange(0, beyond);
+    mAcross->setPageStep(std::max(1, right));
+    mAcross->setSingleStep(std::max(1, static_cast<int>(mFields.dx)));
+    mAcross->setValue(mScrollX);
+  }
+  const int height = ColumnHeight();
+  int x = mFields.offx - mScrollX;
   for (GridDisp* disp : disps) {
-    const int w = disp->Cells() > 0 ? disp->Cells() * mFields.dx : share;
-    disp->setGeometry(x, 0, std::max(0, std::min(w, right - x)), height());
+    const int w = widthOf(disp);
+    disp->setGeometry(x, 0, w, height);
     x += w;
   }
-  mScroll->setGeometry(right, mFields.offy, barWidth, std::max(0, height() - mFields.offy));
+  mScroll->setGeometry(right, mFields.offy, barWidth, std::max(0, height - mFields.offy));
+  mAcross->setGeometry(0, height, right, this->height() - height);
+  // The columns reach under the bars when they scroll: the bars stay on top.
+  mScroll->raise();
+  mAcross->raise();
 }
 
 void GridManager::SyncScrollBar() {
@@ -174,6 +218,14 @@ void GridManager::resizeEvent(QResizeEvent* event) {
 }
 
 void GridManager::wheelEvent(QWheelEvent* event) {
+  // A sideways wheel, or Shift with the wheel, scrolls the columns across.
+  const bool across = event->angleDelta().x() != 0 || (event->modifiers() & Qt::ShiftModifier) != 0;
+  if (across && !mAcross->isHidden()) {
+    const int delta = event->angleDelta().x() != 0 ? event->angleDelta().x() : event->angleDelta().y();
+    SetScrollX(std::clamp(mScrollX - 3 * mFields.dx * delta / 120, 0, mAcross->maximum()));
+    event->accept();
+    return;
+  }
   const int steps = event->angleDelta().y() / 120;
   if (steps == 0) return;
   const long last = std::max(0L, DispLineCount() - VisibleLines());
@@ -204,6 +256,9 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
   const int dx = digits ? mFields.dx : disp.width();
   const int pad = digits ? 0 : 6;
   const int cells = digits ? disp.CellsShown() : 1;
+  std::vector<int> lefts(static_cast<std::size_t>(cells), 0);
+  for (int c = 1; c < cells; ++c)
+    lefts[static_cast<std::size_t>(c)] = lefts[static_cast<std::size_t>(c - 1)] + dx + DispGap(disp, c - 1);
   const int top = mFields.offy;
   if (area.top() < top) {
     painter.fillRect(QRect(0, 0, disp.width(), top), pal.window());
@@ -217,7 +272,8 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
       if (!digits) {
         for (QString& line : lines) line = painter.fontMetrics().elidedText(line, Qt::ElideRight, dx - 2 * pad);
       }
-      painter.drawText(QRect(c * dx + pad, 0, dx - 2 * pad, top), align, lines.join(QLatin1Char('\n')));
+      painter.drawText(QRect(lefts[static_cast<std::size_t>(c)] + pad, 0, dx - 2 * pad, top), align,
+                       lines.join(QLatin1Char('\n')));
     }
   }
   const long first = DispFirstLine();
@@ -233,11 +289,14 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
     const int y = top + i * dy;
     for (int c = 0; c < cells; ++c) {
       const GridCell cell = DispCell(disp, line, c);
-      const QRect box(c * dx, y, dx, dy);
+      const QRect box(lefts[static_cast<std::size_t>(c)], y, dx, dy);
       if (cell.cursor) {
         painter.fillRect(box, pal.highlight());
       } else if (cell.selected) {
-        painter.fillRect(box, pal.highlight().color().lighter(170));
+        // A selection runs on over the gap to a selected neighbour, so that it reads as one.
+        const bool joined = c + 1 < cells && DispCell(disp, line, c + 1).selected;
+        painter.fillRect(joined ? box.adjusted(0, 0, DispGap(disp, c), 0) : box,
+                         pal.highlight().color().lighter(170));
       }
       if (cell.text.isEmpty()) continue;
       painter.setPen(cell.cursor ? pal.highlightedText().color() : cell.marked ? alert : cell.dim ? dimText : text);
@@ -245,6 +304,10 @@ void GridManager::DispPaint(const GridDisp& disp, QPainter& painter, const QRect
       painter.drawText(box.adjusted(pad, 0, -pad, 0), digits ? Qt::AlignCenter : disp.Alignment(), text);
     }
   }
+}
+
+int GridManager::DispGap(const GridDisp&, int) const {
+  return 0;
 }
 
 unsigned GridManager::NfyGetMenuItemState(std::uint16_t) { return 0; }

@@ -35,10 +35,11 @@ struct GridCell {
 
 // The common base of the grid editors: a panel of equal cells, laid out as display columns
 // (AddrDisp, DigitDisp, NameDisp children, left to right) that scroll together by lines, with
-// a vertical scroll bar on the right. What a line and a cell mean, and all editing state, are the
-// subclass's: the base asks through the display hooks and offers every editing command through
-// the virtual operations below, each harmless and impossible by default, so a window can ask
-// whichever grid has the focus.
+// a vertical scroll bar on the right. Columns that do not fit across scroll sideways under a
+// horizontal scroll bar; none is ever squeezed away. What a line and a cell mean, and all
+// editing state, are the subclass's: the base asks through the display hooks and offers every
+// editing command through the virtual operations below, each harmless and impossible by
+// default, so a window can ask whichever grid has the focus.
 class GridManager : public QWidget {
   Q_OBJECT
   Q_PROPERTY(int dx READ GetDX WRITE SetDX)
@@ -82,8 +83,13 @@ class GridManager : public QWidget {
 
   // The display columns, left to right.
   std::vector<GridDisp*> Disps() const;
-  // Lines that fit below the header.
+  // Lines that fit below the header (and above the horizontal scroll bar, when there is one).
   long VisibleLines() const;
+  // How far the columns are scrolled sideways, in pixels.
+  int GetScrollX() const { return mScrollX; }
+  void SetScrollX(int x);
+  // Scrolls sideways, with the least movement, so that [left, right) of the grid is shown.
+  void ShowAcross(int left, int right);
   // Re-reads the line count and first line from the subclass and repaints every column.
   void Refresh();
 
@@ -158,6 +164,8 @@ class GridManager : public QWidget {
   virtual QString DispHeader(const GridDisp& disp, int cell) const;
   virtual GridCell DispCell(const GridDisp& disp, long line, int cell) const;
   virtual void DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const;
+  // Pixels of space after a cell of a digit column, which set its cells apart in groups.
+  virtual int DispGap(const GridDisp& disp, int cell) const;
   virtual void DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers);
   virtual void DispMove(const GridDisp& disp, long line, int cell);
 
@@ -180,7 +188,11 @@ class GridManager : public QWidget {
 
  private:
   void SyncScrollBar();
+  // The height of the columns: the grid's, less the horizontal scroll bar when it shows.
+  int ColumnHeight() const;
 
   GridFields mFields;
   QScrollBar* mScroll = nullptr;
+  QScrollBar* mAcross = nullptr;
+  int mScrollX = 0;
 };

@@ -4,6 +4,7 @@
 #include <QGuiApplication>
 #include <QKeyEvent>
 #include <QPainter>
+#include <QStringList>
 #include <algorithm>
 #include <cstring>
 
@@ -16,6 +17,7 @@
 #include "segments/SegmentVcdWriter.h"
 #include "segments/ui/GridDisp.h"
 #include "support/FWBlocker.h"
+#include "support/NumberText.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
 namespace {
@@ -66,6 +68,7 @@ int SegmentGridManager::Release(ConditionList& list) {
   mBuffer = nullptr;
   mLength = mWidth = mDigits = 0;
   mFirst = mDigitOffset = mCursorVector = mCursorDigit = 0;
+  mFoundVector = mFoundTrace = -1;
   mSelecting = false;
   Refresh();
   emit StateChanged();
@@ -147,13 +150,13 @@ StateRange SegmentGridManager::SelectedRange() const {
 QString SegmentGridManager::CursorText() const {
   if (!IsEditable()) return mDs == nullptr ? QString() : QStringLiteral("The segment is empty.");
   const StateRange r = SelectedRange();
-  QString text = QStringLiteral("Vector %1, trace %2").arg(mCursorVector).arg(mCursorDigit * TracesPerDigit());
+  const auto grouped = [](long n) { return QString::fromStdString(NumberText::Grouped(n)); };
+  QString text = QStringLiteral("Vector %1, trace %2")
+                     .arg(grouped(mCursorVector), grouped(mCursorDigit * TracesPerDigit()));
   if (mSelecting) {
     text += QStringLiteral(" · selected: vectors %1–%2, traces %3–%4")
-                .arg(r.GetFirstVector())
-                .arg(r.GetLastVector())
-                .arg(r.GetFirstTrace())
-                .arg(r.GetLastTrace());
+                .arg(grouped(r.GetFirstVector()), grouped(r.GetLastVector()), grouped(r.GetFirstTrace()),
+                     grouped(r.GetLastTrace()));
   }
   return text;
 }
@@ -346,21 +349,64 @@ int SegmentGridManager::GetIsErrorInVector(long vector, bool& error, ConditionLi
   return 0;
 }
 
+// A pattern the format cannot read is refused in the line below the grid, before anything is
+// sent. What is found is selected: the digits the pattern covers on its vector (or the vectors
+// it covers on its trace); the line says when the search went round the end.
 int SegmentGridManager::FindPattern(FindDirection direction, VectorTrace what, ConditionList& list) {
   if (!IsFindPossible()) return 0;
+  if (!IsPatternOf(mFindText, mFormat)) {
+    ConditionList refused;
+    long vector = -1;
+    long trace = -1;
+    const int status = mDs->FindPattern(vector, trace, 0, 0, mFindText, mFormat, direction, what, refused);
+    // Said in words alone: it is the user's typing, not the instrument's error.
+    QStringList words;
+    for (const Condition& c : refused) words << QString::fromStdString(c.GetMessage());
+    emit Message(words.join(QLatin1Char(' ')));
+    return status;
+  }
+  const long k = TracesPerDigit();
+  // After a find the cursor's digit may start below the match: the next one starts at the match.
+  const bool atFound = mFoundTrace >= 0 && mFoundVector == mCursorVector && mFoundTrace / k == mCursorDigit;
+  const long fromVector = mCursorVector;
+  const long fromTrace = atFound ? mFoundTrace : mCursorDigit * k;
   long vector = -1;
   long trace = -1;
-  if (int status = mDs->FindPattern(vector, trace, mCursorVector, mCursorDigit * TracesPerDigit(), mFindText, mFormat,
-                                    direction, what, list)) {
+  if (int status =
+          mDs->FindPattern(vector, trace, fromVector, fromTrace, mFindText, mFormat, direction, what, list)) {
     return status;
   }
   if (vector < 0) {
-    emit Message(QStringLiteral("\"%1\" was not found %2.")
-                     .arg(QString::fromStdString(mFindText),
-                          direction == FindDirection::kPrevious ? QStringLiteral("before the cursor") : QStringLiteral("after the cursor")));
+    emit Message(
+        QStringLiteral("\"%1\" was not found in the segment.").arg(QString::fromStdString(mFindText)));
     return 0;
   }
-  return GoToVectorTrace(vector, std::max(0L, trace), list);
+  trace = std::max(0L, trace);
+  // The server searches in the order of the lines (or of the traces) and goes on round the end.
+  const bool alongVectors = what == VectorTrace::kVector;
+  const auto order = [&](long v, long t) { return alongVectors ? v * mWidth + t : t * mLength + v; };
+  const bool wrapped =
+      (direction == FindDirection::kNext && order(vector, trace) <= order(fromVector, fromTrace)) ||
+      (direction == FindDirection::kPrevious && order(vector, trace) >= order(fromVector, fromTrace));
+  if (int status = GoToVectorTrace(vector, trace, list)) return status;
+  const long span = static_cast<long>(mFindText.size()) * k;
+  const long lastTrace = std::min(mWidth - 1, alongVectors ? trace + span - 1 : trace);
+  const long lastVector = std::min(mLength - 1, alongVectors ? vector : vector + span - 1);
+  if (int status = SetSelection(0, vector, lastVector, trace / k, lastTrace / k, 0, list)) return status;
+  // The cursor stays on the vector found, where the next search starts.
+  mCursorVector = vector;
+  mAnchorVector = lastVector;
+  mFoundVector = vector;
+  mFoundTrace = trace;
+  Refresh();
+  emit StateChanged();
+  if (wrapped) {
+    emit Message(
+        direction == FindDirection::kPrevious
+            ? QStringLiteral("The search passed the start of the segment and went on from its end.")
+            : QStringLiteral("The search passed the end of the segment and went on from its start."));
+  }
+  return 0;
 }
 
 int SegmentGridManager::ModifyFill(ConditionList& list) {
@@ -503,6 +549,12 @@ void SegmentGridManager::DispPaint(const GridDisp& disp, QPainter& painter, cons
                                       : QStringLiteral("The segment has no vectors: Edit > Insert Vectors… adds some.");
   painter.setPen(disp.palette().color(QPalette::Disabled, QPalette::Text));
   painter.drawText(disp.rect().adjusted(12, GetOffY() + 12, -12, -12), Qt::AlignLeft | Qt::AlignTop | Qt::TextWordWrap, hint);
+}
+
+int SegmentGridManager::DispGap(const GridDisp& disp, int cell) const {
+  if (disp.GetKind() != GridDisp::Kind::kDigit) return 0;
+  const long digit = DigitAt(mDigitOffset + cell);
+  return digit > 0 && digit % kDigitsPerGroup == 0 ? GetDX() / 2 : 0;
 }
 
 void SegmentGridManager::DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers) {

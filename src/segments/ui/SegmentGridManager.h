@@ -130,6 +130,9 @@ class SegmentGridManager : public GridManager {
   void DispMove(const GridDisp& disp, long line, int cell) override;
   // Without a segment, or with an empty one, the digit column says what to do.
   void DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const override;
+  // The digits stand in groups of four, counted from trace 0, half a cell apart.
+  int DispGap(const GridDisp& disp, int cell) const override;
+  static constexpr long kDigitsPerGroup = 4;
 
  signals:
   // A refusal the user should read where they type (a digit the format does not know).
@@ -170,5 +173,8 @@ class SegmentGridManager : public GridManager {
   AddrFormat mAddrFormat = AddrFormat::kDecimal;
   long mFillState = 1;
   Dstring mFindText;
+  // Where the last find stopped; -1 before one.
+  long mFoundVector = -1;
+  long mFoundTrace = -1;
   Dstring mTargetCoding;
 };

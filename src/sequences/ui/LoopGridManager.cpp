@@ -16,6 +16,7 @@
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceUndo.h"
 #include "sequences/ui/SequenceFollower.h"
+#include "support/NumberText.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
 namespace {
@@ -28,7 +29,9 @@ const QLatin1String kMarks("marks");
 const QLatin1String kPortPrefix("port");
 
 QString CountText(unsigned long iterations) {
-  return iterations == 0 ? QStringLiteral("\u221E") : QStringLiteral("\u00D7%1").arg(iterations);
+  return iterations == 0
+             ? QStringLiteral("\u221E")
+             : QStringLiteral("\u00D7%1").arg(QString::fromStdString(NumberText::Grouped(iterations)));
 }
 
 }  // namespace
@@ -115,6 +118,8 @@ void LoopGridManager::SetCursor(unsigned long block, int field, bool extend) {
   if (!extend) mAnchor = mRow;
   ShowLine(mRow);
   Refresh();
+  const QRect cell = CellRect(mRow, mField);
+  if (cell.isValid()) ShowAcross(cell.left(), cell.right() + 1);
   emit StateChanged();
 }
 
@@ -172,6 +177,8 @@ void LoopGridManager::SyncColumns() {
   for (unsigned long p = 1; p <= ports; ++p) {
     auto* disp = new NameDisp(this);
     disp->setObjectName(kPortPrefix + QString::number(p));
+    // Narrower than a short segment name, a port column would show nothing: the grid scrolls.
+    disp->SetMinCells(kPortCells);
     disp->show();
   }
   mPorts = ports;
@@ -366,6 +373,10 @@ void LoopGridManager::dropEvent(QDropEvent* event) {
 
 // The commands are the grid's actions, so they have their keys while the grid has the focus and
 // make its context menu.
+QList<QKeySequence> LoopGridManager::RedoKeys() {
+  return {QKeySequence(Qt::CTRL | Qt::Key_Y), QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_Z)};
+}
+
 void LoopGridManager::AddActions() {
   struct Entry {
     const char* name;
@@ -396,10 +407,7 @@ void LoopGridManager::AddActions() {
        {QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_L)},
        [this] { RemoveLoop(); }},
       {"Undo", "&Undo", QKeySequence::keyBindings(QKeySequence::Undo), [this] { Undo(); }},
-      {"Redo",
-       "Re&do",
-       {QKeySequence(Qt::CTRL | Qt::Key_Y), QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_Z)},
-       [this] { Redo(); }},
+      {"Redo", "Re&do", RedoKeys(), [this] { Redo(); }},
       {"OpenSegment",
        "&Open Segment",
        {QKeySequence(Qt::CTRL | Qt::Key_E)},

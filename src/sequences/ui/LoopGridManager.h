@@ -1,5 +1,7 @@
 #pragma once
 
+#include <QKeySequence>
+#include <QList>
 #include <QStringList>
 #include <functional>
 #include <memory>
@@ -29,6 +31,8 @@ class LoopGridManager : public GridManager {
  public:
   // The width of a loop lane, in cells.
   static constexpr int kLaneCells = 5;
+  // The least width of a port's column, in cells.
+  static constexpr int kPortCells = 10;
 
   explicit LoopGridManager(QWidget* parent = nullptr);
   ~LoopGridManager() override;
@@ -91,6 +95,9 @@ class LoopGridManager : public GridManager {
   int SetCellText(unsigned long block, int field, const QString& text);
   int Undo();
   int Redo();
+  // The keys that redo in the sequence editors, whatever the platform binds: Ctrl+Y and
+  // Ctrl+Shift+Z.
+  static QList<QKeySequence> RedoKeys();
   SequenceUndo* Steps() const { return mUndo.get(); }
 
   // The cell editor over the cursor's cell, holding `text` (the cell's text when null).

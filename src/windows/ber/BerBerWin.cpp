@@ -18,9 +18,9 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "support/ExportFile.h"
+#include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/BerAtStop.h"
-#include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
 
 namespace {
@@ -120,9 +120,9 @@ void BerBerWin::ShowResults() {
   for (int row = 0; row < static_cast<int>(results.size()); ++row) {
     const BerSvr::PortResult& r = results[static_cast<std::size_t>(row)];
     mTable->setItem(row, 0, Cell(PlaceName(r.port), false));
-    mTable->setItem(row, 1, Cell(GroupedCount(r.compared), true));
-    mTable->setItem(row, 2, Cell(GroupedCount(r.errors), true));
-    mTable->setItem(row, 3, Cell(r.compared == 0 ? QStringLiteral("–") : QString::number(r.ratio, 'E', 2), true));
+    mTable->setItem(row, 1, Cell(QString::fromStdString(NumberText::Grouped(r.compared)), true));
+    mTable->setItem(row, 2, Cell(QString::fromStdString(NumberText::Grouped(r.errors)), true));
+    mTable->setItem(row, 3, Cell(QString::fromStdString(NumberText::Ratio(r.errors, r.compared)), true));
     mTable->item(row, 2)->setForeground(r.errors > 0 ? QColor(0xb3, 0x26, 0x1e) : palette().color(QPalette::Text));
   }
   mShown = results;

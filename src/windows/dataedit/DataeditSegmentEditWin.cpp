@@ -98,40 +98,58 @@ void DataeditSegmentEditWin::BuildMenus() {
   using G = SegmentGridManager;
   const auto editable = [](G& g) { return g.IsFillPossible(); };
   const Command commands[] = {
-      {"&Segment", "Save", "&Save", QKeySequence(Qt::CTRL | Qt::ALT | Qt::Key_S),
+      {"&Segment", "Save", "&Save", QKeySequence::Save,
        [](G& g, ConditionList& l) { return g.SaveSegment(0, 0, l); }, [](G& g) { return g.IsDirty(); }},
-      {"&Segment", "SaveAs", "Save &As…", QKeySequence(), nullptr, [](G& g) { return g.GetSegmentDs() != nullptr; }},
-      {"&Segment", "ImportText", "&Import Text…", QKeySequence(), nullptr, [](G& g) { return g.GetSegmentDs() != nullptr; }},
+      {"&Segment", "SaveAs", "Save &As…", QKeySequence(), nullptr,
+       [](G& g) { return g.GetSegmentDs() != nullptr; }},
+      {"&Segment", "ImportText", "&Import Text…", QKeySequence(), nullptr,
+       [](G& g) { return g.GetSegmentDs() != nullptr; }},
       {"&Segment", "ExportText", "&Export Text…", QKeySequence(), nullptr, editable},
       {"&Segment", "ExportVcd", "Export &VCD…", QKeySequence(), nullptr, editable},
       {"&Edit", "Fill0", "Fill with &0", QKeySequence(Qt::CTRL | Qt::Key_L),
-       [](G& g, ConditionList& l) { g.SetFillState(0); return g.ModifyFill(l); }, editable},
+       [](G& g, ConditionList& l) {
+         g.SetFillState(0);
+         return g.ModifyFill(l);
+       },
+       editable},
       {"&Edit", "Fill1", "Fill with &1", QKeySequence(Qt::CTRL | Qt::Key_H),
-       [](G& g, ConditionList& l) { g.SetFillState(1); return g.ModifyFill(l); }, editable},
-      {"&Edit", "Invert", "&Invert", QKeySequence(Qt::CTRL | Qt::Key_I), [](G& g, ConditionList& l) { return g.ModifyInvert(l); },
-       [](G& g) { return g.IsInvertPossible(); }},
+       [](G& g, ConditionList& l) {
+         g.SetFillState(1);
+         return g.ModifyFill(l);
+       },
+       editable},
+      {"&Edit", "Invert", "&Invert", QKeySequence(Qt::CTRL | Qt::Key_I),
+       [](G& g, ConditionList& l) { return g.ModifyInvert(l); }, [](G& g) { return g.IsInvertPossible(); }},
       {"&Edit", "MirrorTraces", "Mirror &Traces", QKeySequence(),
-       [](G& g, ConditionList& l) { return g.ModifyMirror(MirrorMode::kTrace, l); }, [](G& g) { return g.IsMirrorPossible(); }},
+       [](G& g, ConditionList& l) { return g.ModifyMirror(MirrorMode::kTrace, l); },
+       [](G& g) { return g.IsMirrorPossible(); }},
       {"&Edit", "MirrorVectors", "Mirror &Vectors", QKeySequence(),
-       [](G& g, ConditionList& l) { return g.ModifyMirror(MirrorMode::kVector, l); }, [](G& g) { return g.IsMirrorPossible(); }},
+       [](G& g, ConditionList& l) { return g.ModifyMirror(MirrorMode::kVector, l); },
+       [](G& g) { return g.IsMirrorPossible(); }},
       {"&Edit", "Copy", "&Copy", QKeySequence::Copy, [](G& g, ConditionList& l) { return g.ModifyCopy(l); },
        [](G& g) { return g.IsCopyPossible(); }},
-      {"&Edit", "Paste", "&Paste", QKeySequence::Paste, [](G& g, ConditionList& l) { return g.ModifyPaste(l); }, nullptr},
+      {"&Edit", "Paste", "&Paste", QKeySequence::Paste,
+       [](G& g, ConditionList& l) { return g.ModifyPaste(l); }, nullptr},
       {"&Edit", "PasteText", "Paste &Text", QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_V),
        [](G& g, ConditionList& l) { return g.PasteText(l); }, editable},
       {"&Edit", "InsertVectors", "I&nsert Vectors…", QKeySequence(Qt::Key_Insert), nullptr,
        [](G& g) { return g.IsInsertPossible(); }},
-      {"&Edit", "DeleteVectors", "&Delete Vectors", QKeySequence(Qt::Key_Delete), [](G& g, ConditionList& l) { return g.ModifyDelete(l); },
-       [](G& g) { return g.IsDeletePossible(); }},
-      {"&Edit", "InsertTraces", "Insert T&races…", QKeySequence(), nullptr, [](G& g) { return g.IsEditable(); }},
-      {"&Edit", "DeleteTraces", "Delete Tr&aces", QKeySequence(), [](G& g, ConditionList& l) { return g.DeleteTraces(l); },
+      {"&Edit", "DeleteVectors", "&Delete Vectors", QKeySequence(Qt::Key_Delete),
+       [](G& g, ConditionList& l) { return g.ModifyDelete(l); }, [](G& g) { return g.IsDeletePossible(); }},
+      {"&Edit", "InsertTraces", "Insert T&races…", QKeySequence(), nullptr,
        [](G& g) { return g.IsEditable(); }},
+      {"&Edit", "DeleteTraces", "Delete Tr&aces", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.DeleteTraces(l); }, [](G& g) { return g.IsEditable(); }},
       {"&Edit", "SerializeLsb", "Serialise, &Lowest Trace First", QKeySequence(),
-       [](G& g, ConditionList& l) { return g.ModifySerialize(Direction::kLsbFirst, l); }, [](G& g) { return g.IsSerializePossible(); }},
+       [](G& g, ConditionList& l) { return g.ModifySerialize(Direction::kLsbFirst, l); },
+       [](G& g) { return g.IsSerializePossible(); }},
       {"&Edit", "SerializeMsb", "Serialise, &Highest Trace First", QKeySequence(),
-       [](G& g, ConditionList& l) { return g.ModifySerialize(Direction::kMsbFirst, l); }, [](G& g) { return g.IsSerializePossible(); }},
-      {"&Edit", "Deserialize", "Deseriali&se…", QKeySequence(), nullptr, [](G& g) { return g.IsDeserializePossible(); }},
-      {"&Edit", "Coding", "C&onvert Coding…", QKeySequence(), nullptr, [](G& g) { return g.IsCodingPossible(); }},
+       [](G& g, ConditionList& l) { return g.ModifySerialize(Direction::kMsbFirst, l); },
+       [](G& g) { return g.IsSerializePossible(); }},
+      {"&Edit", "Deserialize", "Deseriali&se…", QKeySequence(), nullptr,
+       [](G& g) { return g.IsDeserializePossible(); }},
+      {"&Edit", "Coding", "C&onvert Coding…", QKeySequence(), nullptr,
+       [](G& g) { return g.IsCodingPossible(); }},
       {"&Edit", "SelectAll", "Select &All", QKeySequence::SelectAll,
        [](G& g, ConditionList& l) {
          long vectors = 0, digits = 0;
@@ -144,14 +162,18 @@ void DataeditSegmentEditWin::BuildMenus() {
        [](G& g, ConditionList& l) { return g.FindPattern(FindDirection::kNext, VectorTrace::kVector, l); },
        [](G& g) { return g.IsFindPossible(); }},
       {"&Go", "FindPrevious", "Find &Previous", QKeySequence(Qt::SHIFT | Qt::Key_F3),
-       [](G& g, ConditionList& l) { return g.FindPattern(FindDirection::kPrevious, VectorTrace::kVector, l); },
+       [](G& g, ConditionList& l) {
+         return g.FindPattern(FindDirection::kPrevious, VectorTrace::kVector, l);
+       },
        [](G& g) { return g.IsFindPossible(); }},
       {"&Go", "NextError", "Next &Error", QKeySequence(Qt::CTRL | Qt::Key_E),
-       [](G& g, ConditionList& l) { return g.MoveToError(ERR_DIR::kNext, l); }, [](G& g) { return g.CanMoveToError(ERR_DIR::kNext); }},
+       [](G& g, ConditionList& l) { return g.MoveToError(ERR_DIR::kNext, l); },
+       [](G& g) { return g.CanMoveToError(ERR_DIR::kNext); }},
       {"&Go", "PreviousError", "Pre&vious Error", QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_E),
        [](G& g, ConditionList& l) { return g.MoveToError(ERR_DIR::kPrevious, l); },
        [](G& g) { return g.CanMoveToError(ERR_DIR::kPrevious); }},
-      {"&Go", "Goto", "&Go to Vector…", QKeySequence(Qt::CTRL | Qt::Key_G), nullptr, [](G& g) { return g.CanShowGoto(); }},
+      {"&Go", "Goto", "&Go to Vector…", QKeySequence(Qt::CTRL | Qt::Key_G), nullptr,
+       [](G& g) { return g.CanShowGoto(); }},
   };
   auto* bar = new QMenuBar(this);
   layout()->setMenuBar(bar);
@@ -336,7 +358,6 @@ void DataeditSegmentEditWin::HitPButNew() {
   auto* length = dialog.Add(QStringLiteral("&Vectors"), new QSpinBox);
   length->setRange(1, 1 << 30);
   length->setValue(1024);
-  length->setGroupSeparatorShown(true);
   auto* width = dialog.Add(QStringLiteral("&Traces"), new QSpinBox);
   width->setRange(1, 4096);
   width->setValue(16);
@@ -451,7 +472,9 @@ QStringList DataeditSegmentEditWin::Codings() {
 
 void DataeditSegmentEditWin::HitGoto() {
   bool number = false;
-  const QString text = mGoto->text().trimmed();
+  // A number copied from a line of the window comes in groups of digits.
+  QString text = mGoto->text();
+  text.removeIf([](QChar c) { return c.isSpace(); });
   const long vector = mAddr->currentIndex() == 1 ? text.toLong(&number, 16) : text.toLong(&number, 10);
   if (!number) {
     mMessage->setText(QStringLiteral("\"%1\" is no vector number.").arg(text));

@@ -5,8 +5,8 @@
 #include <cmath>
 
 #include "segments/ui/GridDisp.h"
+#include "support/NumberText.h"
 #include "toolkit/qt/WidgetClassTable.h"
-#include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
 
 ErrStateGridManager::ErrStateGridManager(QWidget* parent) : GridManager(parent) {
@@ -18,7 +18,7 @@ void ErrStateGridManager::CppRegister() {
 }
 
 QString ErrStateGridManager::CountText(unsigned long long count) {
-  if (count < 10000) return QString::number(count);
+  if (count < 10000) return QString::fromStdString(NumberText::Grouped(count));
   static const char kUnits[] = "kMGTPE";
   auto value = static_cast<double>(count);
   int unit = -1;
@@ -58,7 +58,8 @@ QString ErrStateGridManager::CursorText() const {
   return QStringLiteral("%1, channel %2: %3 %4")
       .arg(PlaceName(port.port))
       .arg(mChannel)
-      .arg(GroupedCount(errors), errors == 1 ? QStringLiteral("error") : QStringLiteral("errors"));
+      .arg(QString::fromStdString(NumberText::Grouped(errors)),
+           errors == 1 ? QStringLiteral("error") : QStringLiteral("errors"));
 }
 
 long ErrStateGridManager::ChannelsOf(long line) const {
@@ -106,7 +107,8 @@ GridCell ErrStateGridManager::DispCell(const GridDisp& disp, long line, int cell
   GridCell out;
   const BerSvr::PortResult& port = mResults[static_cast<std::size_t>(line)];
   if (disp.GetKind() != GridDisp::Kind::kDigit) {
-    out.text = IsTotals(disp) ? GroupedCount(port.errors) : PlaceName(port.port);
+    out.text =
+        IsTotals(disp) ? QString::fromStdString(NumberText::Grouped(port.errors)) : PlaceName(port.port);
     out.marked = IsTotals(disp) && port.errors > 0;
     out.selected = line == mLine;
     return out;

@@ -13,6 +13,7 @@
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceCellEdit.h"
 #include "sequences/SequenceUndo.h"
+#include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/MainWin.h"
@@ -176,8 +177,8 @@ void SmseqeditWin::AddBlockActions() {
     int (SmseqeditWin::*step)(ConditionList&) = back ? &SmseqeditWin::Undo : &SmseqeditWin::Redo;
     auto* action = new QAction(back ? QStringLiteral("&Undo") : QStringLiteral("&Redo"), mTable);
     action->setObjectName(back ? QStringLiteral("Undo") : QStringLiteral("Redo"));
-    // Every key the platform has for it (Redo is Ctrl+Shift+Z and Ctrl+Y).
-    action->setShortcuts(back ? QKeySequence::Undo : QKeySequence::Redo);
+    // Redo has the loop grid's keys, so that both sequence editors answer the same.
+    action->setShortcuts(back ? QKeySequence::keyBindings(QKeySequence::Undo) : LoopGridManager::RedoKeys());
     action->setShortcutContext(Qt::WidgetShortcut);
     mTable->addAction(action);
     connect(action, &QAction::triggered, this, [this, step = step] {

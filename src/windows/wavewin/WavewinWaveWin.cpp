@@ -19,8 +19,8 @@
 #include "params/ui/BoundControl.h"
 #include "sequences/CPortInfo.h"
 #include "support/ConditionListLoader.h"
+#include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/GroupedNumber.h"
 #include "windows/PlaceName.h"
 #include "windows/TaskFollower.h"
 
@@ -164,10 +164,10 @@ void WavewinWaveWin::ShowCapture(const QString& emptyText) {
     return;
   }
   mSummary->setText(QStringLiteral("%1 vectors × %2 traces · clock period %3 · %4 error vectors")
-                        .arg(GroupedNumber(mData.GetLength()))
+                        .arg(QString::fromStdString(NumberText::Grouped(mData.GetLength())))
                         .arg(width)
                         .arg(TimeText(mData.GetPeriod()))
-                        .arg(GroupedNumber(mData.ErrorVectors())));
+                        .arg(QString::fromStdString(NumberText::Grouped(mData.ErrorVectors()))));
 }
 
 void WavewinWaveWin::ApplyBus() {
@@ -196,10 +196,18 @@ void WavewinWaveWin::ShowCursors() {
   const long b = mView->GetCursor(1);
   const double period = mData.GetPeriod();
   QStringList parts;
-  if (a >= 0) parts << QStringLiteral("A: %1 (%2)").arg(GroupedNumber(a), TimeText(static_cast<double>(a) * period));
-  if (b >= 0) parts << QStringLiteral("B: %1 (%2)").arg(GroupedNumber(b), TimeText(static_cast<double>(b) * period));
+  if (a >= 0)
+    parts << QStringLiteral("A: %1 (%2)")
+                 .arg(QString::fromStdString(NumberText::Grouped(a)),
+                      TimeText(static_cast<double>(a) * period));
+  if (b >= 0)
+    parts << QStringLiteral("B: %1 (%2)")
+                 .arg(QString::fromStdString(NumberText::Grouped(b)),
+                      TimeText(static_cast<double>(b) * period));
   if (a >= 0 && b >= 0) {
-    parts << QStringLiteral("B − A: %1 vectors = %2").arg(GroupedNumber(b - a), TimeText(static_cast<double>(b - a) * period));
+    parts << QStringLiteral("B − A: %1 vectors = %2")
+                 .arg(QString::fromStdString(NumberText::Grouped(b - a)),
+                      TimeText(static_cast<double>(b - a) * period));
   }
   mCursors->setText(parts.isEmpty() ? QStringLiteral("Click to set cursor A, right-click for cursor B.")
                                     : parts.join(QStringLiteral("    ")));
