@@ -18,6 +18,7 @@ int QenDsSTEd::Refresh(ConditionList& list) {
 }
 
 int QenDsSTEd::SendValue(ConditionList& list) {
+  if (isReadOnly()) return 0;
   setModified(false);
   // A refused text stays in the field for the user to correct.
   const int status = Binding().Write(false, text().toStdString(), list);
@@ -31,11 +32,10 @@ void QenDsSTEd::HitReturn() {
   Report(list);
 }
 
+// Leaving the field, or its window while it has the focus, writes the text as it stands.
 void QenDsSTEd::focusOutEvent(QFocusEvent* event) {
-  if (isModified()) {
-    ConditionList list;
-    SendValue(list);
-    Report(list);
-  }
+  ConditionList list;
+  SendValue(list);
+  Report(list);
   QLineEdit::focusOutEvent(event);
 }

@@ -4,8 +4,8 @@
 
 #include "params/ui/BoundControl.h"
 
-// A one-line text field bound to a parameter. The text is written as it stands on Return,
-// and on focus loss (or when its window is left) after the user changed it.
+// A one-line text field bound to a parameter. The text is written as it stands on Return, on
+// focus loss and when its window is left while it has the focus; a read-only one never writes.
 class QenDsSTEd : public QLineEdit, public BoundControl {
   Q_OBJECT
   Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)

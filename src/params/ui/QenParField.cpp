@@ -29,7 +29,7 @@ void QenParField::NfyInit() {
   mSpin->ShowText(QString());
   mUnitLabel->NfyInit();
   mUnitLabel->setVisible(mShowUnits);
-  SetEnabledComplete(mIsEnabled);
+  SetIsEnabled(mIsEnabled);
   BoundControl::NfyInit();
 }
 
@@ -70,7 +70,8 @@ void QenParField::SetEnabledComplete(bool enabled) {
 
 void QenParField::SetIsEnabled(bool enabled) {
   mIsEnabled = enabled;
-  // A field whose value may not be edited keeps its prefix and step changeable.
+  // A field whose value may not be edited keeps its prefix and step changeable, from the
+  // start as at run time.
   mSpin->setEnabled(enabled);
   mUnitLabel->setEnabled(true);
 }

@@ -4,6 +4,7 @@
 #include <QApplication>
 #include <QComboBox>
 #include <QDir>
+#include <QMenu>
 #include <QPluginLoader>
 #include <QPushButton>
 #include <QRadioButton>
@@ -13,6 +14,7 @@
 #include <memory>
 
 #include "common/gui/GuiSimFixture.h"
+#include "instrument/QenGuiInst.h"
 #include "params/ui/ParSpinBox.h"
 #include "params/ui/QenDsCBox.h"
 #include "params/ui/QenDsCBut.h"
@@ -49,7 +51,10 @@ class BoundControlsTest : public GuiSimFixture {
     QApplication::setActiveWindow(mForm.get());
   }
   void TearDown() override {
+    // The field with the focus commits as the form goes; its report is shown while this
+    // test's toolkit still runs, so that it does not stay pending for the next test.
     mForm.reset();
+    QCoreApplication::processEvents();
     GuiSimFixture::TearDown();
   }
   template <class T>
@@ -58,10 +63,22 @@ class BoundControlsTest : public GuiSimFixture {
     EXPECT_NE(widget, nullptr) << name;
     return widget;
   }
+  // A command on the library's own connection (a test-control command acts on its replies).
+  void Gui(const Dstring& cmd) {
+    Dstring reply;
+    ASSERT_EQ(QenGuiInst::Call(cmd, reply, mList), 0) << cmd << mList.ToText();
+  }
+  // From now on every reply to `header` on the library's connection is `text`.
+  void Garble(const Dstring& header, const Dstring& text) {
+    Dstring quoted;
+    for (char c : text) quoted += c == '"' ? Dstring("\"\"") : Dstring(1, c);
+    Gui(":TEST:MALF \"" + header + "?\",\"" + quoted + "\",0");
+  }
   // Types `text` over the field's text and presses `key`.
   void Type(QenParField* field, const QString& text, Qt::Key key = Qt::Key_Return) {
     field->Editor()->setFocus();
     QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+    QTest::keyClick(field->Editor(), Qt::Key_Backspace);
     QTest::keyClicks(field->Editor(), text);
     QTest::keyClick(field->Editor(), key);
     QCoreApplication::processEvents();
@@ -216,6 +233,84 @@ TEST_F(BoundControlsTest, TheWheelLeavesAnUnfocusedControlAlone) {
   QApplication::sendEvent(Find<QenDsCBox>("boxTrigger"), &wheel);
   EXPECT_DOUBLE_EQ(OtherNumber(":CGR1:MOD1:CONN1:VOLT:OFFS"), 0.5);
   EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ");
+}
+
+TEST_F(BoundControlsTest, ThePlainUnitKeepsItsBlankInTheMenuAndTheDialog) {
+  auto* ampl = Find<QenParEd>("fieldAmpl");
+  std::unique_ptr<QMenu> menu(ampl->GetUnitLabel()->BuildPopupMenu(nullptr));
+  QStringList shown;
+  for (QAction* item : menu->actions().first()->menu()->actions()) {
+    if (item->isVisible()) shown << item->text();
+  }
+  EXPECT_EQ(shown.join('|'), " V|mV");
+  UnitsDialog dialog("unitsdlg");
+  UnitsRecord units = ampl->State().GetUnits();
+  dialog.NfyInit(units);
+  EXPECT_EQ(dialog.findChild<QRadioButton*>("RBut1Unit")->text(), " V");
+  EXPECT_EQ(dialog.findChild<QRadioButton*>("RButUnitMilli")->text(), "mV");
+}
+
+TEST_F(BoundControlsTest, AComboBoxWithNoValueSaysSoAndKeepsItsChoice) {
+  auto* box = Find<QenDsCBox>("boxTrigger");
+  ASSERT_EQ(box->currentIndex(), 0);
+  for (const char* mark : {"CLAS", "9.91E37"}) {
+    Garble(":TRIG:MODE", mark);
+    Other(":TRIG:MODE CLOC");
+    Poll();
+    EXPECT_EQ(box->ShownText(), "<No Value>") << mark;
+    EXPECT_EQ(box->currentIndex(), 0) << mark;
+    Other(":TRIG:MODE SEQ");
+  }
+  Garble(":TRIG:MODE", "CLOC");
+  Other(":TRIG:MODE CLOC");
+  Poll();
+  EXPECT_EQ(box->ShownText(), "Clock");
+  EXPECT_EQ(box->currentIndex(), 1);
+}
+
+// The text goes out as it stands when the field is left, edited or not, and when its window
+// goes to the background while the field has the focus.
+TEST_F(BoundControlsTest, ATextFieldWritesItsTextWhenLeft) {
+  auto* text = new QenDsSTEd(mForm.get());
+  text->setProperty("DsCmdName", QStringLiteral(":TRIG:MODE"));
+  text->NfyInit();
+  ASSERT_EQ(text->SetDsBaseName(":" + mHandle, mList), 0) << mList.ToText();
+  text->show();
+  ASSERT_EQ(text->text(), "SEQ");
+  Other(":TRIG:MODE CLOC");
+  text->setFocus();
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ") << "focus loss";
+  Other(":TRIG:MODE CLOC");
+  text->setFocus();
+  QWidget elsewhere;
+  elsewhere.show();
+  QApplication::setActiveWindow(&elsewhere);
+  EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ") << "window left";
+  EXPECT_TRUE(mAlerts.empty());
+}
+
+// A read-only text field never writes, however it is left.
+TEST_F(BoundControlsTest, AReadOnlyTextFieldNeverWrites) {
+  auto* text = Find<QenDsSTEd>("textType");
+  text->setFocus();
+  QTest::keyClick(text, Qt::Key_Return);
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  QCoreApplication::processEvents();
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}
+
+TEST(QenParFieldTest, ClearedIsEnabledAtInitLeavesTheUnitLabelEnabled) {
+  EnsureApplication();
+  QenParEd field;
+  field.setProperty("IsEnabled", false);
+  field.NfyInit();
+  EXPECT_FALSE(field.Editor()->isEnabled());
+  EXPECT_TRUE(field.GetUnitLabel()->isEnabled());
+  field.SetIsEnabled(true);
+  field.SetIsEnabled(false);
+  EXPECT_FALSE(field.Editor()->isEnabled());
+  EXPECT_TRUE(field.GetUnitLabel()->isEnabled());
 }
 
 TEST_F(BoundControlsTest, MissingAndBrokenResourcesAreNamed) {
