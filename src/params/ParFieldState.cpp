@@ -18,16 +18,21 @@ int ParFieldState::ReadValue(DsBinding& binding, ConditionList& list) {
   Dstring reply;
   if (int status = binding.Query(false, reply, list)) return status;
   if (binding.GetDs() == nullptr) return 0;
+  mValueFailure.clear();
   if (ValueText::IsNoValue(reply)) {
     mNoValue = true;
     mAskPending = false;
+    ShowReadFailure(binding);
     return 0;
   }
   const double value = ValueText::ReadReplyNumber(reply);
   if (std::isnan(value)) {
     ConditionListLoader::ConditionToken(list, "GUI_PARED_BAD_VALUE", {binding.GetDsName(), reply}, 1);
+    mValueFailure = list.Last().GetMessage();
+    ShowReadFailure(binding);
     return 1;
   }
+  ShowReadFailure(binding);
   mValue = value;
   mNoValue = false;
   mLastSent = ValueText::FormatSent(value);
@@ -43,9 +48,20 @@ int ParFieldState::ReadUnits(DsBinding& binding, ConditionList& list) {
   Dstring reply;
   if (int status = binding.GetAttrDs()->QueryStrValue(reply, list)) return status;
   UnitsRecord read = mUnits;
-  if (int status = read.Parse(reply, list)) return status;
-  mUnits = read;
-  return 0;
+  mUnitsFailure.clear();
+  const std::size_t before = list.Size();
+  const int status = read.Parse(reply, list);
+  if (status != 0) {
+    mUnitsFailure = list.Size() > before ? list.Last().GetMessage() : reply;
+  } else {
+    mUnits = read;
+  }
+  ShowReadFailure(binding);
+  return status;
+}
+
+void ParFieldState::ShowReadFailure(DsBinding& binding) const {
+  binding.SetReadFailure(mValueFailure.empty() ? mUnitsFailure : mValueFailure);
 }
 
 Dstring ParFieldState::DisplayText() const {
@@ -53,7 +69,7 @@ Dstring ParFieldState::DisplayText() const {
 }
 
 int ParFieldState::AdjustAndSend(const Dstring& text, int steps, DsBinding& binding, ConditionList& list) {
-  if (text.Trimmed().empty()) return 0;
+  if (text.empty()) return 0;
   const double scale = std::pow(10.0, DisplayExp());
   const double typed = ValueText::ReadLeadingNumber(text);
   const double value = typed * scale + steps * scale * mUnits.step;

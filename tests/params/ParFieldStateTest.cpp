@@ -68,8 +68,13 @@ TEST_F(ParFieldStateTest, NothingIsSentForAnUnchangedOrEmptyText) {
   const std::size_t sent = Inst().Sent().size();
   EXPECT_EQ(mField.mState.AdjustAndSend("2", 0, mField.mBinding, mList), 0);
   EXPECT_EQ(mField.mState.AdjustAndSend("2 mV", 0, mField.mBinding, mList), 0);
-  EXPECT_EQ(mField.mState.AdjustAndSend("   ", 0, mField.mBinding, mList), 0);
+  EXPECT_EQ(mField.mState.AdjustAndSend("", 0, mField.mBinding, mList), 0);
   EXPECT_EQ(Inst().Sent().size(), sent);
+  // Blanks are text, not an empty field: they hold no number, which reads as 0.
+  ExpectWrite(":_H:VOLT 0.000000000000E+000");
+  ExpectRead(":_H:VOLT", "0.000000000000E+000");
+  EXPECT_EQ(mField.mState.AdjustAndSend("   ", 0, mField.mBinding, mList), 0);
+  EXPECT_EQ(mField.mState.GetLastSent(), "0.000000000000E+000");
 }
 
 TEST_F(ParFieldStateTest, TextWithoutANumberSendsZeroAndAHugeOneNothing) {
@@ -109,6 +114,22 @@ TEST_F(ParFieldStateTest, AMalformedAttributeKeepsTheRecord) {
   EXPECT_NE(mList[0].GetMessage().find("oops"), Dstring::npos);
   EXPECT_EQ(mField.mState.GetUnits().curExp, UnitsRecord::kExpNotSet);
   EXPECT_EQ(mField.mState.DisplayText(), "0.001");
+  EXPECT_TRUE(mField.mBinding.IsFailed());
+  EXPECT_NE(mField.mBinding.GetReadFailure().find("oops"), Dstring::npos);
+  ExpectRead(":_H:VOLT:ATTR", "(\"V\",-3,0,-3,0.100000d)");
+  EXPECT_EQ(Dte::UpdateDsByName(":_H:VOLT:ATTR", mList), 0) << mList.ToText();
+  EXPECT_FALSE(mField.mBinding.IsFailed());
+}
+
+TEST_F(ParFieldStateTest, AValueThatIsNoNumberIsKeptAndNamed) {
+  Bind("1.000000000000E+000", "(\"V\",-3,0,0,0.100000d)");
+  ExpectRead(":_H:VOLT", "1.5V");
+  EXPECT_EQ(Dte::UpdateDsByName(":_H:VOLT", mList), 1);
+  EXPECT_DOUBLE_EQ(mField.mState.GetValue(), 1.0);
+  EXPECT_NE(mField.mBinding.ToolTip().find("\"1.5V\""), Dstring::npos) << mField.mBinding.ToolTip();
+  ExpectRead(":_H:VOLT", "9.91E37");
+  EXPECT_EQ(Dte::UpdateDsByName(":_H:VOLT", mList), 0);
+  EXPECT_EQ(mField.mBinding.GetReadFailure(), "");
 }
 
 TEST_F(ParFieldStateTest, LockDuringACommitIsPassedUpWithoutACondition) {

@@ -65,6 +65,8 @@ class QenParField : public QWidget, public BoundControl {
 
  private:
   void Commit(int steps);
+  // Marks the field when the instrument holds another value than the one just asked.
+  void ShowAdjusted();
 
   ParFieldState mState;
   ParSpinBox* mSpin;

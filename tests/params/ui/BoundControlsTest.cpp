@@ -74,6 +74,9 @@ class BoundControlsTest : public GuiSimFixture {
     for (char c : text) quoted += c == '"' ? Dstring("\"\"") : Dstring(1, c);
     Gui(":TEST:MALF \"" + header + "?\",\"" + quoted + "\",0");
   }
+  static bool ShowsFailed(const QenParField* field) {
+    return field->Editor()->palette().color(QPalette::Base) == field->mBgColorFailed;
+  }
   // Types `text` over the field's text and presses `key`.
   void Type(QenParField* field, const QString& text, Qt::Key key = Qt::Key_Return) {
     field->Editor()->setFocus();
@@ -250,6 +253,19 @@ TEST_F(BoundControlsTest, ThePlainUnitKeepsItsBlankInTheMenuAndTheDialog) {
   EXPECT_EQ(dialog.findChild<QRadioButton*>("RButUnitMilli")->text(), "mV");
 }
 
+// The label and the text stay as they were; the field shows that the attribute failed, and why.
+TEST_F(BoundControlsTest, AMalformedUnitAttributeLeavesLabelAndText) {
+  auto* ampl = Find<QenParEd>("fieldAmpl");
+  Garble(Dstring(kAmpl) + ":ATTR", "(\"V\",oops,0,-3,0.1d)");
+  Other(Dstring(kAmpl) + " 2.5");
+  Other(Dstring(kAmpl) + ":ATTR (\"V\",-3,0,-3,0.1d)");
+  Poll();
+  EXPECT_EQ(ampl->Editor()->Text(), "1");
+  EXPECT_EQ(ampl->GetUnitLabel()->text(), " V");
+  EXPECT_TRUE(ShowsFailed(ampl));
+  EXPECT_NE(ampl->toolTip().indexOf("oops"), -1) << ampl->toolTip().toStdString();
+}
+
 TEST_F(BoundControlsTest, AComboBoxWithNoValueSaysSoAndKeepsItsChoice) {
   auto* box = Find<QenDsCBox>("boxTrigger");
   ASSERT_EQ(box->currentIndex(), 0);
@@ -311,6 +327,43 @@ TEST(QenParFieldTest, ClearedIsEnabledAtInitLeavesTheUnitLabelEnabled) {
   field.SetIsEnabled(false);
   EXPECT_FALSE(field.Editor()->isEnabled());
   EXPECT_TRUE(field.GetUnitLabel()->isEnabled());
+}
+
+TEST_F(BoundControlsTest, AClearedFieldShowsTheInstrumentsValueAgain) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  for (Qt::Key key : {Qt::Key_Tab, Qt::Key_Return}) {
+    Type(field, "", key);
+    EXPECT_EQ(field->Editor()->Text(), "1") << key;
+  }
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.0);
+}
+
+// Typed text and a step: the field shows the value stepped from the typed one, as sent.
+TEST_F(BoundControlsTest, AStepAfterTypingShowsTheValueSent) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  field->Editor()->setFocus();
+  QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+  QTest::keyClicks(field->Editor(), "2");
+  QTest::keyClick(field->Editor(), Qt::Key_Up);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 2.1);
+  EXPECT_EQ(field->Editor()->Text(), "2.1");
+}
+
+TEST_F(BoundControlsTest, AValueTheFieldCannotReadIsShownFailedWithTheReason) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  ASSERT_FALSE(ShowsFailed(field));
+  Garble(kAmpl, "abc");
+  Other(Dstring(kAmpl) + " 2.5");
+  Poll();
+  EXPECT_EQ(field->Editor()->Text(), "1");
+  EXPECT_TRUE(ShowsFailed(field));
+  EXPECT_NE(field->toolTip().indexOf("\"abc\""), -1) << field->toolTip().toStdString();
+  Garble(kAmpl, "2.5");
+  Other(Dstring(kAmpl) + " 2");
+  Poll();
+  EXPECT_EQ(field->Editor()->Text(), "2.5");
+  EXPECT_FALSE(ShowsFailed(field));
+  EXPECT_EQ(field->toolTip().indexOf("abc"), -1);
 }
 
 TEST_F(BoundControlsTest, MissingAndBrokenResourcesAreNamed) {
