@@ -3,6 +3,7 @@
 #include <cmath>
 
 #include "data/QenParamDs.h"
+#include "instrument/QenStatus.h"
 #include "params/DsBinding.h"
 #include "params/ValueText.h"
 #include "support/ConditionListLoader.h"
@@ -69,6 +70,7 @@ Dstring ParFieldState::DisplayText() const {
 }
 
 int ParFieldState::AdjustAndSend(const Dstring& text, int steps, DsBinding& binding, ConditionList& list) {
+  mNotice.clear();
   if (text.empty()) return 0;
   const double scale = std::pow(10.0, DisplayExp());
   const double typed = ValueText::ReadLeadingNumber(text);
@@ -78,11 +80,33 @@ int ParFieldState::AdjustAndSend(const Dstring& text, int steps, DsBinding& bind
     return 1;
   }
   const Dstring sent = ValueText::FormatSent(value);
-  if (DsBinding::IsDesignMode() || sent == mLastSent || binding.GetDs() == nullptr) return 0;
+  if (DsBinding::IsDesignMode() || binding.GetDs() == nullptr) return 0;
+  if (sent == mLastSent) {
+    mNotice = MakeNotice(text, value, false);
+    return 0;
+  }
   mLastSent = sent;
   mAsked = value;
   mAskPending = true;
-  return binding.Write(false, sent, list);
+  const Dstring notice = MakeNotice(text, value, true);
+  const int status = binding.Write(false, sent, list);
+  // A write the lock refused did nothing, and says nothing.
+  if (status != QenStatus::kLocked) mNotice = notice;
+  return status;
+}
+
+Dstring ParFieldState::MakeNotice(const Dstring& text, double value, bool sent) const {
+  const std::size_t end = ValueText::LeadingNumberLength(text);
+  const Dstring after(text.substr(end));
+  Dstring ignored = after.Trimmed();
+  const Dstring unit = mUnits.LabelText().Trimmed();
+  if (end > 0 && (ignored.empty() || ignored == unit)) return {};
+  if (ignored.empty()) ignored = after;
+  const Dstring shown = ValueText::FormatDisplay(value, DisplayExp()) + (unit.empty() ? "" : " " + unit);
+  Dstring notice = sent ? shown + " sent" : "nothing sent, " + shown + " is already set";
+  notice += "; \"" + ignored + "\" ignored";
+  if (!unit.empty()) notice += ": this field is in " + unit;
+  return notice;
 }
 
 bool ParFieldState::TakeAdjusted(double& asked, double& held) {

@@ -26,6 +26,10 @@ class ParFieldState {
   // nothing and give 0; a number too large for a double adds "GUI_PARED_BAD_NUMBER". Text
   // without a number reads as 0, and anything after the number is ignored.
   int AdjustAndSend(const Dstring& text, int steps, DsBinding& binding, ConditionList& list);
+  // What the last AdjustAndSend made of text it could not take whole: "2 MHz sent; "G"
+  // ignored: this field is in MHz". Empty when the text was a number, alone or followed by the
+  // field's own unit, and when nothing was read.
+  const Dstring& GetNotice() const { return mNotice; }
 
   // After a read that followed a write: whether the server holds another value than the one
   // asked (clamped or rounded). Cleared by the call.
@@ -39,6 +43,7 @@ class ParFieldState {
   int DisplayExp() const { return mUnits.curExp == UnitsRecord::kExpNotSet ? 0 : mUnits.curExp; }
 
  private:
+  Dstring MakeNotice(const Dstring& text, double value, bool sent) const;
   void ShowReadFailure(DsBinding& binding) const;
 
   UnitsRecord mUnits;
@@ -48,6 +53,7 @@ class ParFieldState {
   bool mAskPending = false;
   bool mAdjusted = false;
   double mAsked = 0.0;
+  Dstring mNotice;
   Dstring mValueFailure;
   Dstring mUnitsFailure;
 };

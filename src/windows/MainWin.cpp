@@ -21,6 +21,7 @@
 #include "settings/SettingFile.h"
 #include "support/ConditionList.h"
 #include "toolkit/WaitCursor.h"
+#include "toolkit/qt/StatusNotice.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -28,6 +29,8 @@
 namespace {
 
 constexpr const char* kResourceProperty = "qenResource";
+// Long enough to read a sentence after the commit that caused it.
+constexpr int kNoticeMs = 15000;
 
 void Show(ConditionList& list) {
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
@@ -65,6 +68,7 @@ MainWin::MainWin(QWidget* parent)
   layout->addWidget(mArea, 1);
   setCentralWidget(central);
   setStatusBar(mStatus);
+  StatusNotice::Install([this](const QString& text) { mStatus->showMessage(text, kNoticeMs); });
   BuildMenus();
   resize(1280, 800);
   UpdateTitle();
@@ -84,6 +88,7 @@ class MainWin::SelfTestTool : public SelfTest::Tool {
 };
 
 MainWin::~MainWin() {
+  StatusNotice::Install({});
   if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
   if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
     ConditionList list;

@@ -99,6 +99,7 @@ void QenParField::Commit(int steps) {
   } else if (Binding().GetDs() != nullptr) {
     DisplayValue(mState.GetValue());
   }
+  ShowNotice(QString::fromStdString(mState.GetNotice()));
   Report(list);
 }
 

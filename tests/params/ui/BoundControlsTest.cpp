@@ -26,6 +26,7 @@
 #include "params/ui/UnitLabel.h"
 #include "params/ui/UnitsDialog.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "toolkit/qt/StatusNotice.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
 namespace {
@@ -364,6 +365,45 @@ TEST_F(BoundControlsTest, AValueTheFieldCannotReadIsShownFailedWithTheReason) {
   EXPECT_EQ(field->Editor()->Text(), "2.5");
   EXPECT_FALSE(ShowsFailed(field));
   EXPECT_EQ(field->toolTip().indexOf("abc"), -1);
+}
+
+// The leading number is sent; what follows it, or text without a number, is said on the field
+// and in the status bar until the field's next commit.
+TEST_F(BoundControlsTest, TextACommitLeavesOutIsSaid) {
+  QStringList notices;
+  StatusNotice::Install([&notices](const QString& text) { notices << text; });
+  const struct {
+    const char* field;
+    const char* typed;
+    const char* header;
+    double held;
+    const char* notice;
+  } kCases[] = {
+      {"fieldFreq", "2G", ":CGR1:FREQ", 2e6, "2 MHz sent; \"G\" ignored: this field is in MHz"},
+      {"fieldAmpl", "0.5m", kAmpl, 0.5, "0.5 V sent; \"m\" ignored: this field is in V"},
+      {"fieldAmpl", "2 V", kAmpl, 2.0, ""},
+      {"fieldFreq", "abc", ":CGR1:FREQ", 2e6, "0 MHz sent; \"abc\" ignored: this field is in MHz"},
+  };
+  for (const auto& c : kCases) {
+    auto* field = Find<QenParField>(c.field);
+    notices.clear();
+    Type(field, QString::fromLatin1(c.typed));
+    const QString notice = QString::fromLatin1(c.notice);
+    EXPECT_DOUBLE_EQ(OtherNumber(c.header), c.held) << c.typed;
+    EXPECT_EQ(field->Notice(), notice) << c.typed;
+    EXPECT_EQ(notices, notice.isEmpty() ? QStringList() : QStringList{notice}) << c.typed;
+    EXPECT_TRUE(field->toolTip().startsWith(notice)) << field->toolTip().toStdString();
+  }
+  // 0 MHz is below the instrument's limit: refused, and the field shows the value it holds.
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find("-222"), Dstring::npos) << mAlerts[0];
+  auto* freq = Find<QenParField>("fieldFreq");
+  EXPECT_EQ(freq->Editor()->Text(), "2");
+  Type(freq, "3");
+  EXPECT_EQ(freq->Notice(), "");
+  EXPECT_EQ(freq->toolTip().indexOf("ignored"), -1);
+  StatusNotice::Install({});
 }
 
 TEST_F(BoundControlsTest, MissingAndBrokenResourcesAreNamed) {
