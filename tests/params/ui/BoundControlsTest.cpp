@@ -78,6 +78,15 @@ class BoundControlsTest : public GuiSimFixture {
   static bool ShowsFailed(const QenParField* field) {
     return field->Editor()->palette().color(QPalette::Base) == field->mBgColorFailed;
   }
+  // A text field over the trigger mode, added to the form.
+  QenDsSTEd* TriggerText() {
+    auto* text = new QenDsSTEd(mForm.get());
+    text->setProperty("DsCmdName", QStringLiteral(":TRIG:MODE"));
+    text->NfyInit();
+    EXPECT_EQ(text->SetDsBaseName(":" + mHandle, mList), 0) << mList.ToText();
+    text->show();
+    return text;
+  }
   // Types `text` over the field's text and presses `key`.
   void Type(QenParField* field, const QString& text, Qt::Key key = Qt::Key_Return) {
     field->Editor()->setFocus();
@@ -288,11 +297,7 @@ TEST_F(BoundControlsTest, AComboBoxWithNoValueSaysSoAndKeepsItsChoice) {
 // The text goes out as it stands when the field is left, edited or not, and when its window
 // goes to the background while the field has the focus.
 TEST_F(BoundControlsTest, ATextFieldWritesItsTextWhenLeft) {
-  auto* text = new QenDsSTEd(mForm.get());
-  text->setProperty("DsCmdName", QStringLiteral(":TRIG:MODE"));
-  text->NfyInit();
-  ASSERT_EQ(text->SetDsBaseName(":" + mHandle, mList), 0) << mList.ToText();
-  text->show();
+  QenDsSTEd* text = TriggerText();
   ASSERT_EQ(text->text(), "SEQ");
   Other(":TRIG:MODE CLOC");
   text->setFocus();
@@ -305,6 +310,26 @@ TEST_F(BoundControlsTest, ATextFieldWritesItsTextWhenLeft) {
   QApplication::setActiveWindow(&elsewhere);
   EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ") << "window left";
   EXPECT_TRUE(mAlerts.empty());
+}
+
+// A refused text stays for correcting; leaving the field (as the error dialog takes the focus)
+// does not send it again, a changed text goes out.
+TEST_F(BoundControlsTest, ARefusedTextIsNotSentAgainUntilChanged) {
+  QenDsSTEd* text = TriggerText();
+  text->setFocus();
+  text->selectAll();
+  QTest::keyClicks(text, "SIDEWAYS");
+  QTest::keyClick(text, Qt::Key_Return);
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_EQ(mAlerts[0].find("ERROR", mAlerts[0].find("ERROR") + 1), Dstring::npos) << mAlerts[0];
+  EXPECT_EQ(text->text(), "SIDEWAYS");
+  text->setFocus();
+  text->selectAll();
+  QTest::keyClicks(text, "CLOC");
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  EXPECT_EQ(Other(":TRIG:MODE?"), "CLOC");
 }
 
 // A read-only text field never writes, however it is left.
