@@ -142,17 +142,6 @@ TEST_F(ParFieldStateTest, AMalformedAttributeKeepsTheRecord) {
   EXPECT_FALSE(mField.mBinding.IsFailed());
 }
 
-TEST_F(ParFieldStateTest, AValueThatIsNoNumberIsKeptAndNamed) {
-  Bind("1.000000000000E+000", "(\"V\",-3,0,0,0.100000d)");
-  ExpectRead(":_H:VOLT", "1.5V");
-  EXPECT_EQ(Dte::UpdateDsByName(":_H:VOLT", mList), 1);
-  EXPECT_DOUBLE_EQ(mField.mState.GetValue(), 1.0);
-  EXPECT_NE(mField.mBinding.ToolTip().find("\"1.5V\""), Dstring::npos) << mField.mBinding.ToolTip();
-  ExpectRead(":_H:VOLT", "9.91E37");
-  EXPECT_EQ(Dte::UpdateDsByName(":_H:VOLT", mList), 0);
-  EXPECT_EQ(mField.mBinding.GetReadFailure(), "");
-}
-
 TEST_F(ParFieldStateTest, LockDuringACommitIsPassedUpWithoutACondition) {
   Bind("1.000000000000E+000", "(\"V\",-3,0,0,0.100000d)");
   Inst().Expect(":_H:VOLT 3.000000000000E+000", "", QenStatus::kLocked);
