@@ -74,6 +74,7 @@ int DsBinding::Rename(Dstring& attribute, const Dstring& text, const char* op, C
   if (int status = Unregister(list)) return status;
   attribute = text;
   mLastError.clear();
+  mReadFailure.clear();
   return Register(list);
 }
 
@@ -126,6 +127,7 @@ int DsBinding::Write(bool subCmd, const Dstring& text, ConditionList& list) {
 }
 
 bool DsBinding::IsFailed() const {
+  if (!mReadFailure.empty()) return true;
   const QenParamDs* ds = GetDs();
   return ds != nullptr && ds->IsFailed() != 0;
 }
@@ -138,7 +140,11 @@ bool DsBinding::IsClashing() const {
 Dstring DsBinding::ToolTip() const {
   if (!IsBound()) return {};
   Dstring tip = GetDsName();
-  if (IsFailed() && !mLastError.empty()) tip += "\n" + mLastError;
+  if (!mReadFailure.empty()) {
+    tip += "\n" + mReadFailure;
+  } else if (IsFailed() && !mLastError.empty()) {
+    tip += "\n" + mLastError;
+  }
   return tip;
 }
 

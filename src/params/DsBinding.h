@@ -62,11 +62,16 @@ class DsBinding : public QenDsView {
   // Writes with the wait cursor shown; remembers the text asked for.
   int Write(bool subCmd, const Dstring& text, ConditionList& list);
 
+  // Failed: the source failed, or the control could not read its reply.
   bool IsFailed() const;
   bool IsClashing() const;
   // The text of the last failure of this control's own query or write, empty after success.
   const Dstring& GetLastError() const { return mLastError; }
-  // What the control shows on hover: the header, and the last error when failed.
+  // Why the control could not read the reply it got (empty when it could); the control shows
+  // as failed meanwhile. Moving the registration clears it.
+  void SetReadFailure(const Dstring& why) { mReadFailure = why; }
+  const Dstring& GetReadFailure() const { return mReadFailure; }
+  // What the control shows on hover: the header, and while failed, why.
   Dstring ToolTip() const;
 
   int NfyViewRegistered(QenDs* source, ConditionList& list) override;
@@ -85,6 +90,7 @@ class DsBinding : public QenDsView {
   Dstring mBaseName;
   Dstring mCmdName;
   Dstring mLastError;
+  Dstring mReadFailure;
   unsigned mFlag = 0;
   bool mInitialised = false;
   bool mRegistered = false;

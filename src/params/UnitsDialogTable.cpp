@@ -2,14 +2,8 @@
 
 const std::array<UnitsDialogTable::PrefixButton, 8>& UnitsDialogTable::PrefixButtons() {
   static const std::array<PrefixButton, 8> kButtons = {{
-      {"RButUnitGiga", "G", 9},
-      {"RButUnitMega", "M", 6},
-      {"RButUnitKilo", "k", 3},
-      {"RBut1Unit", "", 0},
-      {"RButUnitMilli", "m", -3},
-      {"RButUnitMicro", "u", -6},
-      {"RButUnitNano", "n", -9},
-      {"RButUnitPico", "p", -12},
+      {"RButUnitGiga", 9},  {"RButUnitMega", 6},  {"RButUnitKilo", 3},  {"RBut1Unit", 0},
+      {"RButUnitMilli", -3}, {"RButUnitMicro", -6}, {"RButUnitNano", -9}, {"RButUnitPico", -12},
   }};
   return kButtons;
 }

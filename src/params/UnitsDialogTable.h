@@ -6,9 +6,9 @@
 // The buttons of the units dialog and the values they stand for.
 class UnitsDialogTable {
  public:
+  // Labelled with the prefix of its exponent (UnitsRecord::PrefixOf) and the unit.
   struct PrefixButton {
     const char* name;
-    const char* prefix;
     std::int32_t exp;
   };
   struct StepButton {

@@ -53,12 +53,17 @@ Dstring ValueText::FormatDisplay(double value, std::int32_t curExp) {
 
 Dstring ValueText::FormatSent(double value) { return Dstring::Format("%.12E", value); }
 
-double ValueText::ReadLeadingNumber(const Dstring& text) {
+std::size_t ValueText::LeadingNumberLength(const Dstring& text) {
   std::size_t start = 0;
   while (start < text.size() && std::isspace(static_cast<unsigned char>(text[start]))) ++start;
   const std::size_t end = LeadingNumberEnd(text, start);
-  if (end == start) return 0.0;
-  const double value = std::strtod(text.substr(start, end - start).c_str(), nullptr);
+  return end == start ? 0 : end;
+}
+
+double ValueText::ReadLeadingNumber(const Dstring& text) {
+  const std::size_t end = LeadingNumberLength(text);
+  if (end == 0) return 0.0;
+  const double value = std::strtod(text.substr(0, end).c_str(), nullptr);
   return std::isfinite(value) ? value : std::numeric_limits<double>::quiet_NaN();
 }
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 
 #include "support/Dstring.h"
@@ -18,6 +19,8 @@ class ValueText {
   // The longest leading decimal floating number of `text` (blanks first are skipped); 0 when
   // there is none, NaN when it overflows a double. A typed unit after the number is ignored.
   static double ReadLeadingNumber(const Dstring& text);
+  // Where that number ends in `text` (the blanks before it counted); 0 when there is none.
+  static std::size_t LeadingNumberLength(const Dstring& text);
   // Whether a reply reads as the no-value mark ("CLAS", or the number 9.91e37).
   static bool IsNoValue(const Dstring& reply);
   // The number of a reply, or NaN when it has none.

@@ -171,7 +171,12 @@ int QenSegmentDs::GetStateWidth(long& bits, ConditionList& list, bool force) {
   }
   Dstring coding;
   if (int status = GetCoding(coding, list, true)) return status;
-  bits = SegmentBuffer::StateWidthOf(coding);
+  // An empty coding leaves the width as it was.
+  if (!coding.empty()) {
+    bits = SegmentBuffer::StateWidthOf(coding);
+  } else if (First() && First()->mHasDimension) {
+    bits = First()->mStateWidth;
+  }
   return SegmentStatus::kOk;
 }
 

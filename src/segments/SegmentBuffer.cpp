@@ -58,11 +58,9 @@ int SegmentBuffer::ReadDimension(ConditionList& list) {
   if (int status = mSegment->GetCoding(coding, list, true)) return status;
   if (int status = mSegment->GetLength(length, list, true)) return status;
   if (int status = mSegment->GetWidth(width, list, true)) return status;
-  // An empty coding leaves the states as they were.
-  if (!coding.empty()) {
-    mAlphabet = coding;
-    mStateWidth = StateWidthOf(coding);
-  }
+  // An empty coding leaves the state width as it was.
+  mAlphabet = coding;
+  if (!coding.empty()) mStateWidth = StateWidthOf(coding);
   mSegmentLength = length;
   mWidth = width;
   // The window stays inside the segment and within one block, so that it can always be

@@ -45,7 +45,9 @@ bool SegmentReply::FirstText(const Dstring& reply, Dstring& out) {
 
 bool SegmentReply::FirstItemText(const Dstring& reply, Dstring& out) {
   DataItem item;
-  if (!ItemAt(reply, 0, item) || item.GetText().empty()) return false;
+  if (!ItemAt(reply, 0, item)) return false;
+  // A quoted empty text is a coding of no characters; any other empty item is none.
+  if (item.GetText().empty() && item.GetType() != DataItemType::String) return false;
   out = Dstring(item.GetText());
   return true;
 }

@@ -15,7 +15,8 @@ class SegmentReply {
   // The first element of the reply parsed as a list, when it is a string or a word.
   static bool FirstText(const Dstring& reply, Dstring& out);
   // The text of the first element, whatever the item's type: a number keeps its text as
-  // written, so an unquoted coding 01 is "01". False when there is no such item.
+  // written, so an unquoted coding 01 is "01", and a quoted "" is the empty text. False when
+  // there is no such item.
   static bool FirstItemText(const Dstring& reply, Dstring& out);
   // The first element of the reply parsed as a list, when it is an integer within [min, max].
   static bool FirstNumber(const Dstring& reply, long min, long max, long& out);

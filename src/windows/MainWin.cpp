@@ -25,6 +25,7 @@
 #include "support/ConditionList.h"
 #include "toolkit/WaitCursor.h"
 #include "windows/InstrumentWaitView.h"
+#include "toolkit/qt/StatusNotice.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -32,6 +33,8 @@
 namespace {
 
 constexpr const char* kResourceProperty = "qenResource";
+// Long enough to read a sentence after the commit that caused it.
+constexpr int kNoticeMs = 15000;
 
 void Show(ConditionList& list) {
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
@@ -90,6 +93,7 @@ MainWin::MainWin(QWidget* parent)
   layout->addWidget(mArea, 1);
   setCentralWidget(central);
   setStatusBar(mStatus);
+  StatusNotice::Install([this](const QString& text) { mStatus->showMessage(text, kNoticeMs); });
   BuildMenus();
   resize(1280, 800);
   UpdateTitle();
@@ -112,6 +116,7 @@ MainWin::~MainWin() {
   QenGuiInst::SetCallWaiter(nullptr);
   // The area tells of its windows going while the frame's part of the object is already gone.
   disconnect(mArea, nullptr, this, nullptr);
+  StatusNotice::Install({});
   if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
   if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
     ConditionList list;

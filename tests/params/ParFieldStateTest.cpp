@@ -63,14 +63,40 @@ TEST_F(ParFieldStateTest, TypedValueSteppedUpIsSentInBaseUnits) {
   EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
 }
 
-TEST_F(ParFieldStateTest, NothingIsSentForAnUnchangedOrEmptyText) {
+// What a commit makes of the text, with the field at 2 mV: what goes out and what it says.
+struct CommitCase {
+  const char* text;
+  const char* sent;  // the value written, or null
+  const char* notice;
+};
+
+class Commits : public ParFieldStateTest, public testing::WithParamInterface<CommitCase> {};
+
+TEST_P(Commits, SendTheLeadingNumberAndSayWhatWasLeftOut) {
+  const CommitCase& c = GetParam();
   Bind("2.000000000000E-003", "(\"V\",-3,0,-3,0.100000d)");
   const std::size_t sent = Inst().Sent().size();
-  EXPECT_EQ(mField.mState.AdjustAndSend("2", 0, mField.mBinding, mList), 0);
-  EXPECT_EQ(mField.mState.AdjustAndSend("2 mV", 0, mField.mBinding, mList), 0);
-  EXPECT_EQ(mField.mState.AdjustAndSend("   ", 0, mField.mBinding, mList), 0);
-  EXPECT_EQ(Inst().Sent().size(), sent);
+  if (c.sent != nullptr) {
+    ExpectWrite(Dstring(":_H:VOLT ") + c.sent);
+    ExpectRead(":_H:VOLT", c.sent);
+  }
+  EXPECT_EQ(mField.mState.AdjustAndSend(c.text, 0, mField.mBinding, mList), 0) << mList.ToText();
+  EXPECT_EQ(mField.mState.GetNotice(), c.notice);
+  if (c.sent == nullptr) {
+    EXPECT_EQ(Inst().Sent().size(), sent);
+  }
+  EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
 }
+
+INSTANTIATE_TEST_SUITE_P(
+    Texts, Commits,
+    testing::Values(CommitCase{"", nullptr, ""}, CommitCase{"2", nullptr, ""}, CommitCase{"2 mV", nullptr, ""},
+                    CommitCase{"2 V", nullptr, "nothing sent, 2 mV is already set; \"V\" ignored: this field is in mV"},
+                    CommitCase{"3  ", "3.000000000000E-003", ""},
+                    CommitCase{"2.5x", "2.500000000000E-003", "2.5 mV sent; \"x\" ignored: this field is in mV"},
+                    CommitCase{"500m", "5.000000000000E-001", "500 mV sent; \"m\" ignored: this field is in mV"},
+                    CommitCase{"abc", "0.000000000000E+000", "0 mV sent; \"abc\" ignored: this field is in mV"},
+                    CommitCase{"   ", "0.000000000000E+000", "0 mV sent; \"   \" ignored: this field is in mV"}));
 
 TEST_F(ParFieldStateTest, TextWithoutANumberSendsZeroAndAHugeOneNothing) {
   Bind("2.000000000000E-003", "(\"V\",-3,0,-3,0.100000d)");
@@ -109,13 +135,19 @@ TEST_F(ParFieldStateTest, AMalformedAttributeKeepsTheRecord) {
   EXPECT_NE(mList[0].GetMessage().find("oops"), Dstring::npos);
   EXPECT_EQ(mField.mState.GetUnits().curExp, UnitsRecord::kExpNotSet);
   EXPECT_EQ(mField.mState.DisplayText(), "0.001");
+  EXPECT_TRUE(mField.mBinding.IsFailed());
+  EXPECT_NE(mField.mBinding.GetReadFailure().find("oops"), Dstring::npos);
+  ExpectRead(":_H:VOLT:ATTR", "(\"V\",-3,0,-3,0.100000d)");
+  EXPECT_EQ(Dte::UpdateDsByName(":_H:VOLT:ATTR", mList), 0) << mList.ToText();
+  EXPECT_FALSE(mField.mBinding.IsFailed());
 }
 
 TEST_F(ParFieldStateTest, LockDuringACommitIsPassedUpWithoutACondition) {
   Bind("1.000000000000E+000", "(\"V\",-3,0,0,0.100000d)");
   Inst().Expect(":_H:VOLT 3.000000000000E+000", "", QenStatus::kLocked);
-  EXPECT_EQ(mField.mState.AdjustAndSend("3", 0, mField.mBinding, mList), QenStatus::kLocked);
+  EXPECT_EQ(mField.mState.AdjustAndSend("3x", 0, mField.mBinding, mList), QenStatus::kLocked);
   EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
+  EXPECT_EQ(mField.mState.GetNotice(), "");
   EXPECT_EQ(mField.mBinding.GetLastError(), "");
 }
 

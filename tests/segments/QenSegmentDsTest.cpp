@@ -348,11 +348,12 @@ INSTANTIATE_TEST_SUITE_P(
                      "GUI_SEGMENTDS_BAD_REPLY"}),
     [](const auto& info) { return std::to_string(info.index); });
 
-// The coding is the first element's text, whatever the type of the item.
+// The coding is the first element's text, whatever the type of the item; a quoted empty text is
+// a coding of no characters, a reply of no element is none.
 TEST_F(QenSegmentDsTest, CodingsAnsweredInAnyItemFormAreTaken) {
   QenSegmentDs* ds = OpenSegment();
   const std::pair<const char*, const char*> cases[] = {
-      {"01", "01"}, {"\"01XZ\"", "01XZ"}, {"01LH", "01LH"}, {"012,x", "012"}, {"(\"01\")", "01"}, {"((01))", nullptr}, {"", nullptr}};
+      {"01", "01"}, {"\"01XZ\"", "01XZ"}, {"01LH", "01LH"}, {"012,x", "012"}, {"(\"01\")", "01"}, {"((01))", nullptr}, {"", nullptr}, {"\"\"", ""}};
   for (const auto& [reply, coding] : cases) {
     Inst().Expect(Seg(":PATT:COD?"), reply);
     Dstring read = "kept";

@@ -339,3 +339,24 @@ TEST_F(SegmentBufferTest, AClosedSegmentsWindowMovesWithoutAskingAndFitsWhenRead
   ds->Release();
   ds->Release();
 }
+
+// A coding of no characters is read as it is, and the state width stays what it was; a forced
+// read of the width then keeps it too.
+TEST_F(SegmentBufferTest, AnEmptyCodingKeepsTheStateWidth) {
+  QenSegmentDs* ds = OpenSegment();
+  SegmentBuffer* buffer = Load(ds, "01X", 8, 2, 0, 8, std::string(4, '\0'));
+  ExpectDimension("", 8, 2);
+  ASSERT_EQ(ds->ReadDimension(buffer, mList), 0) << mList.ToText();
+  long bits = 0;
+  EXPECT_EQ(ds->GetStateWidth(bits, mList), 0);
+  EXPECT_EQ(bits, 2);
+  Dstring coding = "kept";
+  EXPECT_EQ(ds->GetCoding(coding, mList), 0);
+  EXPECT_EQ(coding, "");
+  Inst().Expect(Seg(":PATT:COD?"), "\"\"");
+  bits = 0;
+  EXPECT_EQ(ds->GetStateWidth(bits, mList, true), 0);
+  EXPECT_EQ(bits, 2);
+  EXPECT_TRUE(mList.IsEmpty()) << mList.ToText();
+  ds->Release();
+}

@@ -96,6 +96,19 @@ TEST_F(MainWinTest, ParameterEditorWritesAndFollowsASecondClient) {
   EXPECT_TRUE(mAlerts.empty());
 }
 
+TEST_F(MainWinTest, TextAFieldLeavesOutIsSaidInTheStatusBar) {
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1:CONN2"));
+  QenParEd* ampl = Field(editor, "FieldAmpl");
+  ASSERT_NE(ampl, nullptr);
+  ampl->Editor()->setFocus();
+  QTest::keyClick(ampl->Editor(), Qt::Key_A, Qt::ControlModifier);
+  QTest::keyClicks(ampl->Editor(), "1.5 volts");
+  QTest::keyClick(ampl->Editor(), Qt::Key_Return);
+  EXPECT_DOUBLE_EQ(OtherNumber(":CGR1:MOD1:CONN2:VOLT:AMPL"), 1.5);
+  EXPECT_EQ(mWin->statusBar()->currentMessage(), "1.5 V sent; \"volts\" ignored: this field is in V");
+}
+
 TEST_F(MainWinTest, ParameterEditorShowsOnlyWhatTheItemHas) {
   auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
   ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1"));

@@ -10,6 +10,7 @@
 #include "instrument/QenGuiInst.h"
 #include "support/ErrorMgr.h"
 #include "toolkit/Toolkit.h"
+#include "toolkit/qt/StatusNotice.h"
 
 namespace {
 
@@ -66,14 +67,24 @@ void BoundControl::NfyEnd() { mBinding.NfyEnd(); }
 
 void BoundControl::SetDsBaseNameProperty(const QString& text) {
   ConditionList list;
-  mBinding.SetDsBaseName(text.toStdString(), list);
+  SetDsBaseName(text.toStdString(), list);
   Report(list);
 }
 
 void BoundControl::SetDsCmdNameProperty(const QString& text) {
   ConditionList list;
-  mBinding.SetDsCmdName(text.toStdString(), list);
+  SetDsCmdName(text.toStdString(), list);
   Report(list);
+}
+
+int BoundControl::SetDsBaseName(const Dstring& text, ConditionList& list) {
+  if (text != mBinding.GetDsBaseName()) ShowNotice({});
+  return mBinding.SetDsBaseName(text, list);
+}
+
+int BoundControl::SetDsCmdName(const Dstring& text, ConditionList& list) {
+  if (text != mBinding.GetDsCmdName()) ShowNotice({});
+  return mBinding.SetDsCmdName(text, list);
 }
 
 void BoundControl::SetIsSetupConfigFunction(bool on) {
@@ -109,26 +120,48 @@ void BoundControl::SwapColours(bool failed) {
 
 void BoundControl::ShowSourceState() {
   SwapColours(mBinding.IsFailed());
-  mWidget->setToolTip(mMark ? mMarkTip : QString::fromStdString(mBinding.ToolTip()));
+  ShowTip();
+}
+
+void BoundControl::ShowTip() {
+  QStringList lines;
+  if (!mNotice.isEmpty()) lines << mNotice;
+  lines << (mAdjusted ? mAdjustedTip : QString::fromStdString(mBinding.ToolTip()));
+  lines.removeAll(QString());
+  mWidget->setToolTip(lines.join(QLatin1Char('\n')));
 }
 
 void BoundControl::MarkAdjusted(const QString& held, const QString& asked) {
-  ClearMark();
-  auto* mark = new AdjustedMark(mWidget);
-  mark->show();
-  mark->raise();
-  mMark = mark;
-  mMarkTip = QStringLiteral("set to %1 (asked %2)").arg(held, asked);
-  mWidget->setToolTip(mMarkTip);
-  QTimer::singleShot(kMarkMs, mark, [this] { ClearMark(); });
+  mAdjusted = true;
+  mAdjustedTip = QStringLiteral("set to %1 (asked %2)").arg(held, asked);
+  // Only the timer of the latest mark ends it.
+  const unsigned generation = ++mAdjustedGeneration;
+  QTimer::singleShot(kMarkMs, mWidget, [this, generation] {
+    if (generation != mAdjustedGeneration) return;
+    mAdjusted = false;
+    ShowMark();
+  });
+  ShowMark();
 }
 
-bool BoundControl::IsMarkedAdjusted() const { return !mMark.isNull(); }
+void BoundControl::ShowNotice(const QString& notice) {
+  mNotice = notice;
+  if (!notice.isEmpty()) StatusNotice::Show(notice);
+  ShowMark();
+}
 
-void BoundControl::ClearMark() {
-  if (mMark) mMark->deleteLater();
-  mMark.clear();
-  mWidget->setToolTip(QString::fromStdString(mBinding.ToolTip()));
+void BoundControl::ShowMark() {
+  const bool marked = mAdjusted || !mNotice.isEmpty();
+  if (marked && !mMark) {
+    auto* mark = new AdjustedMark(mWidget);
+    mark->show();
+    mark->raise();
+    mMark = mark;
+  } else if (!marked && mMark) {
+    mMark->deleteLater();
+    mMark.clear();
+  }
+  ShowTip();
 }
 
 void BoundControl::Report(const ConditionList& list) {

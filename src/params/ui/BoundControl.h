@@ -14,8 +14,8 @@ class QWidget;
 
 // The Qt side of the binding that every data-bound control holds: the control's widget, its
 // failed colours swapped in and out against the normal ones saved at init, its tooltip, the
-// short-lived mark of a value the instrument took differently, and the reporting of errors
-// from the user's own actions.
+// marks of a value the instrument took differently and of text a commit left out, and the
+// reporting of errors from the user's own actions.
 class BoundControl : public DsBinding::Client, public ResourceWidget {
  public:
   BoundControl(QWidget* widget, std::string_view className, bool withAttrView = false);
@@ -36,8 +36,9 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
   QString DsCmdNameProperty() const { return QString::fromStdString(mBinding.GetDsCmdName()); }
   void SetDsBaseNameProperty(const QString& text);
   void SetDsCmdNameProperty(const QString& text);
-  int SetDsBaseName(const Dstring& text, ConditionList& list) { return mBinding.SetDsBaseName(text, list); }
-  int SetDsCmdName(const Dstring& text, ConditionList& list) { return mBinding.SetDsCmdName(text, list); }
+  // A notice about the old name does not stay on the new one.
+  int SetDsBaseName(const Dstring& text, ConditionList& list);
+  int SetDsCmdName(const Dstring& text, ConditionList& list);
   Dstring GetDsName() const { return mBinding.GetDsName(); }
 
   QColor mBgColorFailed;
@@ -57,7 +58,11 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
   void ShowSourceState();
   // Marks the control for a moment: the instrument holds `held`, the user asked for `asked`.
   void MarkAdjusted(const QString& held, const QString& asked);
-  bool IsMarkedAdjusted() const;
+  bool IsMarkedAdjusted() const { return mAdjusted; }
+  // Marks the control with what a commit made of the user's text, in the tooltip and on the
+  // status bar, until the next commit or a move to another parameter; empty clears it.
+  void ShowNotice(const QString& notice);
+  const QString& Notice() const { return mNotice; }
 
   // Conditions of a user's action: kept in the error manager and shown after the event.
   static void Report(const ConditionList& list);
@@ -75,7 +80,9 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
 
  private:
   void SwapColours(bool failed);
-  void ClearMark();
+  // The frame while marked, and the tooltip.
+  void ShowMark();
+  void ShowTip();
 
   QWidget* mWidget;
   QWidget* mColourTarget;
@@ -86,5 +93,8 @@ class BoundControl : public DsBinding::Client, public ResourceWidget {
   bool mSetupParameter = false;
   bool mDisabled = false;
   QPointer<QWidget> mMark;
-  QString mMarkTip;
+  bool mAdjusted = false;
+  unsigned mAdjustedGeneration = 0;
+  QString mAdjustedTip;
+  QString mNotice;
 };

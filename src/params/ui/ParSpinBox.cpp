@@ -11,10 +11,10 @@ ParSpinBox::ParSpinBox(QenParField& field) : QAbstractSpinBox(&field), mField(fi
   setButtonSymbols(QAbstractSpinBox::UpDownArrows);
 }
 
+// The field always shows what the instrument holds, also over text the user is typing.
 void ParSpinBox::ShowText(const QString& text) {
   mUpdating = true;
-  const bool editing = hasFocus() && lineEdit()->isModified();
-  if (!editing) lineEdit()->setText(text);
+  lineEdit()->setText(text);
   lineEdit()->setModified(false);
   mUpdating = false;
 }

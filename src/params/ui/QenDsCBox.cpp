@@ -1,5 +1,7 @@
 #include "params/ui/QenDsCBox.h"
 
+#include <QStyleOptionComboBox>
+#include <QStylePainter>
 #include <QWheelEvent>
 
 #include "params/ValueText.h"
@@ -27,15 +29,32 @@ int QenDsCBox::Refresh(ConditionList& list) {
   Dstring reply;
   const int status = Binding().Query(IsSetupConfigFunction(), reply, list);
   if (status == 0 && Binding().GetDs() != nullptr) {
-    if (ValueText::IsNoValue(reply)) {
-      setCurrentIndex(-1);
-    } else {
+    mNoValue = ValueText::IsNoValue(reply);
+    if (!mNoValue) {
       setCurrentIndex(-1);
       setCurrentIndex(CBoxItem::Choose(mItems, reply));
     }
+    update();
   }
   ShowSourceState();
   return status;
+}
+
+QString QenDsCBox::ShownText() const {
+  if (mNoValue || currentIndex() < 0) return QString::fromLatin1(kNoValueText);
+  return currentText();
+}
+
+void QenDsCBox::paintEvent(QPaintEvent* event) {
+  if (!mNoValue) return QComboBox::paintEvent(event);
+  QStylePainter painter(this);
+  QStyleOptionComboBox option;
+  initStyleOption(&option);
+  painter.drawComplexControl(QStyle::CC_ComboBox, option);
+  option.palette.setBrush(QPalette::ButtonText, option.palette.placeholderText());
+  option.currentText = ShownText();
+  option.currentIcon = QIcon();
+  painter.drawControl(QStyle::CE_ComboBoxLabel, option);
 }
 
 void QenDsCBox::HitItem(int index) {

@@ -4,8 +4,9 @@
 
 #include "params/ui/BoundControl.h"
 
-// A one-line text field bound to a parameter. The text is written as it stands on Return,
-// and on focus loss (or when its window is left) after the user changed it.
+// A one-line text field bound to a parameter. The text is written as it stands on Return, on
+// focus loss and when its window is left while it has the focus; a read-only one never writes.
+// A refused text stays for correcting and is not sent again on focus loss until changed.
 class QenDsSTEd : public QLineEdit, public BoundControl {
   Q_OBJECT
   Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)
@@ -26,4 +27,6 @@ class QenDsSTEd : public QLineEdit, public BoundControl {
  private:
   void HitReturn();
 
+  // The instrument refused the text shown and the user has not changed it since.
+  bool mRefused = false;
 };

@@ -29,31 +29,36 @@ void QenParField::NfyInit() {
   mSpin->ShowText(QString());
   mUnitLabel->NfyInit();
   mUnitLabel->setVisible(mShowUnits);
-  SetEnabledComplete(mIsEnabled);
+  SetIsEnabled(mIsEnabled);
   BoundControl::NfyInit();
 }
 
+// A value or an attribute that cannot be read leaves the text as it was, shown failed.
 int QenParField::Refresh(ConditionList& list) {
-  const int status = mState.ReadValue(Binding(), list);
+  int status = mState.ReadValue(Binding(), list);
+  if (status == 0 && Binding().GetDs() != nullptr) {
+    status = mUnitLabel->Refresh(list);
+    if (status == 0) ShowAdjusted();
+  }
   ShowSourceState();
-  if (status != 0) return status;
-  if (Binding().GetDs() == nullptr) return 0;
-  if (int unitStatus = mUnitLabel->Refresh(list)) {
-    DisplayValue(mState.GetValue());
-    return unitStatus;
-  }
-  double asked = 0.0;
-  double held = 0.0;
-  if (mState.TakeAdjusted(asked, held)) {
-    const QString unit = mUnitLabel->text().trimmed();
-    const int exp = mState.DisplayExp();
-    MarkAdjusted(QString::fromStdString(ValueText::FormatDisplay(held, exp)) + " " + unit,
-                 QString::fromStdString(ValueText::FormatDisplay(asked, exp)) + " " + unit);
-  }
-  return 0;
+  return status;
 }
 
-int QenParField::RefreshUnits(ConditionList& list) { return mUnitLabel->Refresh(list); }
+int QenParField::RefreshUnits(ConditionList& list) {
+  const int status = mUnitLabel->Refresh(list);
+  ShowSourceState();
+  return status;
+}
+
+void QenParField::ShowAdjusted() {
+  double asked = 0.0;
+  double held = 0.0;
+  if (!mState.TakeAdjusted(asked, held)) return;
+  const QString unit = mUnitLabel->text().trimmed();
+  const int exp = mState.DisplayExp();
+  MarkAdjusted(QString::fromStdString(ValueText::FormatDisplay(held, exp)) + " " + unit,
+               QString::fromStdString(ValueText::FormatDisplay(asked, exp)) + " " + unit);
+}
 
 Dstring QenParField::FormatValue(double value) const { return ValueText::FormatDisplay(value, mState.DisplayExp()); }
 
@@ -70,7 +75,8 @@ void QenParField::SetEnabledComplete(bool enabled) {
 
 void QenParField::SetIsEnabled(bool enabled) {
   mIsEnabled = enabled;
-  // A field whose value may not be edited keeps its prefix and step changeable.
+  // A field whose value may not be edited keeps its prefix and step changeable, from the
+  // start as at run time.
   mSpin->setEnabled(enabled);
   mUnitLabel->setEnabled(true);
 }
@@ -85,11 +91,15 @@ void QenParField::Commit(int steps) {
   mSending = true;
   const int status = AdjustAndSend(steps, list);
   mSending = false;
-  // A refused value gives way to the instrument's, unless the text was never sent.
+  // A refused value gives way to the instrument's, and so does text that sent nothing (a
+  // cleared field, a value already set).
   if (status != 0 && Binding().GetDs() != nullptr) {
     ConditionList ignored;
     Refresh(ignored);
+  } else if (Binding().GetDs() != nullptr) {
+    DisplayValue(mState.GetValue());
   }
+  ShowNotice(QString::fromStdString(mState.GetNotice()));
   Report(list);
 }
 

@@ -37,7 +37,8 @@ class QenParField : public QWidget, public BoundControl {
 
   Dstring FormatValue(double value) const;
   void DisplayValue(double value);
-  // Parses the text, adds `steps` steps and writes (see ParFieldState).
+  // Parses the text, adds `steps` steps and writes (see ParFieldState). A commit marks the
+  // field, and tells the status bar, when it left part of the text out (Notice()).
   int AdjustAndSend(int steps, ConditionList& list);
   // The field and its unit label together.
   void SetEnabledComplete(bool enabled);
@@ -65,6 +66,8 @@ class QenParField : public QWidget, public BoundControl {
 
  private:
   void Commit(int steps);
+  // Marks the field when the instrument holds another value than the one just asked.
+  void ShowAdjusted();
 
   ParFieldState mState;
   ParSpinBox* mSpin;

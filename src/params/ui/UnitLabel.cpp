@@ -77,7 +77,7 @@ QMenu* UnitLabel::BuildPopupMenu(QWidget* parent) {
   QMenu* prefixes = menu->addMenu(QStringLiteral("&Prefix"));
   for (int i = 0; UnitMenu::kPrefixLetters[i] != '\0'; ++i) {
     const int id = UnitMenu::PrefixItemId(i);
-    QAction* action = prefixes->addAction(QString::fromStdString(UnitMenu::PrefixItemLabel(i, units)).trimmed());
+    QAction* action = prefixes->addAction(QString::fromStdString(UnitMenu::PrefixItemLabel(i, units)));
     action->setData(id);
     action->setCheckable(true);
     action->setChecked(id == units.curExp + UnitMenu::kPrefixMenu);

@@ -49,7 +49,7 @@ void UnitsDialog::NfyInit(const UnitsRecord& units) {
     const bool allowed = button.exp >= units.minExp && button.exp <= units.maxExp;
     radio->setVisible(allowed);
     if (!allowed) continue;
-    radio->setText(QString::fromStdString(Dstring(button.prefix) + units.unitName));
+    radio->setText(QString::fromStdString(UnitsRecord::PrefixOf(button.exp) + units.unitName));
     if (button.exp == units.curExp) radio->setChecked(true);
   }
   const auto& steps = UnitsDialogTable::StepButtons();

@@ -4,6 +4,7 @@
 #include <QApplication>
 #include <QComboBox>
 #include <QDir>
+#include <QMenu>
 #include <QPluginLoader>
 #include <QPushButton>
 #include <QRadioButton>
@@ -13,6 +14,7 @@
 #include <memory>
 
 #include "common/gui/GuiSimFixture.h"
+#include "instrument/QenGuiInst.h"
 #include "params/ui/ParSpinBox.h"
 #include "params/ui/QenDsCBox.h"
 #include "params/ui/QenDsCBut.h"
@@ -24,6 +26,7 @@
 #include "params/ui/UnitLabel.h"
 #include "params/ui/UnitsDialog.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "toolkit/qt/StatusNotice.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
 namespace {
@@ -49,7 +52,10 @@ class BoundControlsTest : public GuiSimFixture {
     QApplication::setActiveWindow(mForm.get());
   }
   void TearDown() override {
+    // The field with the focus commits as the form goes; its report is shown while this
+    // test's toolkit still runs, so that it does not stay pending for the next test.
     mForm.reset();
+    QCoreApplication::processEvents();
     GuiSimFixture::TearDown();
   }
   template <class T>
@@ -58,10 +64,34 @@ class BoundControlsTest : public GuiSimFixture {
     EXPECT_NE(widget, nullptr) << name;
     return widget;
   }
+  // A command on the library's own connection (a test-control command acts on its replies).
+  void Gui(const Dstring& cmd) {
+    Dstring reply;
+    ASSERT_EQ(QenGuiInst::Call(cmd, reply, mList), 0) << cmd << mList.ToText();
+  }
+  // From now on every reply to `header` on the library's connection is `text`.
+  void Garble(const Dstring& header, const Dstring& text) {
+    Dstring quoted;
+    for (char c : text) quoted += c == '"' ? Dstring("\"\"") : Dstring(1, c);
+    Gui(":TEST:MALF \"" + header + "?\",\"" + quoted + "\",0");
+  }
+  static bool ShowsFailed(const QenParField* field) {
+    return field->Editor()->palette().color(QPalette::Base) == field->mBgColorFailed;
+  }
+  // A text field over the trigger mode, added to the form.
+  QenDsSTEd* TriggerText() {
+    auto* text = new QenDsSTEd(mForm.get());
+    text->setProperty("DsCmdName", QStringLiteral(":TRIG:MODE"));
+    text->NfyInit();
+    EXPECT_EQ(text->SetDsBaseName(":" + mHandle, mList), 0) << mList.ToText();
+    text->show();
+    return text;
+  }
   // Types `text` over the field's text and presses `key`.
   void Type(QenParField* field, const QString& text, Qt::Key key = Qt::Key_Return) {
     field->Editor()->setFocus();
     QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+    QTest::keyClick(field->Editor(), Qt::Key_Backspace);
     QTest::keyClicks(field->Editor(), text);
     QTest::keyClick(field->Editor(), key);
     QCoreApplication::processEvents();
@@ -216,6 +246,189 @@ TEST_F(BoundControlsTest, TheWheelLeavesAnUnfocusedControlAlone) {
   QApplication::sendEvent(Find<QenDsCBox>("boxTrigger"), &wheel);
   EXPECT_DOUBLE_EQ(OtherNumber(":CGR1:MOD1:CONN1:VOLT:OFFS"), 0.5);
   EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ");
+}
+
+TEST_F(BoundControlsTest, ThePlainUnitKeepsItsBlankInTheMenuAndTheDialog) {
+  auto* ampl = Find<QenParEd>("fieldAmpl");
+  std::unique_ptr<QMenu> menu(ampl->GetUnitLabel()->BuildPopupMenu(nullptr));
+  QStringList shown;
+  for (QAction* item : menu->actions().first()->menu()->actions()) {
+    if (item->isVisible()) shown << item->text();
+  }
+  EXPECT_EQ(shown.join('|'), " V|mV");
+  UnitsDialog dialog("unitsdlg");
+  UnitsRecord units = ampl->State().GetUnits();
+  dialog.NfyInit(units);
+  EXPECT_EQ(dialog.findChild<QRadioButton*>("RBut1Unit")->text(), " V");
+  EXPECT_EQ(dialog.findChild<QRadioButton*>("RButUnitMilli")->text(), "mV");
+}
+
+// The label and the text stay as they were; the field shows that the attribute failed, and why.
+TEST_F(BoundControlsTest, AMalformedUnitAttributeLeavesLabelAndText) {
+  auto* ampl = Find<QenParEd>("fieldAmpl");
+  Garble(Dstring(kAmpl) + ":ATTR", "(\"V\",oops,0,-3,0.1d)");
+  Other(Dstring(kAmpl) + " 2.5");
+  Other(Dstring(kAmpl) + ":ATTR (\"V\",-3,0,-3,0.1d)");
+  Poll();
+  EXPECT_EQ(ampl->Editor()->Text(), "1");
+  EXPECT_EQ(ampl->GetUnitLabel()->text(), " V");
+  EXPECT_TRUE(ShowsFailed(ampl));
+  EXPECT_NE(ampl->toolTip().indexOf("oops"), -1) << ampl->toolTip().toStdString();
+}
+
+TEST_F(BoundControlsTest, AComboBoxWithNoValueSaysSoAndKeepsItsChoice) {
+  auto* box = Find<QenDsCBox>("boxTrigger");
+  ASSERT_EQ(box->currentIndex(), 0);
+  for (const char* mark : {"CLAS", "9.91E37"}) {
+    Garble(":TRIG:MODE", mark);
+    Other(":TRIG:MODE CLOC");
+    Poll();
+    EXPECT_EQ(box->ShownText(), "<No Value>") << mark;
+    EXPECT_EQ(box->currentIndex(), 0) << mark;
+    Other(":TRIG:MODE SEQ");
+  }
+  Garble(":TRIG:MODE", "CLOC");
+  Other(":TRIG:MODE CLOC");
+  Poll();
+  EXPECT_EQ(box->ShownText(), "Clock");
+  EXPECT_EQ(box->currentIndex(), 1);
+}
+
+// The text goes out as it stands when the field is left, edited or not, and when its window
+// goes to the background while the field has the focus.
+TEST_F(BoundControlsTest, ATextFieldWritesItsTextWhenLeft) {
+  QenDsSTEd* text = TriggerText();
+  ASSERT_EQ(text->text(), "SEQ");
+  Other(":TRIG:MODE CLOC");
+  text->setFocus();
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ") << "focus loss";
+  Other(":TRIG:MODE CLOC");
+  text->setFocus();
+  QWidget elsewhere;
+  elsewhere.show();
+  QApplication::setActiveWindow(&elsewhere);
+  EXPECT_EQ(Other(":TRIG:MODE?"), "SEQ") << "window left";
+  EXPECT_TRUE(mAlerts.empty());
+}
+
+// A refused text stays for correcting; leaving the field (as the error dialog takes the focus)
+// does not send it again, a changed text goes out.
+TEST_F(BoundControlsTest, ARefusedTextIsNotSentAgainUntilChanged) {
+  QenDsSTEd* text = TriggerText();
+  text->setFocus();
+  text->selectAll();
+  QTest::keyClicks(text, "SIDEWAYS");
+  QTest::keyClick(text, Qt::Key_Return);
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_EQ(mAlerts[0].find("ERROR", mAlerts[0].find("ERROR") + 1), Dstring::npos) << mAlerts[0];
+  EXPECT_EQ(text->text(), "SIDEWAYS");
+  text->setFocus();
+  text->selectAll();
+  QTest::keyClicks(text, "CLOC");
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  EXPECT_EQ(Other(":TRIG:MODE?"), "CLOC");
+}
+
+// A read-only text field never writes, however it is left.
+TEST_F(BoundControlsTest, AReadOnlyTextFieldNeverWrites) {
+  auto* text = Find<QenDsSTEd>("textType");
+  text->setFocus();
+  QTest::keyClick(text, Qt::Key_Return);
+  Find<QenDsCBox>("boxTrigger")->setFocus();
+  QCoreApplication::processEvents();
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+}
+
+TEST(QenParFieldTest, ClearedIsEnabledAtInitLeavesTheUnitLabelEnabled) {
+  EnsureApplication();
+  QenParEd field;
+  field.setProperty("IsEnabled", false);
+  field.NfyInit();
+  EXPECT_FALSE(field.Editor()->isEnabled());
+  EXPECT_TRUE(field.GetUnitLabel()->isEnabled());
+  field.SetIsEnabled(true);
+  field.SetIsEnabled(false);
+  EXPECT_FALSE(field.Editor()->isEnabled());
+  EXPECT_TRUE(field.GetUnitLabel()->isEnabled());
+}
+
+TEST_F(BoundControlsTest, AClearedFieldShowsTheInstrumentsValueAgain) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  for (Qt::Key key : {Qt::Key_Tab, Qt::Key_Return}) {
+    Type(field, "", key);
+    EXPECT_EQ(field->Editor()->Text(), "1") << key;
+  }
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 1.0);
+}
+
+// Typed text and a step: the field shows the value stepped from the typed one, as sent.
+TEST_F(BoundControlsTest, AStepAfterTypingShowsTheValueSent) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  field->Editor()->setFocus();
+  QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+  QTest::keyClicks(field->Editor(), "2");
+  QTest::keyClick(field->Editor(), Qt::Key_Up);
+  EXPECT_DOUBLE_EQ(OtherNumber(kAmpl), 2.1);
+  EXPECT_EQ(field->Editor()->Text(), "2.1");
+}
+
+TEST_F(BoundControlsTest, AValueTheFieldCannotReadIsShownFailedWithTheReason) {
+  auto* field = Find<QenParEd>("fieldAmpl");
+  ASSERT_FALSE(ShowsFailed(field));
+  Garble(kAmpl, "abc");
+  Other(Dstring(kAmpl) + " 2.5");
+  Poll();
+  EXPECT_EQ(field->Editor()->Text(), "1");
+  EXPECT_TRUE(ShowsFailed(field));
+  EXPECT_NE(field->toolTip().indexOf("\"abc\""), -1) << field->toolTip().toStdString();
+  Garble(kAmpl, "2.5");
+  Other(Dstring(kAmpl) + " 2");
+  Poll();
+  EXPECT_EQ(field->Editor()->Text(), "2.5");
+  EXPECT_FALSE(ShowsFailed(field));
+  EXPECT_EQ(field->toolTip().indexOf("abc"), -1);
+}
+
+// The leading number is sent; what follows it, or text without a number, is said on the field
+// and in the status bar until the field's next commit.
+TEST_F(BoundControlsTest, TextACommitLeavesOutIsSaid) {
+  QStringList notices;
+  StatusNotice::Install([&notices](const QString& text) { notices << text; });
+  const struct {
+    const char* field;
+    const char* typed;
+    const char* header;
+    double held;
+    const char* notice;
+  } kCases[] = {
+      {"fieldFreq", "2G", ":CGR1:FREQ", 2e6, "2 MHz sent; \"G\" ignored: this field is in MHz"},
+      {"fieldAmpl", "0.5m", kAmpl, 0.5, "0.5 V sent; \"m\" ignored: this field is in V"},
+      {"fieldAmpl", "2 V", kAmpl, 2.0, ""},
+      {"fieldFreq", "abc", ":CGR1:FREQ", 2e6, "0 MHz sent; \"abc\" ignored: this field is in MHz"},
+  };
+  for (const auto& c : kCases) {
+    auto* field = Find<QenParField>(c.field);
+    notices.clear();
+    Type(field, QString::fromLatin1(c.typed));
+    const QString notice = QString::fromLatin1(c.notice);
+    EXPECT_DOUBLE_EQ(OtherNumber(c.header), c.held) << c.typed;
+    EXPECT_EQ(field->Notice(), notice) << c.typed;
+    EXPECT_EQ(notices, notice.isEmpty() ? QStringList() : QStringList{notice}) << c.typed;
+    EXPECT_TRUE(field->toolTip().startsWith(notice)) << field->toolTip().toStdString();
+  }
+  // 0 MHz is below the instrument's limit: refused, and the field shows the value it holds.
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find("-222"), Dstring::npos) << mAlerts[0];
+  auto* freq = Find<QenParField>("fieldFreq");
+  EXPECT_EQ(freq->Editor()->Text(), "2");
+  Type(freq, "3");
+  EXPECT_EQ(freq->Notice(), "");
+  EXPECT_EQ(freq->toolTip().indexOf("ignored"), -1);
+  StatusNotice::Install({});
 }
 
 TEST_F(BoundControlsTest, MissingAndBrokenResourcesAreNamed) {
