@@ -99,6 +99,17 @@ bool IsHeader(std::string_view header) {
   return true;
 }
 
+// A value is a number, a word of the instrument or a quoted text: nothing in a bare word that
+// would read as more.
+bool IsPlainValue(const DataItem& item) {
+  if (item.GetType() == DataItemType::String) return true;
+  if (item.GetType() == DataItemType::Block) return false;
+  for (char c : item.GetText()) {
+    if (!IsLetter(c) && !(c >= '0' && c <= '9') && c != '_' && c != '.' && c != '+' && c != '-') return false;
+  }
+  return !item.GetText().empty();
+}
+
 bool IsExpression(std::string_view text) {
   LispList parsed;
   ConditionList ignored;
@@ -208,8 +219,8 @@ class SettingText::Reader {
     }
     DataParcel items;
     ConditionList ignored;
-    if (value.empty() || ParserExpression::Parse(value, items, ignored) != 0 || items.size() != 1 ||
-        items[0].GetType() == DataItemType::Block || value[0] == '(') {
+    if (value.empty() || value[0] == '(' || ParserExpression::Parse(value, items, ignored) != 0 || items.size() != 1 ||
+        !IsPlainValue(items[0])) {
       return Fail(mLine, "the value \"" + Shown(value) + "\" of " + header + " is not one number, word or quoted text");
     }
     const auto [seen, fresh] = mHeaders.emplace(header.ToUpper(), mLine);
