@@ -132,11 +132,11 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
                                          Dstring dataDir)
     : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
-  mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir));
   auto connections = std::make_shared<SimConnections>(mParams.GetRack());
+  auto sequence = std::make_shared<SimSequence>(mParams);
+  mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir, sequence, connections));
   mModules.push_back(connections);
   auto ber = std::make_shared<SimBerMeter>(connections);
-  auto sequence = std::make_shared<SimSequence>(mParams);
   auto segments = std::make_shared<SimSegmentStore>(dataDir);
   mModules.push_back(ber);
   mModules.push_back(sequence);

@@ -13,7 +13,10 @@ bool IsData(const SimRack::Place& place) {
 
 }  // namespace
 
-SimConnections::SimConnections(const SimRack& rack) : mRack(rack) {
+SimConnections::SimConnections(const SimRack& rack) : mRack(rack), mDrivers(DefaultWiring()) {}
+
+SimConnections::Drivers SimConnections::DefaultWiring() const {
+  Drivers drivers;
   for (const SimRack::Group& g : mRack.GetGroups()) {
     std::vector<SimRack::Place> generators, analysers;
     for (const SimRack::Module& m : g.modules) {
@@ -22,10 +25,42 @@ SimConnections::SimConnections(const SimRack& rack) : mRack(rack) {
       }
     }
     for (std::size_t k = 0; k < analysers.size() && k < generators.size(); ++k) {
-      if (Refusal(generators[k], analysers[k]).empty())
-        mDrivers[analysers[k].port->path] = generators[k].port->path;
+      if (Refusal(generators[k], analysers[k], drivers).empty())
+        drivers[analysers[k].port->path] = generators[k].port->path;
     }
   }
+  return drivers;
+}
+
+void SimConnections::Capture(SettingText& text) const {
+  for (const SimRack::Group& g : mRack.GetGroups()) {
+    for (const SimRack::Module& m : g.modules) {
+      for (const SimRack::Port& p : m.ports) {
+        const Dstring driver = DriverOf(p.path);
+        if (!driver.empty()) text.AddConnection(driver, p.path);
+      }
+    }
+  }
+}
+
+int SimConnections::Check(const SettingText& text, Drivers& out, Dstring& detail) const {
+  Drivers drivers;
+  for (const SettingText::Connection& c : text.GetConnections()) {
+    SimRack::Place from, to;
+    const bool found = mRack.Find(c.generator, from);
+    if (!found || !mRack.Find(c.analyser, to)) {
+      detail = Dstring::Format("line %d: the rack has no port %s", c.line, (found ? c.analyser : c.generator).c_str());
+      return -224;
+    }
+    const Dstring why = Refusal(from, to, drivers);
+    if (!why.empty()) {
+      detail = Dstring::Format("line %d: %s", c.line, why.c_str());
+      return -221;
+    }
+    drivers[to.port->path] = from.port->path;
+  }
+  out = std::move(drivers);
+  return 0;
 }
 
 Dstring SimConnections::DriverOf(const Dstring& analyser) const {
@@ -33,7 +68,7 @@ Dstring SimConnections::DriverOf(const Dstring& analyser) const {
   return found == mDrivers.end() ? Dstring() : found->second;
 }
 
-Dstring SimConnections::Refusal(const SimRack::Place& from, const SimRack::Place& to) const {
+Dstring SimConnections::Refusal(const SimRack::Place& from, const SimRack::Place& to, const Drivers& drivers) const {
   const Dstring& gen = from.port->path;
   const Dstring& ana = to.port->path;
   if (!IsData(from)) return gen + " is a clock port; only data ports are connected";
@@ -45,9 +80,9 @@ Dstring SimConnections::Refusal(const SimRack::Place& from, const SimRack::Place
     return Dstring::Format("%s has %ld terminals, %s has %ld", gen.c_str(), from.port->terminals, ana.c_str(),
                            to.port->terminals);
   }
-  const Dstring driver = DriverOf(ana);
-  if (!driver.empty()) return ana + " is driven by " + driver + " already";
-  for (const auto& [analyser, generator] : mDrivers) {
+  const auto driver = drivers.find(ana);
+  if (driver != drivers.end()) return ana + " is driven by " + driver->second + " already";
+  for (const auto& [analyser, generator] : drivers) {
     if (generator == gen) return gen + " drives " + analyser + " already";
   }
   return {};
@@ -79,7 +114,7 @@ bool SimConnections::ReadPorts(const SimCommand& cmd, SimContext& context, SimRa
 void SimConnections::Add(const SimCommand& cmd, SimContext& context) {
   SimRack::Place from, to;
   if (!ReadPorts(cmd, context, from, to)) return;
-  const Dstring why = Refusal(from, to);
+  const Dstring why = Refusal(from, to, mDrivers);
   if (!why.empty()) return context.Error(-221, why);
   mDrivers[to.port->path] = from.port->path;
   context.MarkChanged(Dstring(kStem));

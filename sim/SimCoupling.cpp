@@ -76,18 +76,34 @@ bool CheckReciprocal(const Params& p, const Members& m, Dstring& error) {
   return true;
 }
 
+bool Near(double a, double b) {
+  return std::fabs(a - b) <= 1e-9 * std::max({1.0, std::fabs(a), std::fabs(b)});
+}
+
+bool HoldsReciprocal(const Params& p, const Members& m) { return Near(p[m[0]].GetNumber() * p[m[1]].GetNumber(), 1.0); }
+
+bool HoldsLevels(const Params& p, const Members& m) {
+  const double ampl = p[m[0]].GetNumber();
+  const double offs = p[m[1]].GetNumber();
+  return Near(p[m[2]].GetNumber(), offs + ampl / 2.0) && Near(p[m[3]].GetNumber(), offs - ampl / 2.0);
+}
+
+// A value beyond a limit that moved is kept (it clashes), so a limit rule always holds.
+bool HoldsAlways(const Params&, const Members&) { return true; }
+
 struct Kind {
   const char* name;
   std::size_t members;
   void (*propagate)(Params&, const Members&, std::size_t);
   void (*narrow)(Params&, const Members&);
   bool (*check)(const Params&, const Members&, Dstring&);
+  bool (*holds)(const Params&, const Members&);
 };
 
 constexpr Kind kKinds[] = {
-    {"reciprocal", 2, PropagateReciprocal, NarrowNothing, CheckReciprocal},
-    {"levels", 4, PropagateLevels, NarrowLevels, CheckNumeric},
-    {"limit-by", 2, PropagateNothing, NarrowLimitBy, CheckNumeric},
+    {"reciprocal", 2, PropagateReciprocal, NarrowNothing, CheckReciprocal, HoldsReciprocal},
+    {"levels", 4, PropagateLevels, NarrowLevels, CheckNumeric, HoldsLevels},
+    {"limit-by", 2, PropagateNothing, NarrowLimitBy, CheckNumeric, HoldsAlways},
 };
 
 }  // namespace
@@ -120,3 +136,5 @@ void SimCoupling::Propagate(Params& params, std::size_t written) const {
 void SimCoupling::NarrowLimits(Params& params) const {
   kKinds[mKind].narrow(params, mMembers);
 }
+
+bool SimCoupling::Holds(const Params& params) const { return kKinds[mKind].holds(params, mMembers); }

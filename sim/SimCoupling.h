@@ -26,6 +26,9 @@ class SimCoupling {
   void Propagate(std::vector<SimParam>& params, std::size_t written) const;
   // Narrows the current limits of the members, which start from their absolute limits.
   void NarrowLimits(std::vector<SimParam>& params) const;
+  // Whether the members' values agree with the rule, to within the last digits a computation
+  // of the rule may differ in (a setting's values are taken as they were, not derived again).
+  bool Holds(const std::vector<SimParam>& params) const;
 
  private:
   std::size_t mKind = 0;  // index into the table of kinds

@@ -1,5 +1,6 @@
 #include "SimParam.h"
 
+#include <charconv>
 #include <cmath>
 #include <cstdio>
 
@@ -145,6 +146,18 @@ Dstring SimParam::FormatNumber(double v) const {
   return buf;
 }
 
+Dstring SimParam::FormatExact() const {
+  if (mType != SimParamType::Double) return FormatValue();
+  char buf[64];
+  const auto result = std::to_chars(buf, buf + sizeof buf, mNumber);
+  return Dstring(std::string_view(buf, static_cast<std::size_t>(result.ptr - buf)));
+}
+
 double SimParam::Resolve(double number) const {
-  return mResolution > 0.0 ? std::round(number / mResolution) * mResolution : number;
+  if (mResolution <= 0.0) return number;
+  const double steps = std::round(number / mResolution);
+  // A decimal step (1E-3) has no exact double: steps times it lands beside the value written
+  // (1511 * 1E-3 is 1.5110000000000001), steps divided by its whole inverse on it (1.511).
+  const double inverse = std::round(1.0 / mResolution);
+  return mResolution < 1.0 && std::fabs(inverse * mResolution - 1.0) < 1e-12 ? steps / inverse : steps * mResolution;
 }

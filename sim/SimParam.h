@@ -28,6 +28,9 @@ class SimParam {
   // The value as the instrument replies it: "%.12E", an integer, a word or a quoted string.
   Dstring FormatValue() const;
   Dstring FormatNumber(double v) const;
+  // The value as a setting keeps it: as FormatValue, but a double with the fewest digits that
+  // read back to the very same number ("1.511", "1e-09").
+  Dstring FormatExact() const;
 
   double GetNumber() const { return mNumber; }
   const Dstring& GetText() const { return mText; }

@@ -1,5 +1,6 @@
 #include "SimParamTable.h"
 
+#include <algorithm>
 #include <cctype>
 
 namespace {
@@ -78,6 +79,33 @@ int SimParamTable::Write(std::size_t index, std::string_view text) {
   Propagate(index);
   RecomputeLimits();
   return 0;
+}
+
+int SimParamTable::Restore(std::size_t index, std::string_view text) {
+  const SimParam& param = mParams[index];
+  double number = 0.0;
+  Dstring word;
+  if (int rc = param.ParseValue(text, number, word); rc != 0) return rc;
+  if (param.IsNumeric() && (number < param.GetLmax() || number > param.GetHmax())) return kOutOfRange;
+  mParams[index].SetValue(number, word);
+  return 0;
+}
+
+bool SimParamTable::FinishRestore(const std::set<std::size_t>& named, std::vector<std::size_t>& broken) {
+  for (const SimCoupling& rule : mCouplings) {
+    if (rule.Holds(mParams)) continue;
+    const auto& members = rule.GetMembers();
+    const auto first = std::find_if(members.begin(), members.end(), [&](std::size_t m) { return named.count(m) != 0; });
+    const bool partly = std::any_of(members.begin(), members.end(), [&](std::size_t m) { return named.count(m) == 0; });
+    if (first != members.end() && partly) rule.Propagate(mParams, *first);
+    if (rule.Holds(mParams)) continue;
+    broken = members;
+    return false;
+  }
+  RecomputeLimits();
+  mValueChanges.clear();
+  mLimitChanges.clear();
+  return true;
 }
 
 int SimParamTable::WriteAttr(std::size_t index, std::string_view text) {

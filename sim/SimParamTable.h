@@ -36,6 +36,16 @@ class SimParamTable {
   // Reads and stores a value text, then applies the couplings: 0, or the SCPI error
   // -104/-222/-224, in which case nothing changed.
   int Write(std::size_t index, std::string_view text);
+  // Stores a value as a setting kept it: read as a write reads it and within the absolute
+  // limits, but neither rounded to the resolution nor handed on to coupled parameters, so that
+  // it comes back exactly as it was saved. 0, or -104/-222/-224, in which case nothing changed.
+  int Restore(std::size_t index, std::string_view text);
+  // After Restore of the values a setting names (`named`, by index): a coupling rule with
+  // members it does not name has them follow the first member it names; false, with its
+  // members, when a rule still does not hold. Otherwise the current limits follow the values
+  // and no change is left to take.
+  bool FinishRestore(const std::set<std::size_t>& named, std::vector<std::size_t>& broken);
+
   // 0, or -104/-224 from SimUnitAttr::Parse, or -224 when the unit is not the parameter's.
   int WriteAttr(std::size_t index, std::string_view text);
   // A value outside the current limits, left there by a limit that moved.

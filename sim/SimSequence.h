@@ -2,6 +2,7 @@
 
 #include "SimCommandModule.h"
 #include "SimSequenceConfig.h"
+#include "settings/SettingText.h"
 
 // The instrument's sequencer: the sequence and the ten sequence events, one of each per
 // instrument (every handle sees the same), the number of loop levels and the system
@@ -12,6 +13,7 @@
 //   :SGEN:GLOB:SEQ:LLEV?                                   loop levels
 //   :SGEN:GLOB:SEQ:ITER:MAX?                               the largest loop count
 //   :SGEN:GLOB:CONF?                                       ports and central module
+//   :SGEN:GLOB:SEQ:DATA? / :SGEN:GLOB:SEQ:DATA <block>    both as one sequence text
 //
 // A text is stored as accepted (SimSequenceCheck) and replied as stored; a refused one queues
 // its error and changes nothing. A change marks ":SGEN:GLOB:SEQ" (":SGEN:GLOB:SEQ:EVEN") in the
@@ -26,6 +28,16 @@ class SimSequence : public SimCommandModule {
   const Dstring& GetSequence() const { return mSequence; }
   const SimSequenceConfig& GetConfig() const { return mConfig; }
 
+  // A setting holds the sequence and, with a central module, the events.
+  void Capture(SettingText& text) const;
+  // 0 when the sequence and events of `text` can be taken as they are; else the SCPI error,
+  // with what is wrong and its line in `detail`.
+  int Check(const SettingText& text, Dstring& detail) const;
+  // Takes the sequence and events of a checked text (ten empty events when it has none).
+  void Take(const SettingText& text);
+  // The sequence and events at start, for the measurement mode of `params` (a new setting).
+  void Reset(const SimParamTable& params);
+
  private:
   using Handler = void (SimSequence::*)(const SimCommand&, SimContext&);
   struct Entry {
@@ -39,6 +51,7 @@ class SimSequence : public SimCommandModule {
   void LoopLevels(const SimCommand& cmd, SimContext& context);
   void LargestCount(const SimCommand& cmd, SimContext& context);
   void Configuration(const SimCommand& cmd, SimContext& context);
+  void Data(const SimCommand& cmd, SimContext& context);
   // Stores an accepted write of `text` into `stored`, marking `header` when it changed.
   void Store(const SimCommand& cmd, SimContext& context, int check, Dstring& stored, const char* header);
 

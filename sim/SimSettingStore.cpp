@@ -2,7 +2,12 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <map>
 #include <set>
+
+#include "SimConnections.h"
+#include "SimReply.h"
+#include "SimSequence.h"
 
 #include "support/ConditionList.h"
 #include "support/DstringList.h"
@@ -14,6 +19,7 @@ constexpr int kDataType = -104;
 constexpr int kMissing = -109;
 constexpr int kUndefined = -113;
 constexpr int kExecution = -200;
+constexpr int kConflict = -221;
 constexpr int kIllegal = -224;
 constexpr int kStorage = -250;
 constexpr int kBadFileName = -257;
@@ -47,26 +53,6 @@ bool ReadSwitch(const DataItem& item, bool& on) {
   return false;
 }
 
-using Pending = std::vector<std::pair<std::size_t, Dstring>>;
-
-// A coupled value may be refused until its partners hold theirs: writes in rounds as long as
-// any value is taken. 0, or the error of a value that was never taken.
-int WriteInRounds(SimParamTable& table, Pending pending) {
-  int error = 0;
-  while (!pending.empty()) {
-    Pending refused;
-    for (const auto& entry : pending) {
-      if (int rc = table.Write(entry.first, entry.second)) {
-        refused.push_back(entry);
-        error = rc;
-      }
-    }
-    if (refused.size() == pending.size()) return error;
-    pending = std::move(refused);
-  }
-  return 0;
-}
-
 bool IsQuoted(const LispList& node) { return node.IsItem() && node.GetItem().GetType() == DataItemType::String; }
 
 }  // namespace
@@ -76,6 +62,7 @@ const SimSettingStore::Entry SimSettingStore::kCommands[] = {
     {":MMEM:SETT:LOAD", nullptr, &SimSettingStore::LoadSetting},
     {":MMEM:SETT:SAVE", nullptr, &SimSettingStore::SaveSetting},
     {":MMEM:SETT:CAT", &SimSettingStore::ListSettings, nullptr},
+    {":MMEM:SETT:DATA", &SimSettingStore::QueryData, &SimSettingStore::WriteData},
     {":CONF:CSET:PROF:EXPR", &SimSettingStore::QuerySettingProfile, &SimSettingStore::WriteSettingProfile},
     {":CONF:PROF", &SimSettingStore::QuerySystemValue, &SimSettingStore::WriteSystemValue},
     {":CONF:PROF:LIST", &SimSettingStore::ListSystemValues, nullptr},
@@ -99,6 +86,8 @@ void SimSettingStore::NewSetting(const SimCommand& cmd, SimContext& context) {
   if (cmd.HasArgs()) return context.Error(kUndefined);
   context.Params() = mDefaults;
   mSettingProfile.clear();
+  mSequence->Reset(mDefaults);
+  mConnections->Reset();
   context.MarkAllDirty();
 }
 
@@ -109,9 +98,15 @@ void SimSettingStore::LoadSetting(const SimCommand& cmd, SimContext& context) {
   if (int rc = ReadItems(cmd, items, 1, 2)) return context.Error(rc);
   if (int rc = SettingPath(items, path)) return context.Error(rc);
   if (items.size() == 2 && !ReadSwitch(items[1], cableDelays)) return context.Error(kIllegal);
-  SimSettingFile file;
-  if (int rc = file.Read(path)) return context.Error(rc);
-  if (int rc = Apply(file, cableDelays, context)) return context.Error(rc);
+  SettingText text;
+  SettingText::Problem problem;
+  const Dstring name(items[0].GetText());
+  if (int rc = SimSettingFile::Read(path, text, problem)) {
+    if (problem.line == 0) return context.Error(rc);
+    return context.Error(rc, Dstring::Format("%s, line %d: %s", name.c_str(), problem.line, problem.what.c_str()));
+  }
+  Dstring detail;
+  if (int rc = Apply(text, cableDelays, context, detail)) return context.Error(rc, name + ", " + detail);
   context.MarkAllDirty();
 }
 
@@ -120,7 +115,7 @@ void SimSettingStore::SaveSetting(const SimCommand& cmd, SimContext& context) {
   Dstring path;
   if (int rc = ReadItems(cmd, items, 1, 1)) return context.Error(rc);
   if (int rc = SettingPath(items, path)) return context.Error(rc);
-  if (int rc = SimSettingFile::Capture(context.Params(), mSettingProfile).Write(path)) context.Error(rc);
+  if (int rc = SimSettingFile::Write(path, Capture(context).Write())) context.Error(rc);
 }
 
 void SimSettingStore::ListSettings(const SimCommand& cmd, SimContext& context) {
@@ -149,28 +144,97 @@ int SimSettingStore::SettingPath(const DataParcel& items, Dstring& path) const {
   return 0;
 }
 
-int SimSettingStore::Apply(const SimSettingFile& file, bool cableDelays, SimContext& context) {
+SettingText SimSettingStore::Capture(SimContext& context) const {
+  SettingText text;
+  const SimParamTable& params = context.Params();
+  for (std::size_t i = 0; i < params.Size(); ++i) {
+    if (!params.At(i).IsReadOnly()) text.AddValue(params.At(i).GetHeader(), params.At(i).FormatExact());
+  }
+  text.SetProfile(mSettingProfile);
+  mConnections->Capture(text);
+  mSequence->Capture(text);
+  return text;
+}
+
+// The values are put back as they were saved, not written again: a write rounds to the
+// resolution and passes a value on to its coupled partners, so a level derived from others
+// (an offset of 0.7555 V from a high level of 1.511 V) would come back changed.
+int SimSettingStore::Apply(const SettingText& text, bool cableDelays, SimContext& context, Dstring& detail) {
   SimParamTable table = mDefaults;
-  Pending pending;
-  for (const auto& [header, text] : file.GetValues()) {
+  std::map<std::size_t, int> lines;
+  for (const SettingText::Value& value : text.GetValues()) {
     std::size_t index = 0;
     // A setting made for another configuration is not this instrument's.
-    if (!table.Find(header, index)) return kStorage;
-    if (!table.At(index).IsReadOnly() && (cableDelays || !IsCableDelay(header))) pending.emplace_back(index, text);
+    if (!table.Find(value.header, index)) {
+      detail = Dstring::Format("line %d: this instrument has no parameter %s", value.line, value.header.c_str());
+      return kStorage;
+    }
+    const SimParam& param = table.At(index);
+    if (param.IsReadOnly() || (!cableDelays && IsCableDelay(param.GetHeader()))) continue;
+    if (int rc = table.Restore(index, value.text)) {
+      detail = Dstring::Format("line %d: %s does not take %s", value.line, param.GetHeader().c_str(), value.text.c_str());
+      return rc;
+    }
+    lines[index] = value.line;
   }
   const SimParamTable& now = context.Params();
   for (std::size_t i = 0; i < now.Size() && !cableDelays; ++i) {
     std::size_t index = 0;
     if (IsCableDelay(now.At(i).GetHeader()) && table.Find(now.At(i).GetHeader(), index)) {
-      pending.emplace_back(index, Dstring::Format("%.17g", now.At(i).GetNumber()));
+      table.Restore(index, now.At(i).FormatExact());
+      lines[index] = 0;
     }
   }
-  if (int rc = WriteInRounds(table, std::move(pending))) return rc;
-  table.TakeValueChanges();
-  table.TakeLimitChanges();
+  std::set<std::size_t> named;
+  for (const auto& entry : lines) named.insert(entry.first);
+  std::vector<std::size_t> broken;
+  if (!table.FinishRestore(named, broken)) {
+    DstringList names;
+    int line = 0;
+    for (std::size_t index : broken) {
+      names.push_back(table.At(index).GetHeader());
+      line = std::max(line, lines[index]);
+    }
+    detail = Dstring::Format("line %d: the values of %s do not agree with each other", line != 0 ? line : text.GetEndLine(),
+                             names.Join(", ").c_str());
+    return kConflict;
+  }
+  SimConnections::Drivers drivers;
+  if (!text.IsLegacy()) {
+    if (int rc = mSequence->Check(text, detail)) return rc;
+    if (int rc = mConnections->Check(text, drivers, detail)) return rc;
+  }
   context.Params() = std::move(table);
-  mSettingProfile = file.GetProfile();
+  mSettingProfile = text.GetProfile();
+  // A setting kept before settings held them leaves the sequence and the connections alone.
+  if (!text.IsLegacy()) {
+    mSequence->Take(text);
+    mConnections->Take(std::move(drivers));
+  }
   return 0;
+}
+
+void SimSettingStore::QueryData(const SimCommand& cmd, SimContext& context) {
+  if (cmd.HasArgs()) return context.Error(kUndefined);
+  const Dstring text = Capture(context).Write();
+  context.Reply(SimBlockHeader(text.size()) + text);
+}
+
+// [ON|OFF,]<block of the setting text>: the choice as for a load, OFF when not given.
+void SimSettingStore::WriteData(const SimCommand& cmd, SimContext& context) {
+  DataParcel items;
+  bool cableDelays = false;
+  if (int rc = ReadItems(cmd, items, 1, 2)) return context.Error(rc);
+  if (items.back().GetType() != DataItemType::Block) return context.Error(kDataType);
+  if (items.size() == 2 && !ReadSwitch(items[0], cableDelays)) return context.Error(kIllegal);
+  SettingText text;
+  SettingText::Problem problem;
+  if (!SettingText::Read(items.back().GetText(), SettingText::Kind::kSetting, text, problem)) {
+    return context.Error(kDataType, Dstring::Format("line %d: %s", problem.line, problem.what.c_str()));
+  }
+  Dstring detail;
+  if (int rc = Apply(text, cableDelays, context, detail)) return context.Error(rc, detail);
+  context.MarkAllDirty();
 }
 
 void SimSettingStore::QuerySettingProfile(const SimCommand&, SimContext& context) { context.Reply(mSettingProfile); }

@@ -22,10 +22,13 @@
 #include "data/QenDsView.h"
 #include "instrument/QenGuiInst.h"
 #include "settings/SettingFile.h"
+#include "settings/SettingTransfer.h"
 #include "support/ConditionList.h"
+#include "toolkit/Toolkit.h"
 #include "toolkit/WaitCursor.h"
 #include "windows/InstrumentWaitView.h"
 #include "toolkit/qt/StatusNotice.h"
+#include "windows/FileChoice.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -35,6 +38,9 @@ namespace {
 constexpr const char* kResourceProperty = "qenResource";
 // Long enough to read a sentence after the commit that caused it.
 constexpr int kNoticeMs = 15000;
+const QString kSettingFilter = QStringLiteral("Setting text (*.qset);;All files (*)");
+// How long the status bar says what a file command did.
+constexpr int kMessageMs = 8000;
 
 void Show(ConditionList& list) {
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
@@ -158,6 +164,9 @@ void MainWin::BuildFileMenu() {
   mSaveSetting =
       file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
   file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
+  file->addSeparator();
+  file->addAction(QStringLiteral("&Export Setting..."), this, &MainWin::HitExportSetting);
+  file->addAction(QStringLiteral("&Import Setting..."), this, &MainWin::HitImportSetting);
   file->addSeparator();
   file->addAction(QStringLiteral("&Quit"), QKeySequence::Quit, this, &QWidget::close);
 }
@@ -336,6 +345,44 @@ void MainWin::HitSaveSettingAs() {
   SettingFile::Save(name.toStdString(), uiapp::GetSettingMRU(), list);
   Show(list);
   UpdateTitle();
+}
+
+// A setting as a local file of text: to keep a test under version control or take it to
+// another instrument.
+void MainWin::HitExportSetting() {
+  const Dstring open = SettingFile::CurrentName();
+  const QString path = FileChoice::Ask(this, FileChoice::Mode::kSave, QStringLiteral("Export Setting"),
+                                       QString::fromStdString(open.empty() ? Dstring("setting") : open) + ".qset",
+                                       kSettingFilter);
+  if (path.isEmpty()) return;
+  ConditionList list;
+  int status = 0;
+  {
+    WaitCursor wait;
+    status = SettingTransfer::Export(SettingText::Kind::kSetting, path.toStdString(), list);
+  }
+  Show(list);
+  if (status == 0) statusBar()->showMessage(QStringLiteral("The setting was exported to %1.").arg(path), kMessageMs);
+}
+
+void MainWin::HitImportSetting() {
+  const QString path =
+      FileChoice::Ask(this, FileChoice::Mode::kOpen, QStringLiteral("Import Setting"), {}, kSettingFilter);
+  if (path.isEmpty()) return;
+  // The delays make up for the cables of a rack; a file from elsewhere does not know this one's.
+  const int delays = Toolkit::Get().AskYesNoCancel(
+      "Take the port delays stored in the file?\n\nYes takes them; No keeps the delays this instrument has now, "
+      "which make up for its own cables.");
+  if (delays == ToolkitPort::kCancel) return;
+  ConditionList list;
+  int status = 0;
+  {
+    WaitCursor wait;
+    status = SettingTransfer::ImportSetting(path.toStdString(), delays == ToolkitPort::kYes, list);
+  }
+  Show(list);
+  UpdateTitle();
+  if (status == 0) statusBar()->showMessage(QStringLiteral("The setting of %1 was imported.").arg(path), kMessageMs);
 }
 
 void MainWin::HitAbout() {

@@ -58,6 +58,8 @@ class MainWin : public QMainWindow {
   void HitOpenSetting();
   void HitSaveSetting();
   void HitSaveSettingAs();
+  void HitExportSetting();
+  void HitImportSetting();
   void HitAbout();
   void UpdateTitle();
   void NfyWaitAbandoned();

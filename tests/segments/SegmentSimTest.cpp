@@ -535,7 +535,7 @@ TEST_F(SegmentSimTest, SigrokReadsEveryStateOfTheExportedSegment) {
 }
 
 // A long export reports each block, and stopping it leaves no file behind.
-TEST_F(SegmentSimTest, AStoppedExportLeavesNoFile) {
+TEST_F(SegmentSimTest, AStoppedExportLeavesTheFileAsItWas) {
   QenSegmentDs* ds = Make("Text/Long", "01", 40000, 64);
   const Dstring path = mDir + "/long.txt";
   std::vector<long> done;
@@ -548,13 +548,22 @@ TEST_F(SegmentSimTest, AStoppedExportLeavesNoFile) {
     ASSERT_EQ(SegmentTextFile::Export(*ds, DataFormat::kHex, path, mList), 0) << mList.ToText();
   }
   EXPECT_EQ(done, (std::vector<long>{12496, 24992, 37488, 40000}));
-  EXPECT_TRUE(std::filesystem::exists(path.c_str()));
+  const auto whole = std::filesystem::file_size(path.c_str());
   {
     const SegmentTextFile::ProgressScope scope([](long d, long) { return d < 20000; });
     EXPECT_NE(SegmentTextFile::Export(*ds, DataFormat::kHex, path, mList), 0);
   }
   EXPECT_NE(mList.ToText().find("Stopped after 24992 of 40000 vectors"), std::string::npos) << mList.ToText();
-  EXPECT_FALSE(std::filesystem::exists(path.c_str()));
+  EXPECT_EQ(std::filesystem::file_size(path.c_str()), whole) << "the export before stays whole";
+  for (const auto& entry : std::filesystem::directory_iterator(mDir)) {
+    EXPECT_NE(entry.path().filename().string().rfind("long.txt.", 0), 0u) << "nothing stays beside it";
+  }
+  std::filesystem::remove(path.c_str());
+  {
+    const SegmentTextFile::ProgressScope scope([](long d, long) { return d < 20000; });
+    EXPECT_NE(SegmentTextFile::Export(*ds, DataFormat::kHex, path, mList), 0);
+  }
+  EXPECT_FALSE(std::filesystem::exists(path.c_str())) << "a stopped first export leaves no file";
   ds->Close(mList);
   QenSegmentPool::FreeDs(ds);
 }

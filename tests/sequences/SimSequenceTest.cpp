@@ -15,6 +15,7 @@
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceFixture.h"
+#include "sequences/SequenceTransfer.h"
 #include "support/QenEnvironment.h"
 
 namespace {
@@ -348,3 +349,72 @@ TEST_F(SimModelTest, StartLabelsInEveryReplyFormAreReadAndKept) {
 }
 
 }  // namespace
+
+namespace {
+
+// A file of the test's own.
+std::string TempPath(const char* name) {
+  return (std::filesystem::temp_directory_path() / (std::string("qengui-seqfile-") + std::to_string(::getpid()) + name))
+      .string();
+}
+
+}  // namespace
+
+TEST_F(SimModelTest, ASequenceGoesToAFileAndComesBackWholeToEveryEditor) {
+  const std::string stored =
+      "(3.0,\"start\",(SEQ," + Block10(640, "\"cnt32\"") + ",\"two\",(LOOP1,0,5,\"\"," + Block10(64) + ")))";
+  ASSERT_EQ(mOther->Call(":SGEN:GLOB:SEQ " + stored), 0);
+  ASSERT_EQ(Seq().ReadSequence(mList, 0), 0) << mList.ToText();
+  const std::string path = TempPath("whole.qseq");
+  ASSERT_EQ(SequenceTransfer::Export(path, mList), 0) << mList.ToText();
+  const std::string file = ReadFile(path);
+  EXPECT_EQ(file.rfind("qen sequence 1\nsequence (3.0,\"start\",\n  (SEQ,\n    (BLOCK,0,640,0,\"\",(),\"cnt32\",", 0), 0u)
+      << file;
+  EXPECT_EQ(file.find("events"), std::string::npos) << "without a central module there are none";
+
+  ASSERT_EQ(mOther->Call(":SGEN:GLOB:SEQ " + InitialOf("PAUSE")), 0);
+  ASSERT_EQ(Seq().ReadSequence(mList, 0), 0);
+  mOther->Text(":DFL?");
+  mObserver.log.clear();
+  ASSERT_EQ(SequenceTransfer::Import(path, mList), 0) << mList.ToText();
+  EXPECT_EQ(mOther->Text(":SGEN:GLOB:SEQ?"), stored) << "as exported, to the byte";
+  EXPECT_EQ(Seq().GetLastExpression(), stored) << "the model follows at once";
+  EXPECT_EQ(Seq().GetNumBlocks(), 2u);
+  EXPECT_FALSE(mObserver.log.empty());
+  EXPECT_EQ(mOther->Text(":DFL?"), "\":_OTHER:SGEN:GLOB:SEQ\"");
+  std::filesystem::remove(path);
+}
+
+struct SequenceFileCase {
+  const char* name;
+  const char* text;
+  const char* message;  // the start of the first condition, after the path
+};
+
+class SimSequenceFile : public SimModelTest, public testing::WithParamInterface<SequenceFileCase> {};
+
+TEST_P(SimSequenceFile, ThatCannotBeTakenIsRefusedNamingItsLineAndChangesNothing) {
+  const std::string path = TempPath(GetParam().name);
+  std::ofstream(path) << GetParam().text;
+  const std::string before = mOther->Text(":SGEN:GLOB:SEQ?");
+  EXPECT_NE(SequenceTransfer::Import(path, mList), 0);
+  ASSERT_GE(mList.Size(), 2u) << mList.ToText();
+  EXPECT_EQ(mList[0].GetMessage().find(GetParam().message), 0u) << mList[0].GetMessage();
+  EXPECT_EQ(mList[mList.Size() - 1].GetMessage(),
+            "The sequence of " + path + " was not imported: the instrument holds what it held before.");
+  EXPECT_EQ(mOther->Text(":SGEN:GLOB:SEQ?"), before);
+  EXPECT_EQ(mOther->Text(":DFL?"), "");
+  std::filesystem::remove(path);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Files, SimSequenceFile,
+    testing::Values(
+        SequenceFileCase{"Unreadable", "qen sequence 1\n# edited\nsequence (3.0,\"\",(FOO,1,2))\nend\n",
+                         "Line 3 of "},
+        SequenceFileCase{"EventsWithoutCentral",
+                         "qen sequence 1\nsequence (3.0,,)\nevents (3.0,(\"\",0,()))\nend\n", "Line 3 of "},
+        SequenceFileCase{"ASetting", "qen setting 1\nend\n", "Line 1 of "},
+        SequenceFileCase{"PortsOfAnotherRack", "qen sequence 1\nsequence (3.0,\"\",(BLOCK,0,512,0,\"\",(),PAUSE,0,0))\nend\n",
+                         "Illegal parameter value; line 2: the sequence does not fit this instrument of 10 data ports"}),
+    [](const testing::TestParamInfo<SequenceFileCase>& info) { return std::string(info.param.name); });

@@ -18,6 +18,7 @@
 #include "toolkit/WaitCursor.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/PortHeader.h"
+#include "windows/seqedit/SequenceFileMenu.h"
 #include "windows/seqedit/SequenceWindows.h"
 
 LoopGridEditWin::LoopGridEditWin(QWidget* parent)
@@ -76,6 +77,10 @@ int LoopGridEditWin::Load(ConditionList& list) {
       run();
       mGrid->setFocus();
     });
+  }
+  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) {
+    file->setFocusPolicy(Qt::NoFocus);
+    SequenceFileMenu::Attach(file, this);
   }
   connect(mGrid, &LoopGridManager::OpenSegmentRequested, this, &LoopGridEditWin::HitPButOpenSegment);
   connect(mGrid, &LoopGridManager::OpenEventsRequested, this, &LoopGridEditWin::HitPButEvents);

@@ -13,6 +13,7 @@
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/MainWin.h"
+#include "windows/seqedit/SequenceFileMenu.h"
 #include "windows/seqedit/SequenceWindows.h"
 
 SeqeditSeqEdWin::SeqeditSeqEdWin(QWidget* parent)
@@ -56,6 +57,7 @@ int SeqeditSeqEdWin::Load(ConditionList& list) {
   };
   connect(grid, &QPushButton::clicked, this, [open] { open("LoopGridEdit.Win"); });
   connect(simple, &QPushButton::clicked, this, [open] { open("smseqedit.Win"); });
+  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) SequenceFileMenu::Attach(file, this);
   mFollower->Follow(sequence);
   const int status = sequence->ReadSequence(list, 0);
   Fill();

@@ -19,6 +19,7 @@
 #include "windows/MainWin.h"
 #include "windows/PortHeader.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
+#include "windows/seqedit/SequenceFileMenu.h"
 
 SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })) {
   setObjectName(QStringLiteral("SmseqeditWin"));
@@ -51,6 +52,7 @@ int SmseqeditWin::Load(ConditionList& list) {
   connect(mTable, &QTableWidget::cellChanged, this, &SmseqeditWin::HitCellChanged);
   connect(mTable, &QTableWidget::currentCellChanged, this, [this] { mOpenSegment->setEnabled(!CurrentSegment().empty()); });
   connect(mOpenSegment, &QPushButton::clicked, this, &SmseqeditWin::HitPButOpenSegment);
+  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) SequenceFileMenu::Attach(file, this);
   AddBlockActions();
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   mFollower->Follow(GetSequence());
