@@ -5,7 +5,6 @@
 #include <QMdiArea>
 #include <QPixmap>
 #include <iostream>
-#include <memory>
 
 #include "HostConnection.h"
 #include "HostOptions.h"
@@ -16,11 +15,13 @@
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
 #include "params/ui/BoundControlClasses.h"
+#include "settings/SettingStartUp.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/QtToolkit.h"
 #include "windows/ConnectDialog.h"
 #include "windows/GridClasses.h"
 #include "windows/MainWin.h"
+#include "windows/SettingStartUpDialog.h"
 
 namespace {
 
@@ -75,6 +76,24 @@ int Screenshot(MainWin& window, const HostOptions& options) {
   return 0;
 }
 
+// The main window over the started library: a picture, or the main loop until it closes.
+int RunMainWindow(const HostOptions& options) {
+  // The status bar shows the error counts while running: the service is set up at once. A
+  // server without analyser ports just has none to show.
+  ConditionList ber;
+  uiapp::GetBerSvr()->Init(ber);
+  MainWin window;
+  window.Attach();
+  if (!options.screenshot.empty()) return Screenshot(window, options);
+  uiapp::StartPolling();
+  window.show();
+  // Where most work starts; the frame is never empty on a first run.
+  if (QWidget* editor = window.OpenWindow(QStringLiteral("paramedit.ParamEd"))) editor->parentWidget()->showMaximized();
+  uiapp::MainLoop();
+  uiapp::EndPolling();
+  return 0;
+}
+
 }  // namespace
 
 int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim) {
@@ -103,27 +122,13 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
   int code = 1;
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
   list.Clear();
+  SettingStartUpDialog startUp;
+  SettingStartUp::SetDialog(&startUp);
   if (ChooseServer(options, sim)) {
     if (HostConnection::Open(options.host, options.port, options.resource, list) == 0) {
-      uiapp::RegistrationFinished();
-      // The status bar shows the error counts while running: the service is set up at once. A
-      // server without analyser ports just has none to show.
-      ConditionList ber;
-      uiapp::GetBerSvr()->Init(ber);
-      auto window = std::make_unique<MainWin>();
-      window->Attach();
-      if (!options.screenshot.empty()) {
-        code = Screenshot(*window, options);
-      } else {
-        uiapp::StartPolling();
-        window->show();
-        // Where most work starts; the frame is never empty on a first run.
-        if (QWidget* editor = window->OpenWindow(QStringLiteral("paramedit.ParamEd"))) editor->parentWidget()->showMaximized();
-        uiapp::MainLoop();
-        uiapp::EndPolling();
-        code = 0;
-      }
-      window.reset();
+      // Cancelling the start-up dialog ends the start as if it had not begun; a picture only looks.
+      const uiapp::StartUse use = options.screenshot.empty() ? uiapp::StartUse::kConfigured : uiapp::StartUse::kOnlyLook;
+      code = uiapp::RegistrationFinished(use) == 0 ? RunMainWindow(options) : 0;
     } else {
       QenGuiInst::ShowErrorDlg(list, 1);
     }
@@ -132,6 +137,7 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
   } else {
     code = 0;
   }
+  SettingStartUp::SetDialog(nullptr);
   ErrorJournal::Uninstall();
   list.Clear();
   uiapp::End(list);
