@@ -6,7 +6,6 @@
 #include <QMdiArea>
 #include <QPixmap>
 #include <iostream>
-#include <memory>
 
 #include "HostConnection.h"
 #include "HostOptions.h"
@@ -17,11 +16,13 @@
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
 #include "params/ui/BoundControlClasses.h"
+#include "settings/SettingStartUp.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/QtToolkit.h"
 #include "windows/ConnectDialog.h"
 #include "windows/GridClasses.h"
 #include "windows/MainWin.h"
+#include "windows/SettingStartUpDialog.h"
 
 namespace {
 
@@ -86,7 +87,9 @@ QString TypedAddress(const HostOptions& options) {
 // Connected and with the handle: the first setting, the main window and its loop. Sets
 // `reconnect` when the user gave the connection up and wants another.
 int RunSession(const HostOptions& options, bool& reconnect) {
-  uiapp::RegistrationFinished();
+  // Cancelling the start-up dialog ends the start as if it had not begun; a picture only looks.
+  const uiapp::StartUse use = options.screenshot.empty() ? uiapp::StartUse::kConfigured : uiapp::StartUse::kOnlyLook;
+  if (uiapp::RegistrationFinished(use) != 0) return 0;
   // The status bar shows the error counts while running: the service is set up at once. A
   // server without analyser ports just has none to show.
   ConditionList ber;
@@ -142,6 +145,8 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
   ErrorJournal::Install();
   if (!list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
   list.Clear();
+  SettingStartUpDialog startUp;
+  SettingStartUp::SetDialog(&startUp);
   int code = 1;
   QString typed;
   for (;;) {
@@ -166,6 +171,7 @@ int GuiHost::Run(int argc, char** argv, HostOptions options, QenSimProcess& sim)
     typed = TypedAddress(options);
     options.askServer = true;
   }
+  SettingStartUp::SetDialog(nullptr);
   ErrorJournal::Uninstall();
   list.Clear();
   uiapp::End(list);

@@ -79,7 +79,8 @@ int RunHeadless(const HostOptions& options) {
   QenGuiInst::SetCallWaiter(&waiter);
   int code = 1;
   if (HostConnection::Open(options.host, options.port, options.resource, list) == QenStatus::kOk) {
-    uiapp::RegistrationFinished();
+    // A headless host only looks: it never loads or starts a setting.
+    uiapp::RegistrationFinished(uiapp::StartUse::kOnlyLook);
     HeadlessHost host(std::cout, toolkit, DstringList(options.watch.begin(), options.watch.end()), options.seconds);
     code = host.Run();
   } else {

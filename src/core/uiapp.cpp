@@ -20,8 +20,10 @@
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SegmentPoolSync.h"
+#include "settings/OpenSettingDs.h"
 #include "settings/QENSettingProfile.h"
 #include "settings/SettingStartUp.h"
+#include "settings/SettingsStatus.h"
 #include "support/ConditionListLoader.h"
 #include "support/ErrorMgr.h"
 #include "support/FWBlocker.h"
@@ -36,6 +38,7 @@ DataPortOneLockDs* uiapp::mDataPortOneLockDs = nullptr;
 ConnectDs* uiapp::mConnectDs = nullptr;
 DirtyFlagDs* uiapp::mDirtyFlagDs = nullptr;
 GuiLockDs* uiapp::mGuiLockDs = nullptr;
+OpenSettingDs* uiapp::mOpenSettingDs = nullptr;
 BerSvr* uiapp::mBerSvr = nullptr;
 ErrorMgr* uiapp::mErrorMgr = nullptr;
 SettingMRU uiapp::mSettingMRU;
@@ -97,6 +100,7 @@ int uiapp::Init(ConditionList& list) {
   mConnectDs = new ConnectDs;
   mGuiLockDs = new GuiLockDs;
   mBerSvr = new BerSvr;
+  mOpenSettingDs = new OpenSettingDs;
   ForEachStateView([&](QenDsView* v) { mDirtyFlagDs->RegisterView(v, list); }, mRunStopDs, mSystemStateDs,
                    mPLLStateDs, mDataPortOneLockDs, mConnectDs);
   mSystemStateDs->RegisterProc(&uiapp::NfyViewDataUpdatedSysState, nullptr);
@@ -115,6 +119,7 @@ int uiapp::End(ConditionList& list) {
     Toolkit::Get().StopCBackAlarm();
     callSyncAlarmProc = 0;
     mBerSvr->End();
+    mOpenSettingDs->EndFollow(list);
     DestroyAppHandle(handle, list);
   }
   CPortInfo::End();
@@ -141,6 +146,8 @@ int uiapp::End(ConditionList& list) {
   mConnectDs = nullptr;
   mGuiLockDs = nullptr;
   mBerSvr = nullptr;
+  mOpenSettingDs->Release();
+  mOpenSettingDs = nullptr;
   return 0;
 }
 
@@ -174,16 +181,22 @@ void uiapp::UnregisterWindows() {
   for (const auto& resource : WindowResources()) Toolkit::Get().UnregisterWindow(resource);
 }
 
-void uiapp::RegistrationFinished() {
+int uiapp::RegistrationFinished(StartUse use) {
   ConditionList list;
   FWBlocker guard("uiapp::RegistrationFinished", list);
-  if (guard.Block()) return;
-  SettingStartUp::Run(mConfigParamSet, Toolkit::Get(), mSettingMRU, list);
-  if (!list.IsEmpty()) {
-    QenGuiInst::ShowErrorDlg(list, 1);
-    list.Clear();
+  if (guard.Block()) return 0;
+  if (use == StartUse::kOnlyLook) {
+    mOpenSettingDs->Read(list);
+  } else {
+    if (SettingStartUp::Run(mConfigParamSet, Toolkit::Get(), mSettingMRU, *mOpenSettingDs) != 0) {
+      return SettingsStatus::kStartCancelled;
+    }
+    mOpenSettingDs->Follow(mResource, list);
   }
+  QenGuiInst::ShowErrorDlg(list, 1);
+  list.Clear();
   if (CSequence::InitNumLoopLevels(list) != QenStatus::kLocked && !list.IsEmpty()) QenGuiInst::ShowErrorDlg(list, 1);
+  return 0;
 }
 
 int uiapp::CreateAppHandle(Dstring& handle, const Dstring& resource, ConditionList& list) {
@@ -311,6 +324,7 @@ void uiapp::AsyncTimeOut() {
   if (blocked) return;
   if (mGuiLockDs->IsLocked() && AfterLockReleased(dropped) != 0) return;
   if (!mDirtyFlagDs->IsDirty() && mDirtyFlagDs->UpdateFromFW(dropped) != 0) return;
+  if (mOpenSettingDs->UpdateFromFW(dropped) != 0) return;
   const SysStateEnum state = mSystemStateDs->GetState();
   if (state >= kSysRunning && state <= kSysSync) mBerSvr->UpdateFromFW(BerSvr::kReadResults, dropped);
 }

@@ -13,6 +13,7 @@ class DataPortOneLockDs;
 class DirtyFlagDs;
 class ErrorMgr;
 class GuiLockDs;
+class OpenSettingDs;
 class PLLStateDs;
 class QenDs;
 class RunStopDs;
@@ -44,7 +45,12 @@ class uiapp {
   static void RegisterVerbs();
   static void RegisterWindows();
   static void UnregisterWindows();
-  static void RegistrationFinished();
+  // How the start treats the instrument's setting: as the start-up configuration says, or only
+  // looking (a screenshot or headless host), which never loads or starts a setting.
+  enum class StartUse { kConfigured, kOnlyLook };
+  // The start-up configuration and the first setting; then the setting is followed. 0, or
+  // SettingsStatus::kStartCancelled when the user cancelled the start-up dialog: the start ends.
+  static int RegistrationFinished(StartUse use = StartUse::kConfigured);
   // The window resources bound by RegisterWindows, in order.
   static const std::vector<Dstring>& WindowResources();
 
@@ -78,6 +84,7 @@ class uiapp {
   static ConnectDs* GetConnectDs() { return mConnectDs; }
   static DirtyFlagDs* GetDirtyFlagDs() { return mDirtyFlagDs; }
   static GuiLockDs* GetGuiLockDs() { return mGuiLockDs; }
+  static OpenSettingDs* GetOpenSettingDs() { return mOpenSettingDs; }
   static BerSvr* GetBerSvr() { return mBerSvr; }
   static ErrorMgr* GetErrorMgr() { return mErrorMgr; }
   static SettingMRU& GetSettingMRU() { return mSettingMRU; }
@@ -112,6 +119,7 @@ class uiapp {
   static ConnectDs* mConnectDs;
   static DirtyFlagDs* mDirtyFlagDs;
   static GuiLockDs* mGuiLockDs;
+  static OpenSettingDs* mOpenSettingDs;
   static BerSvr* mBerSvr;
   static ErrorMgr* mErrorMgr;
   static SettingMRU mSettingMRU;

@@ -28,6 +28,13 @@ Outcome ReadReply(const Dstring& reply, T& value) {
 }  // namespace
 
 int QENSystemProfile::Exists(const Dstring& name, int& exists, ConditionList& list) {
+  DstringList names;
+  if (int status = Names(names, list)) return status;
+  exists = names.Contains(name) ? 1 : 0;
+  return QenStatus::kOk;
+}
+
+int QENSystemProfile::Names(DstringList& out, ConditionList& list) {
   Dstring reply;
   const Dstring cmd = Dstring::Format("%s:CONF:PROF:LIST?", QenGuiInst::GetAppHandle().c_str());
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
@@ -40,8 +47,8 @@ int QENSystemProfile::Exists(const Dstring& name, int& exists, ConditionList& li
     ConditionListLoader::ConditionToken(list, "GUI_SYSTEM_PROFILE_BAD_LIST", {reply}, SettingsStatus::kBadReply);
     return SettingsStatus::kBadReply;
   }
-  exists = 0;
-  for (const DataItem& item : names) exists = exists || item.GetText() == name;
+  out.clear();
+  for (const DataItem& item : names) out.push_back(Dstring(item.GetText()));
   return QenStatus::kOk;
 }
 

@@ -2,6 +2,7 @@
 
 #include "support/ConditionList.h"
 #include "support/DataParcel.h"
+#include "support/DstringList.h"
 #include "support/Dstring.h"
 #include "support/LispList.h"
 
@@ -11,6 +12,8 @@
 class QENSystemProfile {
  public:
   static int Exists(const Dstring& name, int& exists, ConditionList& list);
+  // The names of every value, as the server lists them: one command.
+  static int Names(DstringList& names, ConditionList& list);
   static int GetValue(const Dstring& name, long& value, ConditionList& list);
   static int GetValue(const Dstring& name, unsigned long& value, ConditionList& list);
   static int GetValue(const Dstring& name, float& value, ConditionList& list);

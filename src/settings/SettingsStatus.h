@@ -13,4 +13,8 @@ inline constexpr int kBadReply = -35;
 inline constexpr int kRegistryError = -36;
 inline constexpr int kNotFinite = -37;
 inline constexpr int kBadStartUp = -38;
+// The user cancelled the start-up dialog: the start ends.
+inline constexpr int kStartCancelled = -39;
+// The user answered no to a question the operation asked: nothing was done.
+inline constexpr int kDeclined = -40;
 }  // namespace SettingsStatus

@@ -14,6 +14,7 @@ struct StartWord {
 };
 
 constexpr StartWord kStartWords[] = {
+    {"KEEP", StartUpConfig::Start::kKeepSetting},
     {"NEW", StartUpConfig::Start::kNewSetting},
     {"LOAD", StartUpConfig::Start::kLoadSetting},
 };

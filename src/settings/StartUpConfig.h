@@ -4,14 +4,16 @@
 #include "support/Dstring.h"
 
 // How the interface starts for a configuration parameter set: with the start-up dialog or
-// not, with a new setting or by loading a named one, and whether that load takes the cable
-// delays stored in the setting. Kept in the registry below the current user's
-// "...\Gui\StartUpParameterSet<n>" as the values ShowDialog (0u/1u), Start (NEW or LOAD),
-// SettingName (text) and CableDelay (0u/1u). A value that is missing keeps its default; when
-// the key is missing altogether, the same key below the maker's former name is read.
+// not; keeping the setting the instrument holds, with a new setting, or by loading a named
+// one, and whether that load takes the cable delays stored in the setting. Kept in the
+// registry below the current user's "...\Gui\StartUpParameterSet<n>" as the values
+// ShowDialog (0u/1u), Start (KEEP, NEW or LOAD), SettingName (text) and CableDelay (0u/1u). A
+// value that is missing keeps its default; when the key is missing altogether, the same key
+// below the maker's former name is read. By default a start keeps what the instrument holds:
+// connecting changes nothing unless the user asked for it.
 class StartUpConfig {
  public:
-  enum class Start { kNewSetting, kLoadSetting };
+  enum class Start { kKeepSetting, kNewSetting, kLoadSetting };
   static constexpr const char* kDefaultSettingName = "UNTITLED";
 
   static Dstring KeyOf(unsigned long paramSet);
@@ -37,7 +39,7 @@ class StartUpConfig {
   int ReadFrom(const Dstring& key, ConditionList& list);
 
   bool mShowDialog = false;
-  Start mStart = Start::kNewSetting;
+  Start mStart = Start::kKeepSetting;
   Dstring mSettingName = kDefaultSettingName;
   bool mCableDelay = false;
 };

@@ -90,6 +90,14 @@ int HeadlessToolkit::AskYesNo(const Dstring& text) {
   return answer;
 }
 
+int HeadlessToolkit::AskChoice(const Dstring& text, const Dstring&, const Dstring&) {
+  mQuestions.push_back(text);
+  if (mAnswers.empty()) return kCancel;
+  int answer = mAnswers.front();
+  mAnswers.pop_front();
+  return answer;
+}
+
 void HeadlessToolkit::RegisterScriptItems(const char*, const std::vector<Dstring>& names, unsigned) {
   mScriptItems += static_cast<unsigned>(names.size());
 }

@@ -24,6 +24,8 @@ class HeadlessToolkit : public ToolkitPort {
   void Alert(const Dstring& text, Icon icon) override;
   int AskYesNo(const Dstring& text) override;
   int AskYesNoCancel(const Dstring& text) override { return AskYesNo(text); }
+  // Without an answer queued: kCancel, the answer that changes nothing.
+  int AskChoice(const Dstring& text, const Dstring& yes, const Dstring& no) override;
   void SetWaitCursor(bool on) override { mWaitCursor = on; }
   bool IsShiftDown() override { return mShiftDown; }
   // Without a display there are no resources to read: the names are only recorded.

@@ -33,6 +33,9 @@ class ToolkitPort {
   virtual int AskYesNo(const Dstring& text) = 0;
   // kYes, kNo or kCancel: a question whose answer may also be to go back.
   virtual int AskYesNoCancel(const Dstring& text) = 0;
+  // A question whose answers say what they do: kYes for `yes` ("Save"), kNo for `no`
+  // ("Discard"), kCancel to go back. An empty `no` offers only `yes` and Cancel.
+  virtual int AskChoice(const Dstring& text, const Dstring& yes, const Dstring& no) = 0;
   virtual void SetWaitCursor(bool on) = 0;
   virtual bool IsShiftDown() = 0;
 

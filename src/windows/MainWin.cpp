@@ -21,8 +21,10 @@
 #include "data/GuiLockDs.h"
 #include "data/QenDsView.h"
 #include "instrument/QenGuiInst.h"
+#include "settings/OpenSettingDs.h"
 #include "settings/SettingFile.h"
 #include "settings/SettingTransfer.h"
+#include "settings/StartUpConfig.h"
 #include "support/ConditionList.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/WaitCursor.h"
@@ -124,6 +126,9 @@ MainWin::~MainWin() {
   disconnect(mArea, nullptr, this, nullptr);
   StatusNotice::Install({});
   if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
+  if (mLockView && uiapp::GetOpenSettingDs() != nullptr) {
+    uiapp::GetOpenSettingDs()->UnregisterProc(&MainWin::NfyOpenSetting, this);
+  }
   if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
     ConditionList list;
     uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
@@ -137,6 +142,7 @@ void MainWin::Attach() {
   mLockView = std::make_unique<LockView>(*this);
   ConditionList list;
   uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
+  uiapp::GetOpenSettingDs()->RegisterProc(&MainWin::NfyOpenSetting, this);
   ShowLock(uiapp::GetGuiLockDs()->IsLocked());
   UpdateTitle();
   QenGuiInst::SetCallWaiter(mWait);
@@ -157,13 +163,16 @@ void MainWin::BuildMenus() {
 
 void MainWin::BuildFileMenu() {
   QMenu* file = menuBar()->addMenu(QStringLiteral("&File"));
-  file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting);
-  file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting);
+  mSettingActions.push_back(file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting));
+  mSettingActions.push_back(file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting));
   mRecent = file->addMenu(QStringLiteral("Recent &Settings"));
+  mSettingActions.push_back(mRecent->menuAction());
   connect(mRecent, &QMenu::aboutToShow, this, &MainWin::FillRecentMenu);
   mSaveSetting =
       file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
-  file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
+  mSettingActions.push_back(mSaveSetting);
+  mSettingActions.push_back(
+      file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs));
   file->addSeparator();
   file->addAction(QStringLiteral("&Export Setting..."), this, &MainWin::HitExportSetting);
   file->addAction(QStringLiteral("&Import Setting..."), this, &MainWin::HitImportSetting);
@@ -212,11 +221,7 @@ void MainWin::FillRecentMenu() {
   for (const Dstring& name : uiapp::GetSettingMRU().GetNames()) {
     const QString text = QString::fromStdString(name);
     mRecent->addAction(text, this, [this, name] {
-      ConditionList list;
-      WaitCursor wait;
-      SettingFile::Open(name, false, uiapp::GetSettingMRU(), list);
-      Show(list);
-      UpdateTitle();
+      if (ConfirmLeaveSetting("opening another")) OpenSetting(name);
     });
   }
   if (mRecent->isEmpty()) mRecent->addAction(QStringLiteral("(none)"))->setEnabled(false);
@@ -290,6 +295,7 @@ void MainWin::ShowLock(bool locked) {
   for (QAction* action : menuBar()->actions()) {
     if (action->text() == QStringLiteral("&Instrument")) action->menu()->setEnabled(!locked);
   }
+  EnableSettingActions(!locked);
 }
 
 void MainWin::RunAction(int (*action)(ConditionList&)) {
@@ -302,13 +308,15 @@ void MainWin::RunAction(int (*action)(ConditionList&)) {
 }
 
 void MainWin::HitNewSetting() {
+  if (!ConfirmLeaveSetting("starting a new setting")) return;
   ConditionList list;
-  SettingFile::New(list);
+  WaitCursor wait;
+  uiapp::GetOpenSettingDs()->New(list);
   Show(list);
-  UpdateTitle();
 }
 
 void MainWin::HitOpenSetting() {
+  if (!ConfirmLeaveSetting("opening another")) return;
   ConditionList list;
   DstringList names;
   if (SettingFile::Catalogue(names, list) != 0) return Show(list);
@@ -321,36 +329,71 @@ void MainWin::HitOpenSetting() {
   bool ok = false;
   const QString name = QInputDialog::getItem(this, QStringLiteral("Open Setting"), QStringLiteral("Setting:"), items, 0,
                                              false, &ok);
-  if (!ok) return;
+  if (ok) OpenSetting(name.toStdString());
+}
+
+void MainWin::OpenSetting(const Dstring& name) {
+  ConditionList list;
   WaitCursor wait;
-  SettingFile::Open(name.toStdString(), false, uiapp::GetSettingMRU(), list);
+  uiapp::GetOpenSettingDs()->Load(name, false, uiapp::GetSettingMRU(), list);
   Show(list);
-  UpdateTitle();
 }
 
-void MainWin::HitSaveSetting() {
-  const Dstring current = SettingFile::CurrentName();
-  if (current.empty()) return HitSaveSettingAs();
+void MainWin::HitSaveSetting() { SaveSetting(); }
+
+void MainWin::HitSaveSettingAs() { SaveSettingAs(); }
+
+// A new setting has no name to save under: Save asks for one.
+bool MainWin::SaveSetting() {
+  const Dstring name = uiapp::GetOpenSettingDs()->GetName();
+  if (name.empty()) return SaveSettingAs();
   ConditionList list;
-  SettingFile::Save(current, uiapp::GetSettingMRU(), list);
+  WaitCursor wait;
+  const int status = uiapp::GetOpenSettingDs()->Save(name, uiapp::GetSettingMRU(), list);
   Show(list);
+  return status == 0;
 }
 
-void MainWin::HitSaveSettingAs() {
+bool MainWin::SaveSettingAs() {
   bool ok = false;
-  const QString name = QInputDialog::getText(this, QStringLiteral("Save Setting As"), QStringLiteral("Name:"),
-                                             QLineEdit::Normal, QString::fromStdString(SettingFile::CurrentName()), &ok);
-  if (!ok) return;
+  const QString text = QInputDialog::getText(this, QStringLiteral("Save Setting As"), QStringLiteral("Name:"), QLineEdit::Normal,
+                                             QString::fromStdString(uiapp::GetOpenSettingDs()->GetName()), &ok);
+  if (!ok) return false;
+  auto replace = [](const Dstring& name) {
+    const Dstring question = Dstring::Format("The instrument keeps a setting named \"%s\" already. Replace it?", name.c_str());
+    return Toolkit::Get().AskChoice(question, "Replace", "") == ToolkitPort::kYes;
+  };
   ConditionList list;
-  SettingFile::Save(name.toStdString(), uiapp::GetSettingMRU(), list);
+  WaitCursor wait;
+  const int status = uiapp::GetOpenSettingDs()->Save(text.trimmed().toStdString(), uiapp::GetSettingMRU(), list, replace);
   Show(list);
-  UpdateTitle();
+  return status == 0;
+}
+
+bool MainWin::ConfirmLeaveSetting(const char* doing) {
+  const OpenSettingDs& setting = *uiapp::GetOpenSettingDs();
+  if (!setting.IsModified()) return true;
+  const Dstring name = setting.GetName().empty() ? Dstring(StartUpConfig::kDefaultSettingName) : setting.GetName();
+  const int answer = Toolkit::Get().AskChoice(
+      Dstring::Format("The setting \"%s\" has changes that are not saved. Save it before %s?", name.c_str(), doing),
+      "Save", "Discard");
+  if (answer == ToolkitPort::kCancel) return false;
+  return answer == ToolkitPort::kNo || SaveSetting();
+}
+
+void MainWin::EnableSettingActions(bool on) {
+  for (QAction* action : mSettingActions) action->setEnabled(on);
+}
+
+int MainWin::NfyOpenSetting(QenDs*, void* client, ConditionList&) {
+  static_cast<MainWin*>(client)->UpdateTitle();
+  return 0;
 }
 
 // A setting as a local file of text: to keep a test under version control or take it to
 // another instrument.
 void MainWin::HitExportSetting() {
-  const Dstring open = SettingFile::CurrentName();
+  const Dstring open = uiapp::GetOpenSettingDs()->GetName();
   const QString path = FileChoice::Ask(this, FileChoice::Mode::kSave, QStringLiteral("Export Setting"),
                                        QString::fromStdString(open.empty() ? Dstring("setting") : open) + ".qset",
                                        kSettingFilter);
@@ -368,7 +411,7 @@ void MainWin::HitExportSetting() {
 void MainWin::HitImportSetting() {
   const QString path =
       FileChoice::Ask(this, FileChoice::Mode::kOpen, QStringLiteral("Import Setting"), {}, kSettingFilter);
-  if (path.isEmpty()) return;
+  if (path.isEmpty() || !ConfirmLeaveSetting("importing another")) return;
   // The delays make up for the cables of a rack; a file from elsewhere does not know this one's.
   const int delays = Toolkit::Get().AskYesNoCancel(
       "Take the port delays stored in the file?\n\nYes takes them; No keeps the delays this instrument has now, "
@@ -380,6 +423,8 @@ void MainWin::HitImportSetting() {
     WaitCursor wait;
     status = SettingTransfer::ImportSetting(path.toStdString(), delays == ToolkitPort::kYes, list);
   }
+  // The instrument holds a setting of no name now; the poll marks it as not saved.
+  if (status == 0) uiapp::GetOpenSettingDs()->Read(list);
   Show(list);
   UpdateTitle();
   if (status == 0) statusBar()->showMessage(QStringLiteral("The setting of %1 was imported.").arg(path), kMessageMs);
@@ -396,13 +441,16 @@ void MainWin::HitAbout() {
 }
 
 void MainWin::UpdateTitle() {
-  const Dstring setting = SettingFile::CurrentName();
-  setWindowTitle(QStringLiteral("%1 - Corvane 71300").arg(setting.empty() ? QStringLiteral("UNTITLED") : QString::fromStdString(setting)));
+  const OpenSettingDs* setting = uiapp::GetOpenSettingDs();
+  const QString name = setting != nullptr ? QString::fromStdString(setting->Title()) : QStringLiteral("UNTITLED");
+  setWindowTitle(QStringLiteral("%1 - Corvane 71300").arg(name));
 }
 
-// Every window is asked first: one with unsaved work may keep the program open.
+// The setting first, then every window: one with unsaved work may keep the program open.
 void MainWin::closeEvent(QCloseEvent* event) {
   if (HoldCloseDuringWait(this, event)) return;
+  // A connection given up has nothing to save to.
+  if (!mEndedToReconnect && !ConfirmLeaveSetting("quitting")) return event->ignore();
   mArea->closeAllSubWindows();
   if (!mArea->subWindowList().isEmpty()) return event->ignore();
   uiapp::MainLoopExit();

@@ -2,19 +2,24 @@
 
 #include <QMainWindow>
 #include <memory>
+#include <vector>
 
 class QAction;
 class QLabel;
+class QenDs;
 class QMdiArea;
 class QMdiSubWindow;
 class QMenu;
 class InstrumentWaitView;
 class StateStatusBar;
 class ConditionList;
+class Dstring;
 
 // The frame of the program: the windows in an MDI area, the File, Instrument, Windows and Help
 // menus, the run toolbar and the status bar of the instrument's state. While another client
 // holds the instrument every window is read-only and a banner says so; it clears by itself.
+// The title names the setting the instrument holds, with " *" while it is modified; New, Open
+// and Quit ask to save a modified setting first.
 class MainWin : public QMainWindow {
   Q_OBJECT
 
@@ -56,10 +61,20 @@ class MainWin : public QMainWindow {
   void RunAction(int (*action)(ConditionList&));
   void HitNewSetting();
   void HitOpenSetting();
+  void OpenSetting(const Dstring& name);
   void HitSaveSetting();
   void HitSaveSettingAs();
   void HitExportSetting();
   void HitImportSetting();
+  // Each true when the setting was saved; false when the user went back or the save failed
+  // (and said why).
+  bool SaveSetting();
+  bool SaveSettingAs();
+  // Before the setting is left ("quitting"): true when it may go, asking first to save a
+  // modified one (Save, Discard, Cancel).
+  bool ConfirmLeaveSetting(const char* doing);
+  void EnableSettingActions(bool on);
+  static int NfyOpenSetting(QenDs*, void* client, ConditionList&);
   void HitAbout();
   void UpdateTitle();
   void NfyWaitAbandoned();
@@ -76,6 +91,8 @@ class MainWin : public QMainWindow {
   InstrumentWaitView* mWait;
   QMenu* mRecent = nullptr;
   QAction* mSaveSetting = nullptr;
+  // New, Open, Recent, Save and Save As: off while another client holds the instrument.
+  std::vector<QAction*> mSettingActions;
   std::unique_ptr<LockView> mLockView;
   std::unique_ptr<SelfTestTool> mSelfTest;
   bool mEndedToReconnect = false;

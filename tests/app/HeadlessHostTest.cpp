@@ -8,6 +8,9 @@
 #include "common/HostProcess.h"
 #include "common/SimProcess.h"
 #include "instrument/QenTcpInstrument.h"
+#include "settings/FileRegistryStore.h"
+#include "settings/QENRegistryProfile.h"
+#include "settings/StartUpConfig.h"
 
 namespace {
 
@@ -99,4 +102,31 @@ TEST_F(HeadlessHostTest, CtrlCEndsTheHostAtOnceWhileTheInstrumentIsSlow) {
   EXPECT_FALSE(host.WaitForOutput("not printed", 1500));
   host.Signal(SIGINT);
   EXPECT_EQ(host.WaitForExit(2000), 0) << host.Output();
+}
+
+// Hosts that only look never load nor start a setting, whatever the start-up configuration of
+// the registry they share with the window host asks for.
+TEST_F(HeadlessHostTest, LookingHostsLeaveTheInstrumentsSettingAlone) {
+  FileRegistryStore registry("/tmp/qengui-test-config-" + std::to_string(::getpid()) + "/qengui/registry");
+  QENRegistryProfile::SetStore(&registry);
+  StartUpConfig config;
+  config.SetStart(StartUpConfig::Start::kNewSetting);
+  ConditionList list;
+  ASSERT_EQ(config.Write(0, list), 0) << list.ToText();
+  QENRegistryProfile::SetStore(nullptr);
+  ASSERT_EQ(Other(":" + mOtherHandle + ":CGR1:PER 4E-9"), 0);
+  Dstring reply;
+  ASSERT_EQ(mOther.Call(":" + mOtherHandle + ":DFL?", reply), 0);
+
+  HostProcess headless(Args({"--seconds", "1"}));
+  EXPECT_EQ(headless.WaitForExit(kPatience), 0) << headless.Output();
+  const std::string picture = mLogDir + ".png";
+  HostProcess shot({"--log-dir", mLogDir, "127.0.0.1:" + std::to_string(mSim.Port()), "--screenshot", picture});
+  EXPECT_EQ(shot.WaitForExit(60000), 0) << shot.Output();
+  std::remove(picture.c_str());
+
+  ASSERT_EQ(mOther.Call(":" + mOtherHandle + ":CGR1:PER?", reply), 0);
+  EXPECT_EQ(reply, "4.000000000000E-09");
+  ASSERT_EQ(mOther.Call(":" + mOtherHandle + ":DFL?", reply), 0);
+  EXPECT_EQ(reply.find("ALL"), Dstring::npos) << reply;
 }

@@ -2,6 +2,7 @@
 
 #include <QApplication>
 #include <QMessageBox>
+#include <QPushButton>
 
 #include "toolkit/qt/ResourceLibrary.h"
 #include "toolkit/qt/WidgetClassTable.h"
@@ -72,6 +73,24 @@ int QtToolkit::AskYesNoCancel(const Dstring& text) {
                                             QString::fromStdString(text),
                                             QMessageBox::Yes | QMessageBox::No | QMessageBox::Cancel, QMessageBox::Cancel);
   return answer == QMessageBox::Yes ? kYes : answer == QMessageBox::No ? kNo : kCancel;
+}
+
+int QtToolkit::AskChoice(const Dstring& text, const Dstring& yes, const Dstring& no) {
+  if (!mAnswers.empty()) return AskYesNo(text);
+  if (mAlertSink) {
+    mAlertSink(text, Icon::Information);
+    return kCancel;
+  }
+  QMessageBox box(QMessageBox::Question, QApplication::applicationDisplayName(), QString::fromStdString(text),
+                  QMessageBox::NoButton, QApplication::activeWindow());
+  QPushButton* yesButton = box.addButton(QString::fromStdString(yes), QMessageBox::AcceptRole);
+  QPushButton* noButton = no.empty() ? nullptr : box.addButton(QString::fromStdString(no), QMessageBox::DestructiveRole);
+  QPushButton* cancel = box.addButton(QMessageBox::Cancel);
+  box.setDefaultButton(yesButton);
+  box.setEscapeButton(cancel);
+  box.exec();
+  if (box.clickedButton() == yesButton) return kYes;
+  return noButton != nullptr && box.clickedButton() == noButton ? kNo : kCancel;
 }
 
 void QtToolkit::SetWaitCursor(bool on) {

@@ -26,6 +26,7 @@ class QtToolkit : public QObject, public ToolkitPort {
   void Alert(const Dstring& text, Icon icon) override;
   int AskYesNo(const Dstring& text) override;
   int AskYesNoCancel(const Dstring& text) override;
+  int AskChoice(const Dstring& text, const Dstring& yes, const Dstring& no) override;
   void SetWaitCursor(bool on) override;
   bool IsShiftDown() override;
   int LoadResourceLibrary(const Dstring& name, ConditionList& list) override;
@@ -34,7 +35,9 @@ class QtToolkit : public QObject, public ToolkitPort {
   void UnregisterWindow(const Dstring& resource) override { mWindows.erase(resource); }
   void RegisterScriptItems(const char* kind, const std::vector<Dstring>& names, unsigned flag) override;
 
-  // Alerts go to `sink` instead of a message box; questions take the queued answers.
+  // Alerts go to `sink` instead of a message box; questions take the queued answers (a
+  // question without one, asked while a sink is set, is told to the sink and answered kNo, or
+  // kCancel where it offers that).
   void SetAlertSink(std::function<void(const Dstring&, Icon)> sink) { mAlertSink = std::move(sink); }
   void QueueAnswer(int answer) { mAnswers.push_back(answer); }
   bool IsAlarmArmed() const { return mAlarm.isActive(); }
