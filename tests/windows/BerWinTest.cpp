@@ -3,6 +3,8 @@
 #include <QChart>
 #include <QLineSeries>
 #include <QPushButton>
+#include <QRegularExpression>
+#include <QValueAxis>
 #include <QTableWidget>
 #include <QTest>
 #include <cstdio>
@@ -13,6 +15,7 @@
 #include "common/gui/GuiSimFixture.h"
 #include "core/uiapp.h"
 #include "data/BerSvr.h"
+#include "windows/GroupedNumber.h"
 #include "windows/ber/BerBerWin.h"
 
 namespace {
@@ -103,4 +106,59 @@ TEST_F(BerWinTest, ExportsTheTableAndTheHistoryAndNamesAPathItCannotWrite) {
   ConditionList refused;
   EXPECT_NE(mWin->ExportTable("/nonexistent-dir/ber.csv", refused), 0);
   EXPECT_NE(refused.ToText().find("/nonexistent-dir/ber.csv"), std::string::npos) << refused.ToText();
+}
+
+// A program started after a run shows the counts the run left, not nothing: the service reads
+// them when it is set up, as the host does at start.
+TEST_F(BerWinTest, ANewlyStartedProgramShowsTheCountsARunLeft) {
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  for (int i = 0; i < 2000 && Other(mPort + "?").find(",0,") != std::string::npos; ++i) {
+  }
+  Other(":SGEN:GLOB:INIT:CONT OFF");
+  const Dstring counts = Other(mPort + "?");
+  const std::size_t comma = counts.find(',');
+  const unsigned long long compared = std::stoull(counts.substr(0, comma));
+  const unsigned long long errors = std::stoull(counts.substr(comma + 1));
+  ASSERT_GT(errors, 0u) << counts;
+
+  mWin.reset();
+  uiapp::GetBerSvr()->End();
+  ASSERT_EQ(uiapp::GetBerSvr()->Init(mList), 0) << mList.ToText();
+  Poll();
+  mWin = std::make_unique<BerBerWin>();
+  ASSERT_EQ(mWin->Load(mList), 0) << mList.ToText();
+  EXPECT_EQ(Cell(0, 1), GroupedCount(compared).toStdString());
+  EXPECT_EQ(Cell(0, 2), GroupedCount(errors).toStdString());
+  EXPECT_NEAR(std::stod(Cell(0, 3)), 1e-2, 2e-3) << Cell(0, 3);
+}
+
+// The counts are the instrument's since its run started; the chart begins when the window saw
+// them first, and says when and why.
+TEST_F(BerWinTest, TheChartSaysFromWhenItCounts) {
+  auto since = [](const BerBerWin& win, const char* why) {
+    const QRegularExpression title(QStringLiteral("^Bit error rate since (\\d\\d:\\d\\d:\\d\\d), %1$").arg(QLatin1String(why)));
+    const QRegularExpressionMatch match = title.match(win.Chart()->title());
+    if (!match.hasMatch()) return "no match: " + win.Chart()->title().toStdString();
+    const QString axis = win.Chart()->axes(Qt::Horizontal).first()->titleText();
+    return axis == QStringLiteral("Seconds since ") + match.captured(1) ? std::string("ok") : "axis: " + axis.toStdString();
+  };
+  EXPECT_EQ(since(*mWin, "when this window opened"), "ok");
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  Poll();
+  EXPECT_EQ(since(*mWin, "when the run started"), "ok");
+  PollUntilErrors();
+  EXPECT_EQ(mWin->History().Samples().front().seconds, 0.0);
+
+  // Opened in the middle of the run, the table has the whole run and the chart says it began later.
+  BerBerWin late;
+  ASSERT_EQ(late.Load(mList), 0) << mList.ToText();
+  EXPECT_EQ(since(late, "when this window opened"), "ok");
+  EXPECT_EQ(late.Table()->item(0, 2)->text(), mWin->Table()->item(0, 2)->text());
+  EXPECT_EQ(late.History().Samples().size(), 1u);
+
+  QTest::mouseClick(mWin->findChild<QPushButton*>(QStringLiteral("PButReset")), Qt::LeftButton);
+  EXPECT_EQ(since(*mWin, "when the counts were reset"), "ok");
+  EXPECT_EQ(since(late, "when this window opened"), "ok");
 }
