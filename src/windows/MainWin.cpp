@@ -17,10 +17,13 @@
 #include "core/uiapp.h"
 #include "data/GuiLockDs.h"
 #include "data/QenDsView.h"
+#include "data/RunStopDs.h"
 #include "instrument/QenGuiInst.h"
+#include "instrument/QenStatus.h"
 #include "settings/SettingFile.h"
 #include "support/ConditionList.h"
 #include "toolkit/WaitCursor.h"
+#include "windows/LockAware.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -35,11 +38,16 @@ void Show(ConditionList& list) {
 
 }  // namespace
 
-class MainWin::LockView : public QenDsView {
+// The lock and the run state decide which commands can work.
+class MainWin::StateView : public QenDsView {
  public:
-  explicit LockView(MainWin& window) : mWindow(window) {}
-  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
-    mWindow.ShowLock(uiapp::GetGuiLockDs()->IsLocked());
+  explicit StateView(MainWin& window) : mWindow(window) {}
+  int NfyViewDataUpdated(QenDs* changed, ConditionList&) override {
+    if (changed == uiapp::GetGuiLockDs()) {
+      mWindow.ShowLock(uiapp::GetGuiLockDs()->IsLocked());
+    } else {
+      mWindow.UpdateCommands();
+    }
     return 0;
   }
 
@@ -56,7 +64,7 @@ MainWin::MainWin(QWidget* parent)
   layout->setSpacing(0);
   mBanner->setObjectName(QStringLiteral("LockBanner"));
   mBanner->setText(QStringLiteral(
-      "Another client holds the instrument: every window is read-only until it lets go."));
+      "Another client holds the instrument: what would change it is off until it lets go; what only reads still works."));
   mBanner->setStyleSheet(QStringLiteral("background: #fff3c4; color: #5c4400; padding: 6px; border-bottom: 1px solid #e0c060"));
   mBanner->hide();
   layout->addWidget(mBanner);
@@ -84,20 +92,20 @@ class MainWin::SelfTestTool : public SelfTest::Tool {
 };
 
 MainWin::~MainWin() {
-  if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
-  if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
-    ConditionList list;
-    uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
-  }
+  if (SelfTest::GetTool() == mSelfTestTool.get()) SelfTest::SetTool(nullptr);
+  ConditionList list;
+  if (mStateView && uiapp::GetGuiLockDs() != nullptr) uiapp::GetGuiLockDs()->UnregisterView(mStateView.get(), list);
+  if (mStateView && uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->UnregisterView(mStateView.get(), list);
 }
 
 void MainWin::Attach() {
   mStatus->Attach();
-  mSelfTest = std::make_unique<SelfTestTool>(*this);
-  SelfTest::SetTool(mSelfTest.get());
-  mLockView = std::make_unique<LockView>(*this);
+  mSelfTestTool = std::make_unique<SelfTestTool>(*this);
+  SelfTest::SetTool(mSelfTestTool.get());
+  mStateView = std::make_unique<StateView>(*this);
   ConditionList list;
-  uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
+  uiapp::GetGuiLockDs()->RegisterView(mStateView.get(), list);
+  uiapp::GetRunStopDs()->RegisterView(mStateView.get(), list);
   ShowLock(uiapp::GetGuiLockDs()->IsLocked());
   UpdateTitle();
 }
@@ -112,12 +120,13 @@ void MainWin::BuildMenus() {
 
 void MainWin::BuildFileMenu() {
   QMenu* file = menuBar()->addMenu(QStringLiteral("&File"));
-  file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting);
-  file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting);
+  mInstrumentCommands << file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting);
+  mInstrumentCommands << file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting);
   mRecent = file->addMenu(QStringLiteral("Recent &Settings"));
+  mInstrumentCommands << mRecent->menuAction();
   connect(mRecent, &QMenu::aboutToShow, this, &MainWin::FillRecentMenu);
-  file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
-  file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
+  mInstrumentCommands << file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
+  mInstrumentCommands << file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
   file->addSeparator();
   file->addAction(QStringLiteral("&Quit"), QKeySequence::Quit, this, &QWidget::close);
 }
@@ -131,6 +140,7 @@ void MainWin::BuildInstrumentMenu() {
     QAction* a = menu->addAction(text, this, [this, action] { RunAction(action); });
     a->setShortcut(key);
     if (onBar) bar->addAction(a);
+    mInstrumentCommands << a;
     return a;
   };
   add(QStringLiteral("\u25B6 &Run"), QKeySequence(Qt::Key_F5), &uiapp::Run, true);
@@ -141,7 +151,7 @@ void MainWin::BuildInstrumentMenu() {
   add(QStringLiteral("Outputs O&ff"), QKeySequence(), &uiapp::Disconnect, false);
   menu->addSeparator();
   add(QStringLiteral("Check &Trigger Mode"), QKeySequence(), &uiapp::CheckTriggerMode, false);
-  add(QStringLiteral("Self &Test..."), QKeySequence(), &uiapp::DoSelfTest, false);
+  mSelfTest = add(QStringLiteral("Self &Test..."), QKeySequence(), &uiapp::DoSelfTest, false);
 }
 
 void MainWin::BuildWindowsMenu() {
@@ -151,11 +161,38 @@ void MainWin::BuildWindowsMenu() {
     const QString resource = QString::fromStdString(entry.resource);
     QAction* action = menu->addAction(QString::fromStdString(entry.title), this, [this, resource] { OpenWindow(resource); });
     if (index <= 9) action->setShortcut(QKeySequence(Qt::CTRL | (Qt::Key_0 + index)));
+    if (entry.needsInstrument) mReadingWindows.append({action, resource});
     ++index;
   }
   menu->addSeparator();
   menu->addAction(QStringLiteral("&Cascade"), mArea, &QMdiArea::cascadeSubWindows);
   menu->addAction(QStringLiteral("&Tile"), mArea, &QMdiArea::tileSubWindows);
+}
+
+QList<QAction*> MainWin::Commands() const {
+  QList<QAction*> commands;
+  for (QAction* top : menuBar()->actions()) {
+    for (QAction* action : top->menu()->actions()) {
+      if (!action->isSeparator()) commands << action;
+    }
+  }
+  for (auto* bar : findChildren<QToolBar*>()) {
+    for (QAction* action : bar->actions()) {
+      if (!commands.contains(action)) commands << action;
+    }
+  }
+  return commands;
+}
+
+void MainWin::UpdateCommands() {
+  const bool locked = IsShowingLock();
+  for (QAction* action : mInstrumentCommands) action->setEnabled(!locked);
+  // A window that is open only needs raising.
+  for (const auto& [action, resource] : mReadingWindows) action->setEnabled(!locked || FindWindow(resource) != nullptr);
+  const RunStopDs* run = uiapp::GetRunStopDs();
+  const bool running = run != nullptr && run->IsRunning();
+  mSelfTest->setEnabled(!locked && !running);
+  mSelfTest->setStatusTip(running ? QStringLiteral("The self test cannot start while the instrument runs.") : QString());
 }
 
 void MainWin::FillRecentMenu() {
@@ -197,6 +234,10 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
     window = entry->make(nullptr, list);
   }
   if (window == nullptr) {
+    // Refused by the lock, a window's reads add no condition: say why it did not open.
+    if (list.IsEmpty() && uiapp::GetGuiLockDs()->IsLocked()) {
+      list.Add(QenStatus::kLocked, "The window \"" + entry->title + "\" reads the instrument to open; another client holds it now.");
+    }
     Show(list);
     return nullptr;
   }
@@ -212,9 +253,12 @@ QMdiSubWindow* MainWin::Adopt(QWidget* window, const QString& resource, const QS
   sub->setWindowTitle(title);
   sub->setWindowIcon(QIcon(QPixmap(1, 1)));
   sub->resize(window->sizeHint().expandedTo(window->size()));
-  sub->setEnabled(!IsShowingLock());
+  ShowLockIn(window, IsShowingLock());
+  // Queued: the window is gone from the area's list by then.
+  connect(sub, &QObject::destroyed, this, &MainWin::UpdateCommands, Qt::QueuedConnection);
   sub->show();
   window->setFocus();
+  UpdateCommands();
   return sub;
 }
 
@@ -222,9 +266,15 @@ bool MainWin::IsShowingLock() const { return mBanner->isVisibleTo(this); }
 
 void MainWin::ShowLock(bool locked) {
   mBanner->setVisible(locked);
-  for (QMdiSubWindow* sub : mArea->subWindowList()) sub->widget()->setEnabled(!locked);
-  for (QAction* action : menuBar()->actions()) {
-    if (action->text() == QStringLiteral("&Instrument")) action->menu()->setEnabled(!locked);
+  for (QMdiSubWindow* sub : mArea->subWindowList()) ShowLockIn(sub->widget(), locked);
+  UpdateCommands();
+}
+
+void MainWin::ShowLockIn(QWidget* window, bool locked) {
+  if (auto* aware = dynamic_cast<LockAware*>(window)) {
+    aware->ShowLock(locked);
+  } else {
+    window->setEnabled(!locked);
   }
 }
 

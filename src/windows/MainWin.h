@@ -1,6 +1,8 @@
 #pragma once
 
+#include <QList>
 #include <QMainWindow>
+#include <QPair>
 #include <memory>
 
 class QAction;
@@ -13,7 +15,11 @@ class ConditionList;
 
 // The frame of the program: the windows in an MDI area, the File, Instrument, Windows and Help
 // menus, the run toolbar and the status bar of the instrument's state. While another client
-// holds the instrument every window is read-only and a banner says so; it clears by itself.
+// holds the instrument a banner says so and what cannot work is off: every command that needs
+// the instrument, the windows that must read it to open, and the windows' parts that write (a
+// window that knows which of its parts only read is a LockAware; any other is disabled whole).
+// It all comes back by itself when the lock goes. The self test is also off while the
+// instrument runs, as the instrument refuses it then.
 class MainWin : public QMainWindow {
   Q_OBJECT
 
@@ -34,12 +40,14 @@ class MainWin : public QMainWindow {
   bool IsShowingLock() const;
   // Follows the lock state of the instrument.
   void ShowLock(bool locked);
+  // Every command of the menus and the toolbar.
+  QList<QAction*> Commands() const;
 
  protected:
   void closeEvent(QCloseEvent* event) override;
 
  private:
-  class LockView;
+  class StateView;
   class SelfTestTool;
 
   void BuildMenus();
@@ -55,11 +63,19 @@ class MainWin : public QMainWindow {
   void HitSaveSettingAs();
   void HitAbout();
   void UpdateTitle();
+  // Turns each command on or off for the lock and the run state.
+  void UpdateCommands();
+  void ShowLockIn(QWidget* window, bool locked);
 
   QMdiArea* mArea;
   QLabel* mBanner;
   StateStatusBar* mStatus;
   QMenu* mRecent = nullptr;
-  std::unique_ptr<LockView> mLockView;
-  std::unique_ptr<SelfTestTool> mSelfTest;
+  // The commands that send something to the instrument.
+  QList<QAction*> mInstrumentCommands;
+  // The Windows menu's entries of windows that read the instrument to open, by resource.
+  QList<QPair<QAction*, QString>> mReadingWindows;
+  QAction* mSelfTest = nullptr;
+  std::unique_ptr<StateView> mStateView;
+  std::unique_ptr<SelfTestTool> mSelfTestTool;
 };
