@@ -20,6 +20,7 @@
 #include "data/SystemStateDs.h"
 #include "params/ui/ParSpinBox.h"
 #include "params/ui/QenDsCBut.h"
+#include "params/ui/QenDsSTEd.h"
 #include "params/ui/QenParEd.h"
 #include "params/ui/UnitLabel.h"
 #include "windows/MainWin.h"
@@ -110,6 +111,31 @@ TEST_F(MainWinTest, ParameterEditorShowsOnlyWhatTheItemHas) {
   EXPECT_FALSE(editor->CurrentPanel()->findChild<QWidget*>("BoxUcas")->isVisibleTo(editor));
   EXPECT_EQ(editor->CurrentPanel()->findChild<QLabel*>("LabelMemory")->text(), "none");
   for (const auto& e : ErrorJournal::Entries()) ADD_FAILURE() << e.command << ": " << e.text;
+}
+
+// The module's model cannot be written: its field never writes and shows a plain text.
+TEST_F(MainWinTest, AReadOnlyFieldNeverWritesAndLooksReadOnly) {
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1"));
+  auto* model = editor->CurrentPanel()->findChild<QenDsSTEd*>(QStringLiteral("TextType"));
+  ASSERT_NE(model, nullptr);
+  const Dstring quoted = Other(":CGR1:MOD1:TYPE?");
+  ASSERT_EQ(quoted, "\"K2268A\"");
+  EXPECT_TRUE(model->isReadOnly());
+  EXPECT_EQ(model->text().toStdString(), "K2268A");
+  EXPECT_FALSE(model->hasFrame());
+  EXPECT_EQ(model->palette().color(QPalette::Base), model->palette().color(QPalette::Window));
+  const std::size_t journal = ErrorJournal::Entries().size();
+  model->setFocus();
+  QTest::keyClick(model, Qt::Key_Return);
+  editor->Tree()->setFocus();
+  ConditionList list;
+  EXPECT_EQ(model->SendValue(list), 0);
+  QCoreApplication::processEvents();
+  EXPECT_EQ(ErrorJournal::Entries().size(), journal) << ErrorJournal::Entries().front().command;
+  EXPECT_TRUE(list.IsEmpty());
+  EXPECT_TRUE(mAlerts.empty()) << (mAlerts.empty() ? "" : mAlerts[0]);
+  EXPECT_EQ(model->text().toStdString(), "K2268A");
 }
 
 // What cannot work while another client holds the instrument is off; what only reads stays.

@@ -5,7 +5,9 @@
 #include "params/ui/BoundControl.h"
 
 // A one-line text field bound to a parameter. The text is written as it stands on Return,
-// and on focus loss (or when its window is left) after the user changed it.
+// and on focus loss (or when its window is left) after the user changed it. A read-only field
+// (a parameter that cannot be written, as a module's model) never writes, and shows the value
+// as a plain text: no frame, no edit background, a quoted string without its quotes.
 class QenDsSTEd : public QLineEdit, public BoundControl {
   Q_OBJECT
   Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)
@@ -22,6 +24,7 @@ class QenDsSTEd : public QLineEdit, public BoundControl {
 
  protected:
   void focusOutEvent(QFocusEvent* event) override;
+  void changeEvent(QEvent* event) override;
 
  private:
   void HitReturn();
