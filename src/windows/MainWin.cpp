@@ -24,6 +24,7 @@
 #include "support/ConditionList.h"
 #include "toolkit/WaitCursor.h"
 #include "windows/LockAware.h"
+#include "windows/RefusalText.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -93,6 +94,7 @@ class MainWin::SelfTestTool : public SelfTest::Tool {
 
 MainWin::~MainWin() {
   if (SelfTest::GetTool() == mSelfTestTool.get()) SelfTest::SetTool(nullptr);
+  if (mStateView) RefusalText::Uninstall();
   ConditionList list;
   if (mStateView && uiapp::GetGuiLockDs() != nullptr) uiapp::GetGuiLockDs()->UnregisterView(mStateView.get(), list);
   if (mStateView && uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->UnregisterView(mStateView.get(), list);
@@ -100,6 +102,7 @@ MainWin::~MainWin() {
 
 void MainWin::Attach() {
   mStatus->Attach();
+  RefusalText::Install();
   mSelfTestTool = std::make_unique<SelfTestTool>(*this);
   SelfTest::SetTool(mSelfTestTool.get());
   mStateView = std::make_unique<StateView>(*this);

@@ -32,6 +32,7 @@
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
+#include "windows/selftest/SelftestResultWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
@@ -136,6 +137,66 @@ TEST_F(MainWinTest, AReadOnlyFieldNeverWritesAndLooksReadOnly) {
   EXPECT_TRUE(list.IsEmpty());
   EXPECT_TRUE(mAlerts.empty()) << (mAlerts.empty() ? "" : mAlerts[0]);
   EXPECT_EQ(model->text().toStdString(), "K2268A");
+}
+
+// A refused value names the parameter by its place and label, the value asked and the limits
+// the instrument holds, then the code and text.
+TEST_F(MainWinTest, ARefusedValueSaysWhichParameterWhatWasAskedAndTheLimits) {
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1:CONN2"));
+  struct Case {
+    const char* field;
+    const char* typed;
+    const char* alert;
+  };
+  const Case cases[] = {
+      {"FieldAmpl", "99",
+       "Group 1 \u203A Module 1 \u203A Port 2 \u00B7 Amplitude: 99 V asked; the instrument takes 0.1 V to 5 V.\n\n"
+       "ERROR -222\n\nData out of range."},
+      {"FieldAmpl", "5", ""},
+      // The delay is held within the clock group's period, 1 ns.
+      {"FieldDelay", "1.5",
+       "Group 1 \u203A Module 1 \u203A Port 2 \u00B7 Delay: 1.5 ns asked; the instrument takes 0 ns to 1 ns.\n\n"
+       "ERROR -222\n\nData out of range."},
+      {"FieldDelay", "1", ""},
+  };
+  for (const Case& c : cases) {
+    mAlerts.clear();
+    QenParEd* field = Field(editor, c.field);
+    ASSERT_NE(field, nullptr) << c.field;
+    field->Editor()->setFocus();
+    QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+    QTest::keyClicks(field->Editor(), c.typed);
+    QTest::keyClick(field->Editor(), Qt::Key_Return);
+    QCoreApplication::processEvents();
+    if (*c.alert == '\0') {
+      EXPECT_TRUE(mAlerts.empty()) << c.field << " " << c.typed << ": " << (mAlerts.empty() ? "" : mAlerts[0]);
+      continue;
+    }
+    ASSERT_EQ(mAlerts.size(), 1u) << c.field << " " << c.typed;
+    EXPECT_EQ(std::string(mAlerts[0]), std::string(c.alert)) << c.field;
+  }
+  Other(":CGR1:MOD1:CONN2:VOLT:AMPL 1");
+  Other(":CGR1:MOD1:CONN2:PULS:DEL 0");
+}
+
+// The instrument refuses the self test while it runs: the dialog says so and the button goes off.
+TEST_F(MainWinTest, ARefusedSelfTestSaysWhyAndItsButtonIsOffWhileItCannotWork) {
+  auto* window = Open<SelftestResultWin>("selftest.Result");
+  auto* start = window->findChild<QPushButton*>(QStringLiteral("PButStart"));
+  ASSERT_NE(start, nullptr);
+  EXPECT_TRUE(start->isEnabled());
+  // Started by another client, not yet seen by the poll.
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  QTest::mouseClick(start, Qt::LeftButton);
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_EQ(mAlerts[0], "Self test: the self test cannot start while the instrument runs.\n\nERROR -200\n\nExecution error.");
+  EXPECT_FALSE(start->isEnabled());
+  EXPECT_EQ(start->toolTip(), "The self test cannot start while the instrument runs.");
+  Other(":SGEN:GLOB:INIT:CONT OFF");
+  Poll();
+  EXPECT_TRUE(start->isEnabled());
 }
 
 // What cannot work while another client holds the instrument is off; what only reads stays.
