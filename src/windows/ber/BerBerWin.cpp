@@ -184,6 +184,8 @@ void BerBerWin::ShowChart() {
       }
     }
     series->replace(points);
+    // A line needs two samples: the first one alone is drawn as a point.
+    series->setPointsVisible(points.size() == 1);
   }
   const double last = samples.empty() ? 0.0 : samples.back().seconds;
   mTimeAxis->setRange(std::max(0.0, last - 600.0), std::max(60.0, last));
