@@ -151,7 +151,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text, SimWorkListener* listener) {
   ResetFrame(connection);
   mListener = listener;
-  NoteStates(mGlobal.Advance(mClock.NowMs()), "");
+  NoteStates(mGlobal.Advance(mClock.NowMs()));
   for (auto& module : mModules) module->Advance(*this);
   if (IsRefused(text)) return SimReply{"", -19, SimReplyAction::Send, 0};
   int delayMs = mSessions[connection].TakeDelay();
@@ -439,7 +439,7 @@ void SimCommandProcessor::QueryRunning(const SimCommand&) {
 
 void SimCommandProcessor::WriteRunning(const SimCommand& cmd) {
   bool on = false;
-  if (ReadSwitch(cmd, on)) NoteStates(mGlobal.SetRunning(on, mClock.NowMs()), mHandle);
+  if (ReadSwitch(cmd, on)) NoteStates(mGlobal.SetRunning(on, mClock.NowMs()), SimGlobalState::kContHeader);
 }
 
 void SimCommandProcessor::QuerySystem(const SimCommand&) {
@@ -456,11 +456,11 @@ void SimCommandProcessor::QueryConnected(const SimCommand&) {
 
 void SimCommandProcessor::WriteConnected(const SimCommand& cmd) {
   bool on = false;
-  if (ReadSwitch(cmd, on)) NoteStates(mGlobal.SetConnected(on), mHandle);
+  if (ReadSwitch(cmd, on)) NoteStates(mGlobal.SetConnected(on), SimGlobalState::kConnHeader);
 }
 
 void SimCommandProcessor::ForceSequence(const SimCommand&) {
-  NoteStates(mGlobal.ForceSequence(mClock.NowMs()), mHandle);
+  NoteStates(mGlobal.ForceSequence(mClock.NowMs()));
 }
 
 void SimCommandProcessor::CreateHandle(const SimCommand& cmd) {
@@ -576,7 +576,7 @@ void SimCommandProcessor::TestStat(const SimCommand& cmd) {
   if (!items[0].IsText() || !items[1].IsText()) return Error(-104);
   Dstring which = Dstring(items[0].GetText()).ToUpper();
   if (!mGlobal.ForceWord(which, Dstring(items[1].GetText()).ToUpper(), changed)) return Error(-224);
-  NoteStates(changed, "");
+  NoteStates(changed);
 }
 
 bool SimCommandProcessor::ReadSwitch(const SimCommand& cmd, bool& on) {
@@ -635,8 +635,8 @@ void SimCommandProcessor::MarkDirty(const Dstring& header, const Dstring& except
   }
 }
 
-void SimCommandProcessor::NoteStates(const std::vector<Dstring>& headers, const Dstring& except) {
-  for (const Dstring& header : headers) MarkDirty(header, except);
+void SimCommandProcessor::NoteStates(const std::vector<Dstring>& headers, const char* written) {
+  for (const Dstring& header : headers) MarkDirty(header, written != nullptr && header == written ? mHandle : Dstring());
 }
 
 void SimCommandProcessor::NoteParamChanges(const Dstring& except) {
@@ -647,5 +647,5 @@ void SimCommandProcessor::NoteParamChanges(const Dstring& except) {
     relock = relock || mParams.At(i).IsRelock();
   }
   for (std::size_t i : mParams.TakeLimitChanges()) mBatchLimits.insert(i);
-  if (relock) NoteStates(mGlobal.ClockChanged(mClock.NowMs()), except);
+  if (relock) NoteStates(mGlobal.ClockChanged(mClock.NowMs()));
 }

@@ -122,7 +122,10 @@ class SimCommandProcessor : public SimContext {
   Dstring BareHeader(const SimCommand& cmd) const;
   // Tells every handle but `except` (a handle name, or empty for all) of changed headers.
   void MarkDirty(const Dstring& header, const Dstring& except);
-  void NoteStates(const std::vector<Dstring>& headers, const Dstring& except);
+  // Tells every handle of changed states, but the state this handle `written` itself: it knows
+  // what it set. What follows from it (the system state after a start or stop, the PLL after a
+  // clock change) it learns like everyone else, as no coupled query reports states.
+  void NoteStates(const std::vector<Dstring>& headers, const char* written = nullptr);
   void NoteParamChanges(const Dstring& except);
 
   SimParamTable mParams;

@@ -61,9 +61,13 @@ int BerSvr::Init(ConditionList& list) {
     if (!header.EndsWith(kBerSuffix) || !header.ToUpper().StartsWith(prefix)) continue;
     ports.emplace_back().port = Dstring(header.substr(prefix.size()));
   }
-  mResults = std::move(ports);
+  // The counts a run left are the instrument's until the next start: they are shown at once,
+  // not only once the instrument runs again.
   mInitialized = true;
-  return Update(list, 0);
+  int status = ReadCounts(ports, list);
+  mResults = std::move(ports);
+  if (int notified = Update(list, 0); status == 0) status = notified;
+  return status;
 }
 
 void BerSvr::End() {
@@ -73,19 +77,28 @@ void BerSvr::End() {
 
 int BerSvr::UpdateFromFW(unsigned what, ConditionList& list) {
   if (what != kReadResults || !mInitialized || mResults.empty()) return 0;
+  std::vector<PortResult> next = mResults;
+  if (int status = ReadCounts(next, list)) return status;
+  if (next == mResults) return 0;
+  mResults = std::move(next);
+  return Update(list, 0);
+}
+
+int BerSvr::ReadCounts(std::vector<PortResult>& results, ConditionList& list) const {
+  if (results.empty()) return 0;
   FWBlocker guard("BerSvr::UpdateFromFW", list);
   if (int status = guard.Block()) return status;
   const bool channels = HasChannels();
-  const Dstring cmd = Joined("?", channels ? ":CHAN?" : nullptr);
+  const Dstring cmd = Joined(results, "?", channels ? ":CHAN?" : nullptr);
   Dstring reply;
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
   std::vector<std::string_view> parts;
   const std::size_t each = channels ? 2 : 1;
-  if (ParserExpression::SplitJoined(reply, parts, list) != 0 || parts.size() != each * mResults.size()) {
+  if (ParserExpression::SplitJoined(reply, parts, list) != 0 || parts.size() != each * results.size()) {
     ConditionListLoader::ConditionToken(list, "GUI_STATE_BAD_REPLY", {cmd, reply}, 1);
     return 1;
   }
-  std::vector<PortResult> next = mResults;
+  std::vector<PortResult> next = results;
   for (std::size_t i = 0; i < parts.size(); ++i) {
     PortResult& result = next[i / each];
     const bool read = i % each == 0 ? ReadResult(parts[i], result) : ReadChannels(parts[i], result.channels);
@@ -95,9 +108,8 @@ int BerSvr::UpdateFromFW(unsigned what, ConditionList& list) {
     }
     if (!channels) result.channels.clear();
   }
-  if (next == mResults) return 0;
-  mResults = std::move(next);
-  return Update(list, 0);
+  results = std::move(next);
+  return 0;
 }
 
 int BerSvr::Reset(ConditionList& list) {
@@ -106,7 +118,7 @@ int BerSvr::Reset(ConditionList& list) {
     FWBlocker guard("BerSvr::Reset", list);
     if (int status = guard.Block()) return status;
     Dstring reply;
-    if (int status = QenGuiInst::Call(Joined(":RES"), reply, list)) return status;
+    if (int status = QenGuiInst::Call(Joined(mResults, ":RES"), reply, list)) return status;
   }
   return UpdateFromFW(kReadResults, list);
 }
@@ -115,10 +127,10 @@ void BerSvr::WantChannels(bool want) {
   mChannelViews = want ? mChannelViews + 1 : std::max(0, mChannelViews - 1);
 }
 
-Dstring BerSvr::Joined(const char* suffix, const char* second) const {
+Dstring BerSvr::Joined(const std::vector<PortResult>& ports, const char* suffix, const char* second) {
   const Dstring handle = QenGuiInst::GetAppHandle();
   Dstring cmd;
-  for (const auto& r : mResults) {
+  for (const auto& r : ports) {
     cmd += (cmd.empty() ? ":" : ";:") + handle + r.port + suffix;
     if (second != nullptr) cmd += ";:" + handle + r.port + second;
   }

@@ -7,8 +7,8 @@
 
 // The bit error rate service: the compared-bit count, error count and ratio of every analyser
 // port, read from the instrument while it runs and kept in this data source for the views.
-// Init finds the analyser ports (their ":BER" settings, listed with the "L" prefix);
-// UpdateFromFW(1, …) reads all of them in one joined query and tells the views when anything
+// Init finds the analyser ports (their ":BER" settings, listed with the "L" prefix) and reads
+// what they counted so far; UpdateFromFW(1, …) reads all of them in one joined query and tells the views when anything
 // changed. While a view wants the error state by channel (WantChannels), the same query also
 // asks each port's "<port>:CHAN?", so the error state costs no round trip of its own. The
 // initialised flag is what the poll tests before setting the service up again
@@ -40,7 +40,10 @@ class BerSvr : public QenDs {
  private:
   // One command per port, the port's setting followed by `suffix` (and then another followed
   // by `second`, when given), joined into one frame.
-  Dstring Joined(const char* suffix, const char* second = nullptr) const;
+  static Dstring Joined(const std::vector<PortResult>& ports, const char* suffix, const char* second = nullptr);
+  // Reads the counts of `results` (and their channels, when wanted) in one frame; on failure
+  // `results` is left as it was.
+  int ReadCounts(std::vector<PortResult>& results, ConditionList& list) const;
 
   bool mInitialized = false;
   int mChannelViews = 0;

@@ -70,6 +70,11 @@ QenGuiInst::ErrorListenerProc& ErrorListener() {
   return listener;
 }
 
+QenGuiInst::RefusalDescriber& Describer() {
+  static QenGuiInst::RefusalDescriber describer;
+  return describer;
+}
+
 QenGuiInst::ServerDeathHandler& DeathHandler() {
   static QenGuiInst::ServerDeathHandler handler = [](const Dstring& message) {
     Toolkit::Get().Alert(message, ToolkitPort::Icon::Critical);
@@ -181,10 +186,12 @@ int QenGuiInst::Call(QenInstrument* instrument, const Dstring& cmd, Dstring& rep
     return status;
   }
   if (status != QenStatus::kOk && status != QenStatus::kLocked) {
-    const std::size_t before = list.Size();
-    GetErrors(instrument, GetHandleFromCommand(cmd), status, list);
-    if (ErrorListener()) {
-      for (std::size_t i = before; i < list.Size(); ++i) ErrorListener()(cmd, list[i]);
+    ConditionList errors;
+    GetErrors(instrument, GetHandleFromCommand(cmd), status, errors);
+    for (Condition condition : errors) {
+      condition.SetCommand(cmd);
+      if (ErrorListener()) ErrorListener()(cmd, condition);
+      list.Add(condition);
     }
   }
   return status;
@@ -301,14 +308,22 @@ bool QenGuiInst::IsInstrumentLocked() {
 
 Dstring QenGuiInst::ErrorDlgText(const ConditionList& list) {
   Dstring text;
+  Dstring described;
   for (const auto& condition : list) {
     Dstring message = condition.GetMessage();
     FormatErrorStr(message, static_cast<int>(condition.GetCode()));
     if (!text.empty()) text += "\n----------\n";
+    // A command that brought several errors is described once, before the first.
+    if (Describer() && !condition.GetCommand().empty() && condition.GetCommand() != described) {
+      described = condition.GetCommand();
+      if (const Dstring what = Describer()(condition); !what.empty()) text += what + "\n\n";
+    }
     text.AppendPrintf("ERROR %li\n\n%s", condition.GetCode(), message.c_str());
   }
   return text;
 }
+
+void QenGuiInst::SetRefusalDescriber(RefusalDescriber describer) { Describer() = std::move(describer); }
 
 int QenGuiInst::ShowErrorDlg(ConditionList& list, int) {
   if (list.IsEmpty()) return 0;

@@ -39,9 +39,14 @@ class QenGuiInst {
   // The user-facing form of a message: trimmed, never empty, ending in a full stop.
   static void FormatErrorStr(Dstring& message, int code);
   // Shows the conditions in one critical alert: "ERROR <code>\n\n<message>" each, joined by a
-  // line of dashes. Nothing is shown for an empty list.
+  // line of dashes. Nothing is shown for an empty list. The first condition of each refused
+  // command is preceded by what the describer says of it, when one is installed.
   static int ShowErrorDlg(ConditionList& list, int);
   static Dstring ErrorDlgText(const ConditionList& list);
+  // Says in the user's words what a condition's command asked for ("Group 1 › Module 1 ›
+  // Port 1 · Amplitude: 7 V asked; …"), or nothing. The windows install it. Null removes it.
+  using RefusalDescriber = std::function<Dstring(const Condition& condition)>;
+  static void SetRefusalDescriber(RefusalDescriber describer);
 
   // What happens when the server has died (-18): the message is shown and the process ends
   // with exit code 0. The GUI installs its own alert; tests install one that records.

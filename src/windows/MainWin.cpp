@@ -20,7 +20,9 @@
 #include "core/uiapp.h"
 #include "data/GuiLockDs.h"
 #include "data/QenDsView.h"
+#include "data/RunStopDs.h"
 #include "instrument/QenGuiInst.h"
+#include "instrument/QenStatus.h"
 #include "settings/OpenSettingDs.h"
 #include "settings/SettingFile.h"
 #include "settings/SettingTransfer.h"
@@ -28,9 +30,11 @@
 #include "support/ConditionList.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/WaitCursor.h"
-#include "windows/InstrumentWaitView.h"
 #include "toolkit/qt/StatusNotice.h"
 #include "windows/FileChoice.h"
+#include "windows/InstrumentWaitView.h"
+#include "windows/LockAware.h"
+#include "windows/RefusalText.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -50,11 +54,16 @@ void Show(ConditionList& list) {
 
 }  // namespace
 
-class MainWin::LockView : public QenDsView {
+// The lock and the run state decide which commands can work.
+class MainWin::StateView : public QenDsView {
  public:
-  explicit LockView(MainWin& window) : mWindow(window) {}
-  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
-    mWindow.ShowLock(uiapp::GetGuiLockDs()->IsLocked());
+  explicit StateView(MainWin& window) : mWindow(window) {}
+  int NfyViewDataUpdated(QenDs* changed, ConditionList&) override {
+    if (changed == uiapp::GetGuiLockDs()) {
+      mWindow.ShowLock(uiapp::GetGuiLockDs()->IsLocked());
+    } else {
+      mWindow.UpdateCommands();
+    }
     return 0;
   }
 
@@ -85,7 +94,7 @@ MainWin::MainWin(QWidget* parent)
   layout->setSpacing(0);
   mBanner->setObjectName(QStringLiteral("LockBanner"));
   mBanner->setText(QStringLiteral(
-      "Another client holds the instrument: every window is read-only until it lets go."));
+      "Another client holds the instrument: what would change it is off until it lets go; what only reads still works."));
   mBanner->setStyleSheet(QStringLiteral("background: #fff3c4; color: #5c4400; padding: 6px; border-bottom: 1px solid #e0c060"));
   mBanner->hide();
   layout->addWidget(mBanner);
@@ -125,23 +134,25 @@ MainWin::~MainWin() {
   // The area tells of its windows going while the frame's part of the object is already gone.
   disconnect(mArea, nullptr, this, nullptr);
   StatusNotice::Install({});
-  if (SelfTest::GetTool() == mSelfTest.get()) SelfTest::SetTool(nullptr);
-  if (mLockView && uiapp::GetOpenSettingDs() != nullptr) {
+  if (SelfTest::GetTool() == mSelfTestTool.get()) SelfTest::SetTool(nullptr);
+  if (mStateView) RefusalText::Uninstall();
+  if (mStateView && uiapp::GetOpenSettingDs() != nullptr) {
     uiapp::GetOpenSettingDs()->UnregisterProc(&MainWin::NfyOpenSetting, this);
   }
-  if (mLockView && uiapp::GetGuiLockDs() != nullptr) {
-    ConditionList list;
-    uiapp::GetGuiLockDs()->UnregisterView(mLockView.get(), list);
-  }
+  ConditionList list;
+  if (mStateView && uiapp::GetGuiLockDs() != nullptr) uiapp::GetGuiLockDs()->UnregisterView(mStateView.get(), list);
+  if (mStateView && uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->UnregisterView(mStateView.get(), list);
 }
 
 void MainWin::Attach() {
   mStatus->Attach();
-  mSelfTest = std::make_unique<SelfTestTool>(*this);
-  SelfTest::SetTool(mSelfTest.get());
-  mLockView = std::make_unique<LockView>(*this);
+  RefusalText::Install();
+  mSelfTestTool = std::make_unique<SelfTestTool>(*this);
+  SelfTest::SetTool(mSelfTestTool.get());
+  mStateView = std::make_unique<StateView>(*this);
   ConditionList list;
-  uiapp::GetGuiLockDs()->RegisterView(mLockView.get(), list);
+  uiapp::GetGuiLockDs()->RegisterView(mStateView.get(), list);
+  uiapp::GetRunStopDs()->RegisterView(mStateView.get(), list);
   uiapp::GetOpenSettingDs()->RegisterProc(&MainWin::NfyOpenSetting, this);
   ShowLock(uiapp::GetGuiLockDs()->IsLocked());
   UpdateTitle();
@@ -163,19 +174,17 @@ void MainWin::BuildMenus() {
 
 void MainWin::BuildFileMenu() {
   QMenu* file = menuBar()->addMenu(QStringLiteral("&File"));
-  mSettingActions.push_back(file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting));
-  mSettingActions.push_back(file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting));
+  mInstrumentCommands << file->addAction(QStringLiteral("&New Setting"), QKeySequence::New, this, &MainWin::HitNewSetting);
+  mInstrumentCommands << file->addAction(QStringLiteral("&Open Setting..."), QKeySequence::Open, this, &MainWin::HitOpenSetting);
   mRecent = file->addMenu(QStringLiteral("Recent &Settings"));
-  mSettingActions.push_back(mRecent->menuAction());
+  mInstrumentCommands << mRecent->menuAction();
   connect(mRecent, &QMenu::aboutToShow, this, &MainWin::FillRecentMenu);
-  mSaveSetting =
-      file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
-  mSettingActions.push_back(mSaveSetting);
-  mSettingActions.push_back(
-      file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs));
+  mSaveSetting = file->addAction(QStringLiteral("&Save Setting"), QKeySequence::Save, this, &MainWin::HitSaveSetting);
+  mInstrumentCommands << mSaveSetting;
+  mInstrumentCommands << file->addAction(QStringLiteral("Save Setting &As..."), QKeySequence::SaveAs, this, &MainWin::HitSaveSettingAs);
   file->addSeparator();
-  file->addAction(QStringLiteral("&Export Setting..."), this, &MainWin::HitExportSetting);
-  file->addAction(QStringLiteral("&Import Setting..."), this, &MainWin::HitImportSetting);
+  mInstrumentCommands << file->addAction(QStringLiteral("&Export Setting..."), this, &MainWin::HitExportSetting);
+  mInstrumentCommands << file->addAction(QStringLiteral("&Import Setting..."), this, &MainWin::HitImportSetting);
   file->addSeparator();
   file->addAction(QStringLiteral("&Quit"), QKeySequence::Quit, this, &QWidget::close);
 }
@@ -189,6 +198,7 @@ void MainWin::BuildInstrumentMenu() {
     QAction* a = menu->addAction(text, this, [this, action] { RunAction(action); });
     a->setShortcut(key);
     if (onBar) bar->addAction(a);
+    mInstrumentCommands << a;
     return a;
   };
   add(QStringLiteral("\u25B6 &Run"), QKeySequence(Qt::Key_F5), &uiapp::Run, true);
@@ -199,7 +209,7 @@ void MainWin::BuildInstrumentMenu() {
   add(QStringLiteral("Outputs O&ff"), QKeySequence(), &uiapp::Disconnect, false);
   menu->addSeparator();
   add(QStringLiteral("Check &Trigger Mode"), QKeySequence(), &uiapp::CheckTriggerMode, false);
-  add(QStringLiteral("Self &Test..."), QKeySequence(), &uiapp::DoSelfTest, false);
+  mSelfTest = add(QStringLiteral("Self &Test..."), QKeySequence(), &uiapp::DoSelfTest, false);
 }
 
 void MainWin::BuildWindowsMenu() {
@@ -209,11 +219,38 @@ void MainWin::BuildWindowsMenu() {
     const QString resource = QString::fromStdString(entry.resource);
     QAction* action = menu->addAction(QString::fromStdString(entry.title), this, [this, resource] { OpenWindow(resource); });
     if (index <= 9) action->setShortcut(QKeySequence(Qt::CTRL | (Qt::Key_0 + index)));
+    if (entry.needsInstrument) mReadingWindows.append({action, resource});
     ++index;
   }
   menu->addSeparator();
   menu->addAction(QStringLiteral("&Cascade"), mArea, &QMdiArea::cascadeSubWindows);
   menu->addAction(QStringLiteral("&Tile"), mArea, &QMdiArea::tileSubWindows);
+}
+
+QList<QAction*> MainWin::Commands() const {
+  QList<QAction*> commands;
+  for (QAction* top : menuBar()->actions()) {
+    for (QAction* action : top->menu()->actions()) {
+      if (!action->isSeparator()) commands << action;
+    }
+  }
+  for (auto* bar : findChildren<QToolBar*>()) {
+    for (QAction* action : bar->actions()) {
+      if (!commands.contains(action)) commands << action;
+    }
+  }
+  return commands;
+}
+
+void MainWin::UpdateCommands() {
+  const bool locked = IsShowingLock();
+  for (QAction* action : mInstrumentCommands) action->setEnabled(!locked);
+  // A window that is open only needs raising.
+  for (const auto& [action, resource] : mReadingWindows) action->setEnabled(!locked || FindWindow(resource) != nullptr);
+  const RunStopDs* run = uiapp::GetRunStopDs();
+  const bool running = run != nullptr && run->IsRunning();
+  mSelfTest->setEnabled(!locked && !running);
+  mSelfTest->setStatusTip(running ? QStringLiteral("The self test cannot start while the instrument runs.") : QString());
 }
 
 void MainWin::FillRecentMenu() {
@@ -251,6 +288,10 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
     window = entry->make(nullptr, list);
   }
   if (window == nullptr) {
+    // Refused by the lock, a window's reads add no condition: say why it did not open.
+    if (list.IsEmpty() && uiapp::GetGuiLockDs()->IsLocked()) {
+      list.Add(QenStatus::kLocked, "The window \"" + entry->title + "\" reads the instrument to open; another client holds it now.");
+    }
     Show(list);
     return nullptr;
   }
@@ -271,9 +312,12 @@ QMdiSubWindow* MainWin::Adopt(QWidget* window, const QString& resource, const QS
                          ? mArea->viewport()->size().expandedTo(sub->minimumSizeHint())
                          : QSize(QWIDGETSIZE_MAX, QWIDGETSIZE_MAX);
   sub->resize(window->sizeHint().expandedTo(window->size()).boundedTo(room));
-  sub->setEnabled(!IsShowingLock());
+  ShowLockIn(window, IsShowingLock());
+  // Queued: the window is gone from the area's list by then.
+  connect(sub, &QObject::destroyed, this, &MainWin::UpdateCommands, Qt::QueuedConnection);
   sub->show();
   window->setFocus();
+  UpdateCommands();
   return sub;
 }
 
@@ -291,11 +335,16 @@ bool MainWin::IsShowingLock() const { return mBanner->isVisibleTo(this); }
 
 void MainWin::ShowLock(bool locked) {
   mBanner->setVisible(locked);
-  for (QMdiSubWindow* sub : mArea->subWindowList()) sub->widget()->setEnabled(!locked);
-  for (QAction* action : menuBar()->actions()) {
-    if (action->text() == QStringLiteral("&Instrument")) action->menu()->setEnabled(!locked);
+  for (QMdiSubWindow* sub : mArea->subWindowList()) ShowLockIn(sub->widget(), locked);
+  UpdateCommands();
+}
+
+void MainWin::ShowLockIn(QWidget* window, bool locked) {
+  if (auto* aware = dynamic_cast<LockAware*>(window)) {
+    aware->ShowLock(locked);
+  } else {
+    window->setEnabled(!locked);
   }
-  EnableSettingActions(!locked);
 }
 
 void MainWin::RunAction(int (*action)(ConditionList&)) {
@@ -379,10 +428,6 @@ bool MainWin::ConfirmLeaveSetting(const char* doing) {
       "Save", "Discard");
   if (answer == ToolkitPort::kCancel) return false;
   return answer == ToolkitPort::kNo || SaveSetting();
-}
-
-void MainWin::EnableSettingActions(bool on) {
-  for (QAction* action : mSettingActions) action->setEnabled(on);
 }
 
 int MainWin::NfyOpenSetting(QenDs*, void* client, ConditionList&) {

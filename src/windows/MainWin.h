@@ -1,8 +1,9 @@
 #pragma once
 
+#include <QList>
 #include <QMainWindow>
+#include <QPair>
 #include <memory>
-#include <vector>
 
 class QAction;
 class QLabel;
@@ -17,9 +18,13 @@ class Dstring;
 
 // The frame of the program: the windows in an MDI area, the File, Instrument, Windows and Help
 // menus, the run toolbar and the status bar of the instrument's state. While another client
-// holds the instrument every window is read-only and a banner says so; it clears by itself.
-// The title names the setting the instrument holds, with " *" while it is modified; New, Open
-// and Quit ask to save a modified setting first.
+// holds the instrument a banner says so and what cannot work is off: every command that needs
+// the instrument, the windows that must read it to open, and the windows' parts that write (a
+// window that knows which of its parts only read is a LockAware; any other is disabled whole).
+// It all comes back by itself when the lock goes. The self test is also off while the
+// instrument runs, as the instrument refuses it then. The title names the setting the
+// instrument holds, with " *" while it is modified; New, Open and Quit ask to save a modified
+// setting first.
 class MainWin : public QMainWindow {
   Q_OBJECT
 
@@ -43,13 +48,15 @@ class MainWin : public QMainWindow {
   InstrumentWaitView* WaitView() const { return mWait; }
   // Whether the window closed because the user gave up the connection and wants another.
   bool EndedToReconnect() const { return mEndedToReconnect; }
+  // Every command of the menus and the toolbar.
+  QList<QAction*> Commands() const;
 
  protected:
   void closeEvent(QCloseEvent* event) override;
   bool eventFilter(QObject* watched, QEvent* event) override;
 
  private:
-  class LockView;
+  class StateView;
   class SelfTestTool;
 
   void BuildMenus();
@@ -73,7 +80,6 @@ class MainWin : public QMainWindow {
   // Before the setting is left ("quitting"): true when it may go, asking first to save a
   // modified one (Save, Discard, Cancel).
   bool ConfirmLeaveSetting(const char* doing);
-  void EnableSettingActions(bool on);
   static int NfyOpenSetting(QenDs*, void* client, ConditionList&);
   void HitAbout();
   void UpdateTitle();
@@ -84,6 +90,9 @@ class MainWin : public QMainWindow {
   static void NfyCloseHeld(void*);
   // The active window's own Ctrl+S, when it has one, wins over the setting's.
   void FollowActiveWindow(QMdiSubWindow* sub);
+  // Turns each command on or off for the lock and the run state.
+  void UpdateCommands();
+  void ShowLockIn(QWidget* window, bool locked);
 
   QMdiArea* mArea;
   QLabel* mBanner;
@@ -91,9 +100,12 @@ class MainWin : public QMainWindow {
   InstrumentWaitView* mWait;
   QMenu* mRecent = nullptr;
   QAction* mSaveSetting = nullptr;
-  // New, Open, Recent, Save and Save As: off while another client holds the instrument.
-  std::vector<QAction*> mSettingActions;
-  std::unique_ptr<LockView> mLockView;
-  std::unique_ptr<SelfTestTool> mSelfTest;
+  // The commands that send something to the instrument.
+  QList<QAction*> mInstrumentCommands;
+  // The Windows menu's entries of windows that read the instrument to open, by resource.
+  QList<QPair<QAction*, QString>> mReadingWindows;
+  QAction* mSelfTest = nullptr;
+  std::unique_ptr<StateView> mStateView;
+  std::unique_ptr<SelfTestTool> mSelfTestTool;
   bool mEndedToReconnect = false;
 };

@@ -72,6 +72,12 @@ void TaskFollower::Resume() {
 void TaskFollower::SetActive(bool active) {
   if (active && !mTimer.isActive()) mTimer.start();
   if (!active) mTimer.stop();
-  mStart->setEnabled(!active);
+  ShowCanStart();
   mCancel->setEnabled(active);
+}
+
+void TaskFollower::ShowCanStart() {
+  const QString why = mHooks.unable ? mHooks.unable() : QString();
+  mStart->setEnabled(!IsActive() && why.isEmpty());
+  mStart->setToolTip(why);
 }

@@ -27,6 +27,9 @@ class TaskFollower : public QObject {
     std::function<void(const InstrumentTask::Progress&)> running;
     std::function<void(const InstrumentTask::Progress&)> ended;
     std::function<void(const QString&)> say;
+    // Why the task cannot start now, empty when it can: the start button is off while there is
+    // a reason, and its tooltip gives it.
+    std::function<QString()> unable;
   };
 
   TaskFollower(InstrumentTask task, QProgressBar* bar, QPushButton* start, QPushButton* cancel, Hooks hooks,
@@ -39,6 +42,8 @@ class TaskFollower : public QObject {
   // At the window's opening: follows a task that runs, or shows how the last one ended.
   void Resume();
   bool IsActive() const { return mTimer.isActive(); }
+  // Turns the start button on or off for what `unable` says now.
+  void ShowCanStart();
 
  private:
   void SetActive(bool active);

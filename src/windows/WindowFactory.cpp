@@ -32,18 +32,18 @@ WindowFactory::Make Maker() {
 const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
   // Editors first, then the tools used all day: the first nine have Ctrl+1 … Ctrl+9.
   static const std::vector<Entry> kEntries = {
-      {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>()},
-      {"dataedit.SegmentEditWin", "Segment Editor", Maker<DataeditSegmentEditWin>()},
-      {"smseqedit.Win", "Simple Sequence", Maker<SmseqeditWin>()},
-      {"LoopGridEdit.Win", "Loop Grid", Maker<LoopGridEditWin>()},
-      {"seqedit.SeqEdWin", "Sequence", Maker<SeqeditSeqEdWin>()},
+      {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>(), true},
+      {"dataedit.SegmentEditWin", "Segment Editor", Maker<DataeditSegmentEditWin>(), true},
+      {"smseqedit.Win", "Simple Sequence", Maker<SmseqeditWin>(), true},
+      {"LoopGridEdit.Win", "Loop Grid", Maker<LoopGridEditWin>(), true},
+      {"seqedit.SeqEdWin", "Sequence", Maker<SeqeditSeqEdWin>(), true},
       {"bconnect.ConnectWin", "System Scheme", Maker<BconnectConnectWin>()},
       {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
       {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
       {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
       {"errstate.ErrStateWin", "Error State", Maker<ErrstateErrStateWin>()},
       {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
-      {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>()},
+      {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>(), true},
       {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
       {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
   };

@@ -17,6 +17,8 @@ class WindowFactory {
     Dstring resource;
     Dstring title;
     Make make;
+    // The window reads the instrument to open, so it cannot open while another client holds it.
+    bool needsInstrument = false;
   };
 
   // The built windows, in menu order.

@@ -99,10 +99,12 @@ TEST_F(UiappTest, LockIsNoticedThenReleasedAndTheStateReadAnew) {
   Inst().Expect("_H:SGEN:GLOB:INIT:CONT?", "", QenStatus::kLocked);
   Tick();
   EXPECT_TRUE(uiapp::GetGuiLockDs()->IsLocked());
-  // Free again: the probe passes, the loop levels are read, the service is set up anew ...
+  // Free again: the probe passes, the loop levels are read, the service is set up anew with
+  // the counts the other client's run left ...
   Inst().Expect("_H:SGEN:GLOB:INIT:CONT?", "OFF");
   Inst().Expect(":_H:SGEN:GLOB:SEQ:LLEV?", "3");
   Inst().Expect(":L:_H:CGR?", "\":_H:CGR1:MOD3:CONN1:BER\",\":_H:CGR1:PER\"");
+  Inst().Expect(":_H:CGR1:MOD3:CONN1:BER?", "1000000,2,2.000000000000E-006");
   // ... and everything that follows the dirty flag reads anew, answered as a server would.
   Inst().SetHandler([](const Dstring& cmd, Dstring& reply) {
     EXPECT_TRUE(AnswerAsServer(cmd, reply)) << "unexpected command: " << cmd;
@@ -113,6 +115,7 @@ TEST_F(UiappTest, LockIsNoticedThenReleasedAndTheStateReadAnew) {
   EXPECT_TRUE(uiapp::GetRunStopDs()->IsRunning());
   EXPECT_EQ(uiapp::GetSystemState(), kSysRunning);
   ASSERT_EQ(uiapp::GetBerSvr()->GetResults().size(), 1u);
+  EXPECT_EQ(uiapp::GetBerSvr()->GetResults()[0].errors, 2u);
   // Running: the next tick also reads the error counts.
   Inst().Expect("_H:DFL?", "");
   Inst().Expect(":_H:CGR1:MOD3:CONN1:BER?", "1000000,3,3.000000000000E-006");

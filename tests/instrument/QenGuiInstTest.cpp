@@ -65,6 +65,33 @@ TEST_F(QenGuiInstTest, QueuedErrorsAreDrainedInOrderAndLogged) {
   EXPECT_TRUE(mInst.AllConsumed());
 }
 
+// Each error keeps the command it came from, and the dialog says once, before the first of
+// them, what the installed describer makes of the command; a condition of the program's own has
+// no command and gets nothing.
+TEST_F(QenGuiInstTest, ErrorsKeepTheirCommandAndTheDialogDescribesItOnce) {
+  mInst.Expect(":_H:CGR1:PER 9", "", 2);
+  mInst.Expect(":_H:SYST:ERR?", "-222,\"Data out of range\"");
+  mInst.Expect(":_H:SYST:ERR?", "-113,\"Undefined header\"");
+  mInst.Expect(":_H:SYST:ERR?", "0,\"No error\"");
+  QenGuiInst::Call(&mInst, ":_H:CGR1:PER 9", mReply, mList);
+  mList.Add(1, "Of the program's own");
+  ASSERT_EQ(mList.Size(), 3u);
+  EXPECT_EQ(mList[0].GetCommand(), ":_H:CGR1:PER 9");
+  EXPECT_EQ(mList[1].GetCommand(), ":_H:CGR1:PER 9");
+  EXPECT_EQ(mList[2].GetCommand(), "");
+  std::vector<Dstring> asked;
+  QenGuiInst::SetRefusalDescriber([&](const Condition& c) {
+    asked.push_back(c.GetCommand());
+    return Dstring("Period: 9 s asked.");
+  });
+  EXPECT_EQ(QenGuiInst::ErrorDlgText(mList),
+            "Period: 9 s asked.\n\nERROR -222\n\nData out of range.\n----------\nERROR -113\n\nUndefined header."
+            "\n----------\nERROR 1\n\nOf the program's own.");
+  EXPECT_EQ(asked, std::vector<Dstring>{":_H:CGR1:PER 9"});
+  QenGuiInst::SetRefusalDescriber(nullptr);
+  EXPECT_EQ(QenGuiInst::ErrorDlgText(mList).rfind("ERROR -222", 0), 0u);
+}
+
 TEST_F(QenGuiInstTest, CoupledQueryReadsTheQueueOfTheSecondElement) {
   mInst.Expect(":VC:_h:CGR1:PER 1", "", 1);
   mInst.Expect(":_h:SYST:ERR?", "-100,\"Command error\"");

@@ -132,7 +132,7 @@ TEST_F(SimScpiTest, EachConnectionHasItsOwnHandleAndChangeSet) {
   EXPECT_EQ(mScpi.GetHandle(), "SCPI");
   EXPECT_EQ(other.GetHandle(), "SCPIA");
   Send("CGR1:PER 2E-9");
-  EXPECT_EQ(Send("DFL?"), "");
+  EXPECT_EQ(Send("DFL?"), "\":SCPI:SGEN:GLOB:PLL:STAT\"");
   EXPECT_EQ(Send(other, "DFL?"), "\":SCPIA:CGR1:FREQ\",\":SCPIA:CGR1:PER\",\":SCPIA:SGEN:GLOB:PLL:STAT\"");
   EXPECT_EQ(Text(":_H:CGR1:PER?"), "2.000000000000E-09");
 }

@@ -102,14 +102,34 @@ TEST_F(SimStateTest, RunStateFollowsTheClock) {
   EXPECT_EQ(Text(syst), "HALT");
 }
 
-TEST_F(SimStateTest, TimedChangesMarkEveryoneAndTheStartMarksOthers) {
-  Reply(":_H:SGEN:GLOB:INIT:CONT ON");
-  EXPECT_EQ(Dirty("_H", kConn), "");
-  EXPECT_EQ(Dirty("_B", kOther),
-            "\":_B:SGEN:GLOB:INIT:CONT\",\":_B:SGEN:GLOB:SYST:STAT\",\":_B:SGEN:GLOB:PLL:STAT\"");
-  mClock.Advance(500);
-  EXPECT_EQ(Dirty("_H", kConn), "\":_H:SGEN:GLOB:SYST:STAT\",\":_H:SGEN:GLOB:PLL:STAT\"");
-  EXPECT_EQ(Dirty("_B", kOther), "\":_B:SGEN:GLOB:SYST:STAT\",\":_B:SGEN:GLOB:PLL:STAT\"");
+// The writer knows the state it set, not what followed from it: that it hears with everyone.
+TEST_F(SimStateTest, StateChangesMarkEveryoneButTheWriterOfTheSwitchItSet) {
+  struct Step {
+    long long advanceMs;
+    const char* command;  // of "_H"
+    const char* writer;   // what "_H" hears, "%s" for its handle
+    const char* other;    // what "_B" hears
+  };
+  const Step steps[] = {
+      {0, ":_H:SGEN:GLOB:INIT:CONT ON", "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\"",
+       "\":%s:SGEN:GLOB:INIT:CONT\",\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\""},
+      {500, ":_H:CGR1:PER?", "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\"",
+       "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\""},
+      {0, ":_H:SGEN:GLOB:SEQ:FORC", "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\"",
+       "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\""},
+      {500, ":_H:SGEN:GLOB:INIT:CONT OFF", "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\"",
+       "\":%s:SGEN:GLOB:SYST:STAT\",\":%s:SGEN:GLOB:PLL:STAT\",\":%s:SGEN:GLOB:INIT:CONT\""},
+      {0, ":_H:SGEN:GLOB:INIT:CONT OFF", "", ""},
+      {0, ":_H:SGEN:GLOB:CONN ON", "", "\":%s:SGEN:GLOB:CONN\""},
+      {0, ":_H:CGR1:PER 2E-9", "\":%s:SGEN:GLOB:PLL:STAT\"",
+       "\":%s:CGR1:FREQ\",\":%s:CGR1:PER\",\":%s:SGEN:GLOB:PLL:STAT\""},
+  };
+  for (const Step& s : steps) {
+    mClock.Advance(s.advanceMs);
+    Reply(s.command);
+    EXPECT_EQ(Dirty("_H", kConn), Dstring::Format(s.writer, "_H", "_H", "_H")) << s.command;
+    EXPECT_EQ(Dirty("_B", kOther), Dstring::Format(s.other, "_B", "_B", "_B")) << s.command;
+  }
 }
 
 TEST_F(SimStateTest, LockHolderAloneIsServedUntilItLetsGoOrLeaves) {

@@ -4,6 +4,7 @@
 #include <QLineSeries>
 #include <QPushButton>
 #include <QRegularExpression>
+#include <QValueAxis>
 #include <QTableWidget>
 #include <QTest>
 #include <cstdio>
@@ -132,4 +133,59 @@ TEST_F(BerWinTest, TheTableAndTheStatusBarWriteRatiosAndCountsInOneForm) {
                                    QString::fromStdString(NumberText::Grouped(errors)));
   EXPECT_TRUE(ratio.match(QString::fromStdString(NumberText::Ratio(errors, compared))).hasMatch());
   EXPECT_TRUE(bar.Text().contains(summary)) << bar.Text().toStdString() << " lacks " << summary.toStdString();
+}
+
+// A program started after a run shows the counts the run left, not nothing: the service reads
+// them when it is set up, as the host does at start.
+TEST_F(BerWinTest, ANewlyStartedProgramShowsTheCountsARunLeft) {
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  for (int i = 0; i < 2000 && Other(mPort + "?").find(",0,") != std::string::npos; ++i) {
+  }
+  Other(":SGEN:GLOB:INIT:CONT OFF");
+  const Dstring counts = Other(mPort + "?");
+  const std::size_t comma = counts.find(',');
+  const unsigned long long compared = std::stoull(counts.substr(0, comma));
+  const unsigned long long errors = std::stoull(counts.substr(comma + 1));
+  ASSERT_GT(errors, 0u) << counts;
+
+  mWin.reset();
+  uiapp::GetBerSvr()->End();
+  ASSERT_EQ(uiapp::GetBerSvr()->Init(mList), 0) << mList.ToText();
+  Poll();
+  mWin = std::make_unique<BerBerWin>();
+  ASSERT_EQ(mWin->Load(mList), 0) << mList.ToText();
+  EXPECT_EQ(Cell(0, 1), NumberText::Grouped(compared));
+  EXPECT_EQ(Cell(0, 2), NumberText::Grouped(errors));
+  EXPECT_NEAR(std::stod(Cell(0, 3)), 1e-2, 2e-3) << Cell(0, 3);
+}
+
+// The counts are the instrument's since its run started; the chart begins when the window saw
+// them first, and says when and why.
+TEST_F(BerWinTest, TheChartSaysFromWhenItCounts) {
+  auto since = [](const BerBerWin& win, const char* why) {
+    const QRegularExpression title(QStringLiteral("^Bit error rate since (\\d\\d:\\d\\d:\\d\\d), %1$").arg(QLatin1String(why)));
+    const QRegularExpressionMatch match = title.match(win.Chart()->title());
+    if (!match.hasMatch()) return "no match: " + win.Chart()->title().toStdString();
+    const QString axis = win.Chart()->axes(Qt::Horizontal).first()->titleText();
+    return axis == QStringLiteral("Seconds since ") + match.captured(1) ? std::string("ok") : "axis: " + axis.toStdString();
+  };
+  EXPECT_EQ(since(*mWin, "when this window opened"), "ok");
+  Other(mPort + ":INJ 1E-2");
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  Poll();
+  EXPECT_EQ(since(*mWin, "when the run started"), "ok");
+  PollUntilErrors();
+  EXPECT_EQ(mWin->History().Samples().front().seconds, 0.0);
+
+  // Opened in the middle of the run, the table has the whole run and the chart says it began later.
+  BerBerWin late;
+  ASSERT_EQ(late.Load(mList), 0) << mList.ToText();
+  EXPECT_EQ(since(late, "when this window opened"), "ok");
+  EXPECT_EQ(late.Table()->item(0, 2)->text(), mWin->Table()->item(0, 2)->text());
+  EXPECT_EQ(late.History().Samples().size(), 1u);
+
+  QTest::mouseClick(mWin->findChild<QPushButton*>(QStringLiteral("PButReset")), Qt::LeftButton);
+  EXPECT_EQ(since(*mWin, "when the counts were reset"), "ok");
+  EXPECT_EQ(since(late, "when this window opened"), "ok");
 }

@@ -8,13 +8,19 @@
 #include <QPushButton>
 #include <QTableWidget>
 #include <QTest>
+#include <QToolBar>
 #include <QTreeWidget>
+#include <functional>
+#include <iterator>
 #include <memory>
 
 #include "common/gui/GuiSimFixture.h"
 #include "core/ErrorJournal.h"
+#include "core/uiapp.h"
+#include "data/SystemStateDs.h"
 #include "params/ui/ParSpinBox.h"
 #include "params/ui/QenDsCBut.h"
+#include "params/ui/QenDsSTEd.h"
 #include "params/ui/QenParEd.h"
 #include "params/ui/UnitLabel.h"
 #include "windows/MainWin.h"
@@ -26,6 +32,7 @@
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
+#include "windows/selftest/SelftestResultWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
@@ -120,28 +127,231 @@ TEST_F(MainWinTest, ParameterEditorShowsOnlyWhatTheItemHas) {
   for (const auto& e : ErrorJournal::Entries()) ADD_FAILURE() << e.command << ": " << e.text;
 }
 
-TEST_F(MainWinTest, ALockByAnotherClientMakesEverythingReadOnlyUntilItGoes) {
-  Open<ParameditParamEdWin>("paramedit.ParamEd");
+// The module's model cannot be written: its field never writes and shows a plain text.
+TEST_F(MainWinTest, AReadOnlyFieldNeverWritesAndLooksReadOnly) {
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1"));
+  auto* model = editor->CurrentPanel()->findChild<QenDsSTEd*>(QStringLiteral("TextType"));
+  ASSERT_NE(model, nullptr);
+  const Dstring quoted = Other(":CGR1:MOD1:TYPE?");
+  ASSERT_EQ(quoted, "\"K2268A\"");
+  EXPECT_TRUE(model->isReadOnly());
+  EXPECT_EQ(model->text().toStdString(), "K2268A");
+  EXPECT_FALSE(model->hasFrame());
+  EXPECT_EQ(model->palette().color(QPalette::Base), model->palette().color(QPalette::Window));
+  const std::size_t journal = ErrorJournal::Entries().size();
+  model->setFocus();
+  QTest::keyClick(model, Qt::Key_Return);
+  editor->Tree()->setFocus();
+  ConditionList list;
+  EXPECT_EQ(model->SendValue(list), 0);
+  QCoreApplication::processEvents();
+  EXPECT_EQ(ErrorJournal::Entries().size(), journal) << ErrorJournal::Entries().front().command;
+  EXPECT_TRUE(list.IsEmpty());
+  EXPECT_TRUE(mAlerts.empty()) << (mAlerts.empty() ? "" : mAlerts[0]);
+  EXPECT_EQ(model->text().toStdString(), "K2268A");
+}
+
+// A refused value names the parameter by its place and label, the value asked and the limits
+// the instrument holds, then the code and text.
+TEST_F(MainWinTest, ARefusedValueSaysWhichParameterWhatWasAskedAndTheLimits) {
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1:CONN2"));
+  struct Case {
+    const char* field;
+    const char* typed;
+    const char* alert;
+  };
+  const Case cases[] = {
+      {"FieldAmpl", "99",
+       "Group 1 \u203A Module 1 \u203A Port 2 \u00B7 Amplitude: 99 V asked; the instrument takes 0.1 V to 5 V.\n\n"
+       "ERROR -222\n\nData out of range."},
+      {"FieldAmpl", "5", ""},
+      // The delay is held within the clock group's period, 1 ns.
+      {"FieldDelay", "1.5",
+       "Group 1 \u203A Module 1 \u203A Port 2 \u00B7 Delay: 1.5 ns asked; the instrument takes 0 ns to 1 ns.\n\n"
+       "ERROR -222\n\nData out of range."},
+      {"FieldDelay", "1", ""},
+  };
+  for (const Case& c : cases) {
+    mAlerts.clear();
+    QenParEd* field = Field(editor, c.field);
+    ASSERT_NE(field, nullptr) << c.field;
+    field->Editor()->setFocus();
+    QTest::keyClick(field->Editor(), Qt::Key_A, Qt::ControlModifier);
+    QTest::keyClicks(field->Editor(), c.typed);
+    QTest::keyClick(field->Editor(), Qt::Key_Return);
+    QCoreApplication::processEvents();
+    if (*c.alert == '\0') {
+      EXPECT_TRUE(mAlerts.empty()) << c.field << " " << c.typed << ": " << (mAlerts.empty() ? "" : mAlerts[0]);
+      continue;
+    }
+    ASSERT_EQ(mAlerts.size(), 1u) << c.field << " " << c.typed;
+    EXPECT_EQ(std::string(mAlerts[0]), std::string(c.alert)) << c.field;
+  }
+  Other(":CGR1:MOD1:CONN2:VOLT:AMPL 1");
+  Other(":CGR1:MOD1:CONN2:PULS:DEL 0");
+}
+
+// The instrument refuses the self test while it runs: the dialog says so and the button goes off.
+TEST_F(MainWinTest, ARefusedSelfTestSaysWhyAndItsButtonIsOffWhileItCannotWork) {
+  auto* window = Open<SelftestResultWin>("selftest.Result");
+  auto* start = window->findChild<QPushButton*>(QStringLiteral("PButStart"));
+  ASSERT_NE(start, nullptr);
+  EXPECT_TRUE(start->isEnabled());
+  // Started by another client, not yet seen by the poll.
+  Other(":SGEN:GLOB:INIT:CONT ON");
+  QTest::mouseClick(start, Qt::LeftButton);
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_EQ(mAlerts[0], "Self test: the self test cannot start while the instrument runs.\n\nERROR -200\n\nExecution error.");
+  EXPECT_FALSE(start->isEnabled());
+  EXPECT_EQ(start->toolTip(), "The self test cannot start while the instrument runs.");
+  Other(":SGEN:GLOB:INIT:CONT OFF");
+  Poll();
+  EXPECT_TRUE(start->isEnabled());
+}
+
+// What cannot work while another client holds the instrument is off; what only reads stays.
+TEST_F(MainWinTest, ALockTurnsOffWhatWouldChangeTheInstrumentAndKeepsWhatOnlyReads) {
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  Open<DtecmdCmdWin>("dtecmd.CmdWin");
+  ASSERT_TRUE(editor->SelectPath(":CGR1:MOD1:CONN1"));
+  QWidget* portPanel = editor->CurrentPanel();
+  // Reads nothing to open, opened in the lock: still only what reads works in it.
+  struct Expected {
+    const char* text;  // without "&"
+    bool locked;       // enabled while locked
+  };
+  const Expected commands[] = {
+      {"New Setting", false},   {"Open Setting...", false},   {"Recent Settings", false},
+      {"Save Setting", false},  {"Save Setting As...", false}, {"Quit", true},
+      {"\u25B6 Run", false},    {"\u25A0 Stop", false},        {"Sequence Force", false},
+      {"Outputs On", false},    {"Outputs Off", false},       {"Check Trigger Mode", false},
+      {"Self Test...", false},  {"Parameter Editor", true},   {"Segment Editor", false},
+      {"Simple Sequence", false}, {"Loop Grid", false},       {"Sequence", false},
+      {"System Scheme", true},  {"Command Window", true},     {"Error List", true},
+      {"Bit Error Rate", true}, {"Error State", true},        {"Waveform", true},
+      {"Measurement Mode", false}, {"Deskew", true},          {"Self Test", true},
+      {"Cascade", true},        {"Tile", true},               {"About qengui", true},
+  };
+  auto find = [&](const char* text) -> QAction* {
+    for (QAction* a : mWin->Commands()) {
+      if (a->text().remove(QLatin1Char('&')) == QString::fromUtf8(text)) return a;
+    }
+    return nullptr;
+  };
+  const QList<QAction*> all = mWin->Commands();
+  EXPECT_EQ(all.size(), static_cast<qsizetype>(std::size(commands))) << "a command without an expectation";
+  for (const Expected& c : commands) {
+    ASSERT_NE(find(c.text), nullptr) << c.text;
+    EXPECT_TRUE(find(c.text)->isEnabled()) << c.text << " is off while the instrument is free";
+  }
+  // The toolbar holds the very actions of the menu.
+  auto* bar = mWin->findChild<QToolBar*>(QStringLiteral("RunToolBar"));
+  ASSERT_NE(bar, nullptr);
+  EXPECT_EQ(bar->actions(), (QList<QAction*>{find("\u25B6 Run"), find("\u25A0 Stop"), find("Sequence Force")}));
+
   Control(":TEST:LOCK ON");
   // The first tick meets the lock; the next one's guard knows it.
   Poll();
   Poll();
-  EXPECT_TRUE(mWin->IsShowingLock());
-  EXPECT_FALSE(mWin->Area()->subWindowList().front()->widget()->isEnabled());
+  ASSERT_TRUE(mWin->IsShowingLock());
+  for (const Expected& c : commands) EXPECT_EQ(find(c.text)->isEnabled(), c.locked) << c.text << " while locked";
+  // The parameter tree still moves; the panel is read-only, and an item not read yet says so.
+  EXPECT_TRUE(editor->isEnabled());
+  EXPECT_TRUE(editor->Tree()->isEnabled());
+  EXPECT_FALSE(portPanel->isEnabled());
+  EXPECT_FALSE(mWin->FindWindow(QStringLiteral("dtecmd.CmdWin"))->isEnabled());
+  ASSERT_TRUE(editor->SelectPath(":CGR2:MOD1:CONN1"));
+  auto* unread = qobject_cast<QLabel*>(editor->ShownPage());
+  ASSERT_NE(unread, nullptr);
+  EXPECT_EQ(unread->text().toStdString(),
+            "Another client holds the instrument: the values of Clock group 2 \u203A Module 1 (K2268B) \u203A Port 1 data out "
+            "are read once it lets go.");
+  EXPECT_EQ(editor->CurrentPanel(), portPanel) << "the panel stays with what it shows";
+  EXPECT_EQ(Field(editor, "FieldAmpl")->GetDsName(), ":" + mHandle + ":CGR1:MOD1:CONN1:VOLT:AMPL");
+  // A window that must read to open says why it does not.
+  EXPECT_EQ(mWin->OpenWindow(QStringLiteral("smseqedit.Win")), nullptr);
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find("\"Simple Sequence\" reads the instrument to open"), Dstring::npos) << mAlerts[0];
+  mAlerts.clear();
+
   Control(":TEST:LOCK OFF");
   Poll();
   Poll();
   EXPECT_FALSE(mWin->IsShowingLock());
-  EXPECT_TRUE(mWin->Area()->subWindowList().front()->widget()->isEnabled());
+  for (const Expected& c : commands) EXPECT_TRUE(find(c.text)->isEnabled()) << c.text << " after the lock";
+  EXPECT_TRUE(portPanel->isEnabled());
+  EXPECT_TRUE(mWin->FindWindow(QStringLiteral("dtecmd.CmdWin"))->isEnabled());
+  // The item chosen in the lock is read now.
+  EXPECT_EQ(editor->ShownPage(), editor->CurrentPanel());
+  EXPECT_EQ(Field(editor, "FieldAmpl")->GetDsName(), ":" + mHandle + ":CGR2:MOD1:CONN1:VOLT:AMPL");
   EXPECT_TRUE(mAlerts.empty());
 }
 
-TEST_F(MainWinTest, StatusBarFollowsTheRunState) {
-  EXPECT_TRUE(mWin->StatusBarView()->Text().startsWith(QStringLiteral("\u25A0 Stopped"))) << mWin->StatusBarView()->Text().toStdString();
+// The self test cannot run while the instrument runs: its command is off then.
+TEST_F(MainWinTest, TheSelfTestIsOffWhileTheInstrumentRuns) {
+  QAction* selfTest = nullptr;
+  for (QAction* a : mWin->Commands()) {
+    if (a->text() == QStringLiteral("Self &Test...")) selfTest = a;
+  }
+  ASSERT_NE(selfTest, nullptr);
+  EXPECT_TRUE(selfTest->isEnabled());
   Other(":SGEN:GLOB:INIT:CONT ON");
   Poll();
-  EXPECT_TRUE(mWin->StatusBarView()->Text().contains(QStringLiteral("Running"))) << mWin->StatusBarView()->Text().toStdString();
+  EXPECT_FALSE(selfTest->isEnabled());
+  EXPECT_EQ(selfTest->statusTip(), "The self test cannot start while the instrument runs.");
   Other(":SGEN:GLOB:INIT:CONT OFF");
+  Poll();
+  EXPECT_TRUE(selfTest->isEnabled());
+}
+
+// One poll after any start or stop, by this program or by another client, the status bar shows
+// the state the instrument holds.
+TEST_F(MainWinTest, TheStateShowsWhatTheInstrumentHoldsOnePollAfterAnyRunOrStop) {
+  QAction* run = nullptr;
+  QAction* stop = nullptr;
+  for (QAction* a : mWin->Commands()) {
+    if (a->shortcut() == QKeySequence(Qt::Key_F5)) run = a;
+    if (a->shortcut() == QKeySequence(Qt::SHIFT | Qt::Key_F5)) stop = a;
+  }
+  ASSERT_TRUE(run != nullptr && stop != nullptr);
+  struct Step {
+    const char* what;
+    std::function<void()> act;
+    bool running;
+  };
+  const Step steps[] = {
+      {"Run here", [&] { run->trigger(); }, true},
+      {"Stop here", [&] { stop->trigger(); }, false},
+      {"Run elsewhere", [&] { Other(":SGEN:GLOB:INIT:CONT ON"); }, true},
+      {"Stop elsewhere", [&] { Other(":SGEN:GLOB:INIT:CONT OFF"); }, false},
+      {"Run here, stop elsewhere", [&] { run->trigger(), Other(":SGEN:GLOB:INIT:CONT OFF"); }, false},
+      {"Run elsewhere, stop here", [&] { Other(":SGEN:GLOB:INIT:CONT ON"), Poll(), stop->trigger(); }, false},
+      {"Run here by the keyboard", [&] { QTest::keyClick(mWin.get(), Qt::Key_F5); }, true},
+      {"Stop here by the keyboard", [&] { QTest::keyClick(mWin.get(), Qt::Key_F5, Qt::ShiftModifier); }, false},
+  };
+  auto* system = mWin->StatusBarView()->findChild<QLabel*>(QStringLiteral("StatusSystem"));
+  auto* state = mWin->StatusBarView()->findChild<QLabel*>(QStringLiteral("StatusRun"));
+  for (const Step& s : steps) {
+    s.act();
+    Poll();
+    if (s.running) {
+      // Synchronising for half a second after a start, then running: either, never "Programming".
+      EXPECT_TRUE(system->text() == "System: Synchronising" || system->text() == "System: Running")
+          << s.what << ": " << system->text().toStdString();
+      EXPECT_TRUE(uiapp::GetSystemState() == kSysSync || uiapp::GetSystemState() == kSysRunning) << s.what;
+      EXPECT_EQ(state->text().toStdString(), "\u25B6 Running") << s.what;
+    } else {
+      EXPECT_EQ(Other(":SGEN:GLOB:SYST:STAT?"), "PROG") << s.what;
+      EXPECT_EQ(system->text().toStdString(), "System: Programming") << s.what;
+      EXPECT_EQ(uiapp::GetSystemState(), kSysProg) << s.what;
+      EXPECT_EQ(state->text().toStdString(), "\u25A0 Stopped") << s.what;
+    }
+  }
+  EXPECT_TRUE(mAlerts.empty()) << (mAlerts.empty() ? "" : mAlerts[0]);
 }
 
 TEST_F(MainWinTest, CommandWindowShowsRepliesAndTheErrorListTheErrors) {

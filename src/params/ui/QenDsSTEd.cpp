@@ -1,7 +1,25 @@
 #include "params/ui/QenDsSTEd.h"
 
+#include <QEvent>
+
 #include "instrument/QenStatus.h"
 #include "params/ValueText.h"
+#include "support/DataParcel.h"
+#include "support/ParserExpression.h"
+
+namespace {
+
+// A reply that is one quoted string, as the text inside; anything else as it came.
+QString PlainText(const Dstring& reply) {
+  DataParcel parcel;
+  ConditionList ignored;
+  if (ParserExpression::Parse(reply, parcel, ignored) == 0 && parcel.size() == 1 && parcel[0].IsText()) {
+    return QString::fromStdString(Dstring(parcel[0].GetText()));
+  }
+  return QString::fromStdString(reply);
+}
+
+}  // namespace
 
 QenDsSTEd::QenDsSTEd(QWidget* parent) : QLineEdit(parent), BoundControl(this, "QenDsSTEd") {
   connect(this, &QLineEdit::returnPressed, this, &QenDsSTEd::HitReturn);
@@ -11,7 +29,11 @@ int QenDsSTEd::Refresh(ConditionList& list) {
   Dstring reply;
   const int status = Binding().Query(false, reply, list);
   if (status == 0 && Binding().GetDs() != nullptr) {
-    setText(ValueText::IsNoValue(reply) ? QString() : QString::fromStdString(reply));
+    if (ValueText::IsNoValue(reply)) {
+      setText(QString());
+    } else {
+      setText(isReadOnly() ? PlainText(reply) : QString::fromStdString(reply));
+    }
     setModified(false);
     mRefused = false;
   }
@@ -44,4 +66,14 @@ void QenDsSTEd::focusOutEvent(QFocusEvent* event) {
     Report(list);
   }
   QLineEdit::focusOutEvent(event);
+}
+
+void QenDsSTEd::changeEvent(QEvent* event) {
+  if (event->type() == QEvent::ReadOnlyChange) {
+    setFrame(!isReadOnly());
+    QPalette shown = palette();
+    shown.setColor(QPalette::Base, isReadOnly() ? shown.color(QPalette::Window) : QPalette().color(QPalette::Base));
+    setPalette(shown);
+  }
+  QLineEdit::changeEvent(event);
 }

@@ -5,8 +5,10 @@
 #include "params/ui/BoundControl.h"
 
 // A one-line text field bound to a parameter. The text is written as it stands on Return, on
-// focus loss and when its window is left while it has the focus; a read-only one never writes.
-// A refused text stays for correcting and is not sent again on focus loss until changed.
+// focus loss and when its window is left while it has the focus. A refused text stays for
+// correcting and is not sent again on focus loss until changed. A read-only field (a parameter
+// that cannot be written, as a module's model) never writes, and shows the value as a plain
+// text: no frame, no edit background, a quoted string without its quotes.
 class QenDsSTEd : public QLineEdit, public BoundControl {
   Q_OBJECT
   Q_PROPERTY(QString DsBaseName READ DsBaseNameProperty WRITE SetDsBaseNameProperty)
@@ -23,6 +25,7 @@ class QenDsSTEd : public QLineEdit, public BoundControl {
 
  protected:
   void focusOutEvent(QFocusEvent* event) override;
+  void changeEvent(QEvent* event) override;
 
  private:
   void HitReturn();

@@ -40,6 +40,10 @@ class BerBerWin::View : public QenDsView {
  public:
   explicit View(BerBerWin& win) : mWin(win) {}
   int NfyViewDataUpdated(QenDs* changed, ConditionList& list) override {
+    RunStopDs* run = uiapp::GetRunStopDs();
+    // A start counts afresh on the instrument: the chart does too.
+    if (changed == run && run->IsRunning() && !mWin.mWasRunning) mWin.Restart(Origin::RunStarted);
+    if (changed == run) mWin.mWasRunning = run->IsRunning();
     mWin.ShowResults();
     ReadBerAtStop(changed, list);
     return 0;
@@ -74,10 +78,8 @@ int BerBerWin::Load(ConditionList& list) {
   for (int c = 1; c < 4; ++c) mTable->horizontalHeader()->setSectionResizeMode(c, QHeaderView::ResizeToContents);
 
   mChart = new QChart();
-  mChart->setTitle(QStringLiteral("Bit error rate over time"));
   mChart->legend()->setAlignment(Qt::AlignRight);
   mTimeAxis = new QValueAxis(mChart);
-  mTimeAxis->setTitleText(QStringLiteral("Time (s)"));
   mTimeAxis->setLabelFormat(QStringLiteral("%.0f"));
   mTimeAxis->setRange(0, 60);
   mRatioAxis = new QLogValueAxis(mChart);
@@ -92,7 +94,8 @@ int BerBerWin::Load(ConditionList& list) {
   view->setRenderHint(QPainter::Antialiasing);
   area->layout()->addWidget(view);
 
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButReset"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
+  mReset = findChild<QPushButton*>(QStringLiteral("PButReset"));
+  if (mReset != nullptr) connect(mReset, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
   if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportTable"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportTable);
   if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportHistory"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportHistory);
   if (BerSvr* svr = uiapp::GetBerSvr()) {
@@ -100,9 +103,23 @@ int BerBerWin::Load(ConditionList& list) {
     if (!svr->IsInitialized()) svr->Init(list);
     svr->RegisterView(mView.get(), list);
   }
-  if (uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->RegisterView(mView.get(), list);
+  if (uiapp::GetRunStopDs() != nullptr) {
+    uiapp::GetRunStopDs()->RegisterView(mView.get(), list);
+    mWasRunning = uiapp::GetRunStopDs()->IsRunning();
+  }
   ShowResults();
   return 0;
+}
+
+void BerBerWin::ShowLock(bool locked) {
+  if (mReset != nullptr) mReset->setEnabled(!locked);
+}
+
+void BerBerWin::Restart(Origin origin) {
+  mHistory.Clear();
+  mOrigin = origin;
+  // The same counts are a first sample of the new history.
+  mShown.clear();
 }
 
 void BerBerWin::ShowResults() {
@@ -112,8 +129,8 @@ void BerBerWin::ShowResults() {
   if (results.empty()) {
     mState->setText(QStringLiteral("This configuration has no analyser ports."));
   } else {
-    mState->setText(running ? QStringLiteral("Running: the counts follow the instrument.")
-                            : QStringLiteral("Stopped: the counts change only while the instrument runs."));
+    mState->setText(running ? QStringLiteral("Running: the instrument's counts since the run started or was reset.")
+                            : QStringLiteral("Stopped: the counts of the last run; they change only while the instrument runs."));
   }
   if (results == mShown && mTable->rowCount() == static_cast<int>(results.size())) return;
   mTable->setRowCount(static_cast<int>(results.size()));
@@ -126,11 +143,18 @@ void BerBerWin::ShowResults() {
     mTable->item(row, 2)->setForeground(r.errors > 0 ? QColor(0xb3, 0x26, 0x1e) : palette().color(QPalette::Text));
   }
   mShown = results;
-  if (!results.empty()) mHistory.Add(static_cast<double>(mClock.elapsed()) / 1000.0, results);
+  if (!results.empty()) {
+    if (mHistory.Samples().empty()) mSince = QTime::currentTime();
+    mHistory.Add(static_cast<double>(mClock.elapsed()) / 1000.0, results);
+  }
   ShowChart();
 }
 
 void BerBerWin::ShowChart() {
+  static const char* const kWhy[] = {"when this window opened", "when the run started", "when the counts were reset"};
+  const QString since = mSince.isValid() ? mSince.toString(QStringLiteral("HH:mm:ss")) : QStringLiteral("--:--:--");
+  mChart->setTitle(QStringLiteral("Bit error rate since %1, %2").arg(since, QLatin1String(kWhy[static_cast<int>(mOrigin)])));
+  mTimeAxis->setTitleText(QStringLiteral("Seconds since %1").arg(since));
   const auto& samples = mHistory.Samples();
   const auto& ports = mHistory.Ports();
   while (mChart->series().size() > static_cast<int>(ports.size())) {
@@ -160,6 +184,8 @@ void BerBerWin::ShowChart() {
       }
     }
     series->replace(points);
+    // A line needs two samples: the first one alone is drawn as a point.
+    series->setPointsVisible(points.size() == 1);
   }
   const double last = samples.empty() ? 0.0 : samples.back().seconds;
   mTimeAxis->setRange(std::max(0.0, last - 600.0), std::max(60.0, last));
@@ -178,7 +204,7 @@ int BerBerWin::ExportHistory(const Dstring& path, ConditionList& list) const {
 
 void BerBerWin::HitPButReset() {
   ConditionList list;
-  if (uiapp::GetBerSvr() != nullptr && uiapp::GetBerSvr()->Reset(list) == 0) mHistory.Clear();
+  if (uiapp::GetBerSvr() != nullptr && uiapp::GetBerSvr()->Reset(list) == 0) Restart(Origin::Reset);
   ShowResults();
   BoundControl::Report(list);
 }

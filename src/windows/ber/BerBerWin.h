@@ -1,13 +1,16 @@
 #pragma once
 
 #include <QElapsedTimer>
+#include <QTime>
 #include <QWidget>
 #include <memory>
 
 #include "data/BerHistory.h"
 #include "support/ConditionList.h"
+#include "windows/LockAware.h"
 
 class QLabel;
+class QPushButton;
 class QTableWidget;
 class QChart;
 class QLogValueAxis;
@@ -17,8 +20,10 @@ class QValueAxis;
 // and ratio, a chart of each port's ratio over time on a logarithmic axis, reset of the counts
 // and CSV export of the table and of the history. It is a view of the application's BerSvr,
 // which the poll reads while the instrument runs, so the window asks the server nothing itself
-// but the reset.
-class BerBerWin : public QWidget {
+// but the reset. The counts are the instrument's, since its run started or they were reset;
+// the chart can only begin when the window saw them first, and its title says when that was
+// and why (the window opened, a run started, the counts were reset).
+class BerBerWin : public QWidget, public LockAware {
   Q_OBJECT
 
  public:
@@ -33,10 +38,17 @@ class BerBerWin : public QWidget {
   const BerHistory& History() const { return mHistory; }
   // Shows the service's counts and adds them to the history when they changed.
   void ShowResults();
+  // What starts the chart afresh.
+  enum class Origin { Opened, RunStarted, Reset };
+  Origin GetOrigin() const { return mOrigin; }
+  // Only the reset asks the instrument; the table, the chart and the exports stay.
+  void ShowLock(bool locked) override;
 
  private:
   class View;
 
+  // Starts the history afresh for `origin`.
+  void Restart(Origin origin);
   void ShowChart();
   void HitPButReset();
   void HitPButExportTable();
@@ -47,10 +59,14 @@ class BerBerWin : public QWidget {
 
   QTableWidget* mTable = nullptr;
   QLabel* mState = nullptr;
+  QPushButton* mReset = nullptr;
   QChart* mChart = nullptr;
   QValueAxis* mTimeAxis = nullptr;
   QLogValueAxis* mRatioAxis = nullptr;
   BerHistory mHistory;
+  Origin mOrigin = Origin::Opened;
+  QTime mSince;  // the wall-clock time of the history's first sample
+  bool mWasRunning = false;
   std::vector<BerSvr::PortResult> mShown;
   QElapsedTimer mClock;
   std::unique_ptr<View> mView;

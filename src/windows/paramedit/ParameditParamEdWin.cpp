@@ -7,6 +7,7 @@
 #include <QTreeWidget>
 
 #include "instrument/QenGuiInst.h"
+#include "instrument/QenStatus.h"
 #include "params/MemorySize.h"
 #include "params/ui/BoundControl.h"
 #include "sequences/CPortInfo.h"
@@ -61,6 +62,11 @@ int ParameditParamEdWin::Load(ConditionList& list) {
     return 1;
   }
   connect(mTree, &QTreeWidget::itemSelectionChanged, this, &ParameditParamEdWin::NfySelectionChanged);
+  mUnread = new QLabel(mStack);
+  mUnread->setObjectName(QStringLiteral("LabelUnread"));
+  mUnread->setAlignment(Qt::AlignCenter);
+  mUnread->setWordWrap(true);
+  mStack->addWidget(mUnread);
   if (auto* splitter = findChild<QSplitter*>(QStringLiteral("Splitter"))) {
     splitter->setStretchFactor(0, 0);
     splitter->setStretchFactor(1, 1);
@@ -111,17 +117,31 @@ bool ParameditParamEdWin::SelectPath(const Dstring& path) {
 
 QWidget* ParameditParamEdWin::CurrentPanel() const { return mBound; }
 
+QWidget* ParameditParamEdWin::ShownPage() const { return mStack->currentWidget(); }
+
+void ParameditParamEdWin::ShowLock(bool locked) {
+  mLocked = locked;
+  for (const auto& [resource, panel] : mPanels) panel->setEnabled(!locked);
+  // The item chosen meanwhile is read now.
+  if (!locked && mStack->currentWidget() == mUnread) NfySelectionChanged();
+}
+
 void ParameditParamEdWin::NfySelectionChanged() {
   const QList<QTreeWidgetItem*> selected = mTree->selectedItems();
   if (selected.isEmpty()) return;
   ConditionList list;
   {
     WaitCursor wait;
-    ShowItem(selected.first()->data(0, kPathRole).toString().toStdString(),
-             selected.first()->data(0, kPanelRole).toString().toStdString(), list);
     QStringList path;
     for (const QTreeWidgetItem* at = selected.first(); at != nullptr; at = at->parent()) path.prepend(at->text(0).simplified());
     mTitle->setText(path.join(QStringLiteral("  \u203A  ")));
+    const int status = ShowItem(selected.first()->data(0, kPathRole).toString().toStdString(),
+                                selected.first()->data(0, kPanelRole).toString().toStdString(), list);
+    if (status == QenStatus::kLocked) {
+      mUnread->setText(QStringLiteral("Another client holds the instrument: the values of %1 are read once it lets go.")
+                           .arg(path.join(QStringLiteral(" \u203A "))));
+      mStack->setCurrentWidget(mUnread);
+    }
   }
   BoundControl::Report(list);
 }
@@ -133,6 +153,7 @@ QWidget* ParameditParamEdWin::Panel(const Dstring& resource, ConditionList& list
   if (panel != nullptr) {
     // The labels of every group share one width, so that the fields line up down the panel.
     for (auto* grid : panel->findChildren<QGridLayout*>()) grid->setColumnMinimumWidth(0, 130);
+    panel->setEnabled(!mLocked);
     mStack->addWidget(panel);
     mPanels[resource] = panel;
   }
@@ -142,11 +163,13 @@ QWidget* ParameditParamEdWin::Panel(const Dstring& resource, ConditionList& list
 int ParameditParamEdWin::ShowItem(const Dstring& path, const Dstring& panelResource, ConditionList& list) {
   QWidget* panel = Panel(panelResource, list);
   if (panel == nullptr) return 1;
-  // A panel left behind lets go of its parameters, so that the poll no longer reads them.
-  if (mBound != nullptr && mBound != panel) BoundControl::SetDsBaseNameAll(mBound, "", list);
   const Dstring base = ":" + QenGuiInst::GetAppHandle() + path;
   std::set<Dstring> headers;
   int status = ReadHeaders(base, headers, list);
+  // Held by another client nothing can be read: the panel stays with the item it shows.
+  if (status == QenStatus::kLocked) return status;
+  // A panel left behind lets go of its parameters, so that the poll no longer reads them.
+  if (mBound != nullptr && mBound != panel) BoundControl::SetDsBaseNameAll(mBound, "", list);
   if (status == 0) ShowRows(panel, base, headers);
   auto exists = [&headers](const Dstring& name) { return headers.contains(name.ToUpper()); };
   if (int rc = BoundControl::SetDsBaseNameAll(panel, base, list, exists); status == 0) status = rc;

@@ -6,6 +6,7 @@
 
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
+#include "windows/LockAware.h"
 
 class QLabel;
 class QStackedWidget;
@@ -16,8 +17,10 @@ class QTreeWidgetItem;
 // modules and ports, and beside it the panel of the selected item. There is one panel per kind
 // of item, from its own resource; selecting an item moves the panel's bound controls to the
 // item's parameters (their base name), reading every value first in joined queries, and hides
-// the rows of parameters that the item does not have.
-class ParameditParamEdWin : public QWidget {
+// the rows of parameters that the item does not have. While another client holds the
+// instrument the tree still moves, but the panel is read-only, and an item whose values were
+// not read yet shows a line saying that they are read once the instrument is free.
+class ParameditParamEdWin : public QWidget, public LockAware {
   Q_OBJECT
 
  public:
@@ -31,6 +34,9 @@ class ParameditParamEdWin : public QWidget {
   bool SelectPath(const Dstring& path);
   QWidget* CurrentPanel() const;
   QTreeWidget* Tree() const { return mTree; }
+  // What the panel area shows: the bound panel, or the line of an item not read yet.
+  QWidget* ShownPage() const;
+  void ShowLock(bool locked) override;
 
   static void FormatMemory(unsigned long bits, Dstring& number, Dstring& unit);
 
@@ -45,6 +51,8 @@ class ParameditParamEdWin : public QWidget {
   QTreeWidget* mTree = nullptr;
   QStackedWidget* mStack = nullptr;
   QLabel* mTitle = nullptr;
+  QLabel* mUnread = nullptr;
+  bool mLocked = false;
   std::map<Dstring, QWidget*> mPanels;
   QWidget* mBound = nullptr;
 };

@@ -7,13 +7,34 @@
 #include <QTableWidget>
 #include <algorithm>
 
+#include "core/uiapp.h"
+#include "data/QenDsView.h"
+#include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/PlaceName.h"
 #include "windows/TaskFollower.h"
 
+// Told when the instrument starts or stops, for the start button.
+class SelftestResultWin::RunView : public QenDsView {
+ public:
+  explicit RunView(TaskFollower& follower) : mFollower(follower) {}
+  int NfyViewDataUpdated(QenDs*, ConditionList&) override {
+    mFollower.ShowCanStart();
+    return 0;
+  }
+
+ private:
+  TaskFollower& mFollower;
+};
+
 SelftestResultWin::SelftestResultWin(QWidget* parent) : QWidget(parent) {
   setObjectName(QStringLiteral("SelftestResultWin"));
+}
+
+SelftestResultWin::~SelftestResultWin() {
+  ConditionList list;
+  if (mRunView && uiapp::GetRunStopDs() != nullptr) uiapp::GetRunStopDs()->UnregisterView(mRunView.get(), list);
 }
 
 int SelftestResultWin::Load(ConditionList& list) {
@@ -36,7 +57,16 @@ int SelftestResultWin::Load(ConditionList& list) {
   };
   hooks.ended = [this](const InstrumentTask::Progress& p) { ShowResults(p); };
   hooks.say = [this](const QString& text) { mState->setText(text); };
+  hooks.unable = [] {
+    const RunStopDs* run = uiapp::GetRunStopDs();
+    return run != nullptr && run->IsRunning() ? QStringLiteral("The self test cannot start while the instrument runs.") : QString();
+  };
   mFollower = new TaskFollower(SelfTest::Task(), bar, start, cancel, hooks, this);
+  mFollower->ShowCanStart();
+  if (uiapp::GetRunStopDs() != nullptr) {
+    mRunView = std::make_unique<RunView>(*mFollower);
+    uiapp::GetRunStopDs()->RegisterView(mRunView.get(), list);
+  }
   // A test that ran before the window opened (or runs now) is shown.
   mFollower->Resume();
   return 0;
