@@ -131,7 +131,7 @@ TEST_F(MainWinSettingTest, NewThenSaveAsksForANameAndLeavesTheSettingOpenedBefor
   EXPECT_TRUE(asked) << "Save of a new setting asks for a name";
   EXPECT_EQ(Title(), "bench2 - Corvane 71300");
   EXPECT_EQ(FileText("bench1"), bench1);
-  EXPECT_NE(FileText("bench2").find(":CGR1:PER 4.0000"), std::string::npos) << FileText("bench2");
+  EXPECT_NE(FileText("bench2").find("\nvalue :CGR1:PER 4e-09\n"), std::string::npos) << FileText("bench2");
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
 }
 
