@@ -2,6 +2,7 @@
 
 #include "core/MeasconfMeasMode.h"
 #include "core/SelfTest.h"
+#include "core/ServerDeathRescue.h"
 #include "data/BerSvr.h"
 #include "data/ConnectDs.h"
 #include "data/DataPortOneLockDs.h"
@@ -106,6 +107,7 @@ int uiapp::Init(ConditionList& list) {
   QenSegmentPool::Init(mDirtyFlagDs);
   CPortInfo::GetSequence()->SetSegmentSync(&gSegmentPoolSync);
   QENSettingProfile::Init(mDirtyFlagDs);
+  ServerDeathRescue::Install();
   return 0;
 }
 
@@ -117,6 +119,7 @@ int uiapp::End(ConditionList& list) {
     mBerSvr->End();
     DestroyAppHandle(handle, list);
   }
+  ServerDeathRescue::Uninstall();
   CPortInfo::End();
   CFrontendInfo::Invalidate();
   QenSegmentPool::End();

@@ -27,9 +27,15 @@ QenGuiInst::ErrorListenerProc& ErrorListener() {
   return listener;
 }
 
+QenGuiInst::BeforeExitProc& BeforeExit() {
+  static QenGuiInst::BeforeExitProc proc;
+  return proc;
+}
+
 QenGuiInst::ServerDeathHandler& DeathHandler() {
   static QenGuiInst::ServerDeathHandler handler = [](const Dstring& message) {
     Toolkit::Get().Alert(message, ToolkitPort::Icon::Critical);
+    QenGuiInst::RunBeforeServerDeathExit();
     std::exit(0);
   };
   return handler;
@@ -256,6 +262,14 @@ int QenGuiInst::ShowErrorDlg(ConditionList& list, int) {
 }
 
 void QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) { DeathHandler() = std::move(handler); }
+
+void QenGuiInst::SetBeforeServerDeathExit(BeforeExitProc proc) {
+  BeforeExit() = std::move(proc);
+}
+
+void QenGuiInst::RunBeforeServerDeathExit() {
+  if (BeforeExit()) BeforeExit()();
+}
 
 void QenGuiInst::SetErrorListener(ErrorListenerProc listener) { ErrorListener() = std::move(listener); }
 
