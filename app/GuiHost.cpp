@@ -10,6 +10,7 @@
 #include "HostConnection.h"
 #include "HostOptions.h"
 #include "core/ErrorJournal.h"
+#include "core/ServerDeathRescue.h"
 #include "core/uiapp.h"
 #include "data/BerSvr.h"
 #include "data/DirtyFlagDs.h"
@@ -101,6 +102,10 @@ int RunSession(const HostOptions& options, bool& reconnect) {
   window->show();
   // Where most work starts; the frame is never empty on a first run.
   if (QWidget* editor = window->OpenWindow(QStringLiteral("paramedit.ParamEd"))) editor->parentWidget()->showMaximized();
+  // Work the server's death left unsaved is offered back once the window stands.
+  ConditionList rescue;
+  ServerDeathRescue::OfferPutBack(rescue);
+  QenGuiInst::ShowErrorDlg(rescue, 1);
   uiapp::MainLoop();
   uiapp::EndPolling();
   reconnect = window->EndedToReconnect();

@@ -15,6 +15,8 @@
 namespace {
 
 constexpr std::string_view kSegmentPrefix = ":EDIT:SEGM";
+// What the other handles hear when the saved segments change.
+constexpr const char* kCatalogHeader = ":EDIT:SEGM:CAT";
 constexpr const char* kExtension = ".qseg";
 constexpr std::size_t kMaxNameLength = 200;
 // Characters a segment name may not hold: it becomes a file name and travels in quotes.
@@ -228,6 +230,7 @@ int SimSegmentStore::Create(const SimCommand& cmd, SimContext& context) {
   if (int rc = segment->SetType(Dstring(items[1].GetText()).ToUpper())) return rc;
   if (!SimSegmentFile::Save(*segment, path.string())) return -200;
   context.Reply(Dstring::Format("%u", Remember(std::move(segment))));
+  context.MarkChanged(kCatalogHeader);
   return 0;
 }
 
@@ -268,14 +271,16 @@ int SimSegmentStore::Pace(const SimCommand& cmd, SimContext& context) {
   return 0;
 }
 
-int SimSegmentStore::Delete(const SimCommand& cmd, SimContext&) {
+int SimSegmentStore::Delete(const SimCommand& cmd, SimContext& context) {
   Dstring name;
   std::filesystem::path path;
   if (int rc = Name(cmd, name)) return rc;
   if (!PathOf(name, path)) return -224;
   if (NumberOf(name) != 0) return -200;
   std::error_code error;
-  return std::filesystem::remove(path, error) ? 0 : -256;
+  if (!std::filesystem::remove(path, error)) return -256;
+  context.MarkChanged(kCatalogHeader);
+  return 0;
 }
 
 // Only files of the data directory are told about: "size,"modified"".
@@ -325,14 +330,18 @@ int SimSegmentStore::Close(unsigned number, SimSegment&, const SimCommand& cmd, 
 }
 
 // "SAVE" writes the segment's own file, "SAVE "name"" a copy under another name.
-int SimSegmentStore::Save(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext&) {
+int SimSegmentStore::Save(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext& context) {
   Dstring name = segment.GetName();
   std::filesystem::path path;
   if (cmd.HasArgs()) {
     if (int rc = Name(cmd, name)) return rc;
   }
   if (!PathOf(name, path)) return mDir.empty() ? -200 : -224;
-  return SimSegmentFile::Save(segment, path.string()) ? 0 : -200;
+  std::error_code error;
+  const bool listed = std::filesystem::is_regular_file(path, error);
+  if (!SimSegmentFile::Save(segment, path.string())) return -200;
+  if (!listed) context.MarkChanged(kCatalogHeader);
+  return 0;
 }
 
 int SimSegmentStore::QueryType(unsigned, SimSegment& segment, const SimCommand&, SimContext& context) {

@@ -2,6 +2,7 @@
 
 #include "core/MeasconfMeasMode.h"
 #include "core/SelfTest.h"
+#include "core/ServerDeathRescue.h"
 #include "data/BerSvr.h"
 #include "data/ConnectDs.h"
 #include "data/DataPortOneLockDs.h"
@@ -110,6 +111,7 @@ int uiapp::Init(ConditionList& list) {
   QenSegmentPool::Init(mDirtyFlagDs);
   CPortInfo::GetSequence()->SetSegmentSync(&gSegmentPoolSync);
   QENSettingProfile::Init(mDirtyFlagDs);
+  ServerDeathRescue::Install();
   return 0;
 }
 
@@ -122,6 +124,7 @@ int uiapp::End(ConditionList& list) {
     mOpenSettingDs->EndFollow(list);
     DestroyAppHandle(handle, list);
   }
+  ServerDeathRescue::Uninstall();
   CPortInfo::End();
   CFrontendInfo::Invalidate();
   QenSegmentPool::End();

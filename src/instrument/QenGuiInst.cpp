@@ -75,9 +75,15 @@ QenGuiInst::RefusalDescriber& Describer() {
   return describer;
 }
 
+QenGuiInst::BeforeExitProc& BeforeExit() {
+  static QenGuiInst::BeforeExitProc proc;
+  return proc;
+}
+
 QenGuiInst::ServerDeathHandler& DeathHandler() {
   static QenGuiInst::ServerDeathHandler handler = [](const Dstring& message) {
     Toolkit::Get().Alert(message, ToolkitPort::Icon::Critical);
+    QenGuiInst::RunBeforeServerDeathExit();
     std::exit(0);
   };
   return handler;
@@ -333,6 +339,14 @@ int QenGuiInst::ShowErrorDlg(ConditionList& list, int) {
 
 QenGuiInst::ServerDeathHandler QenGuiInst::SetServerDeathHandler(ServerDeathHandler handler) {
   return std::exchange(DeathHandler(), std::move(handler));
+}
+
+void QenGuiInst::SetBeforeServerDeathExit(BeforeExitProc proc) {
+  BeforeExit() = std::move(proc);
+}
+
+void QenGuiInst::RunBeforeServerDeathExit() {
+  if (BeforeExit()) BeforeExit()();
 }
 
 void QenGuiInst::SetErrorListener(ErrorListenerProc listener) { ErrorListener() = std::move(listener); }

@@ -53,6 +53,11 @@ class QenGuiInst {
   using ServerDeathHandler = std::function<void(const Dstring& message)>;
   // Returns the handler it replaces.
   static ServerDeathHandler SetServerDeathHandler(ServerDeathHandler handler);
+  // What the default handler runs between its message and the exit: the core writes the
+  // user's unsaved work out here. Null removes it. A handler of its own may run it too.
+  using BeforeExitProc = std::function<void()>;
+  static void SetBeforeServerDeathExit(BeforeExitProc proc);
+  static void RunBeforeServerDeathExit();
   // Told of every condition that a failed command brought, with the command: the session's
   // error list. Null removes it.
   using ErrorListenerProc = std::function<void(const Dstring& cmd, const Condition& condition)>;
@@ -82,9 +87,10 @@ class QenGuiInst {
   static constexpr const char* kServerDeathMessage =
       "The user interface will be terminated\nbecause the firmware server has died.";
 
- private:
+  // Appends to the log file and flushes; nothing while there is no log.
   static void Log(const Dstring& text);
 
+ private:
   static std::unique_ptr<QenInstrument> mInstrument;
   static Dstring mAppHandle;
   static std::FILE* errorlog;

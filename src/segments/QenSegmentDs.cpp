@@ -1,14 +1,17 @@
 #include "segments/QenSegmentDs.h"
 
 #include <algorithm>
+#include <array>
 #include <climits>
 
 #include "instrument/CommandText.h"
 #include "instrument/QenGuiInst.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/SegmentBuffer.h"
+#include "segments/SegmentCopy.h"
 #include "segments/SegmentReply.h"
 #include "segments/SegmentStatus.h"
+#include "segments/SegmentTextFile.h"
 #include "support/FWBlocker.h"
 #include "support/LgsDebug.h"
 
@@ -31,6 +34,18 @@ int QenSegmentDs::BitOf(char state) {
 }
 
 bool QenSegmentDs::IsErrored(char state) { return kErroredStates.find(state) != std::string_view::npos; }
+
+char QenSegmentDs::DigitOfStates(const char* states, long count, DataFormat format) {
+  unsigned value = 0;
+  bool unknown = false, errored = false;
+  for (long i = count - 1; i >= 0; --i) {
+    const int bit = BitOf(states[i]);
+    unknown = unknown || bit < 0;
+    errored = errored || IsErrored(states[i]);
+    value = (value << 1) | (bit > 0 ? 1u : 0u);
+  }
+  return !unknown ? InfoOf(format).digits[value] : (errored ? '!' : '?');
+}
 
 QenSegmentDs::QenSegmentDs(const Dstring& name) : mName(name) {
   mBuffers.reserve(64);
@@ -95,6 +110,7 @@ int QenSegmentDs::Open(ConditionList& list) {
     mModified =
         Query(Dstring::Format("%s:MMEM:INF? \"%s\"", handle.c_str(), path.c_str()), reply, ignored) != 0;
     trace.Printf("%s is segment %u%s\n", mName.c_str(), mNumber, mModified ? ", not saved" : "");
+    KeepCopy();
   }
   if (mNumber != 0) ++mOpenCount;
   return SegmentStatus::kOk;
@@ -111,6 +127,8 @@ int QenSegmentDs::Close(ConditionList& list) {
     return status;
   }
   mNumber = 0;
+  mChangedElsewhere = false;
+  mCopy.reset();
   return SegmentStatus::kOk;
 }
 
@@ -121,6 +139,8 @@ int QenSegmentDs::Save(ConditionList& list) {
   if (int status = Write(list)) return status;
   if (int status = Send(Cmd(":SAVE"), list)) return status;
   mModified = false;
+  mCopy.reset();
+  QenSegmentPool::NfyCatalogChanged();
   return SegmentStatus::kOk;
 }
 
@@ -130,7 +150,9 @@ int QenSegmentDs::SaveAs(const Dstring& name, ConditionList& list) {
   if (int status = CheckOpen(list)) return status;
   if (int status = CommandText::CheckArgument(name, list)) return status;
   if (int status = Write(list)) return status;
-  return Send(Cmd(Dstring::Format(":SAVE \"%s\"", name.c_str()).c_str()), list);
+  if (int status = Send(Cmd(Dstring::Format(":SAVE \"%s\"", name.c_str()).c_str()), list)) return status;
+  QenSegmentPool::NfyCatalogChanged();
+  return SegmentStatus::kOk;
 }
 
 int QenSegmentDs::GetLength(long& length, ConditionList& list, bool force) {
@@ -210,6 +232,7 @@ int QenSegmentDs::ResetDimension(const char* what, long count, ChangeKind kind, 
   int status = Send(Cmd(Dstring::Format(":PATT:MOD:INS 0,%s,BEF,%ld", what, count).c_str()), list);
   int reread = Reread(true, list);
   if (status == 0) status = reread;
+  KeepCopy();
   int told = Notify(kind, list);
   return status != 0 ? status : told;
 }
@@ -254,19 +277,30 @@ int QenSegmentDs::Init(SegmentBuffer* buffer, ConditionList& list) {
 }
 
 int QenSegmentDs::SetBufferLength(SegmentBuffer* buffer, long length, ConditionList& list) {
-  if (int status = FindBuffer(buffer, list)) return status;
-  return buffer->SetBufferLength(length, list);
+  return MoveBuffer(
+      buffer, [&] { return buffer->SetBufferLength(length, list); }, list);
 }
 
 int QenSegmentDs::SetBufferStart(SegmentBuffer* buffer, long start, ConditionList& list) {
-  if (int status = FindBuffer(buffer, list)) return status;
-  return buffer->SetBufferStart(start, list);
+  return MoveBuffer(
+      buffer, [&] { return buffer->SetBufferStart(start, list); }, list);
 }
 
 int QenSegmentDs::SetBufferStartAndLength(SegmentBuffer* buffer, long start, long length,
                                           ConditionList& list) {
+  return MoveBuffer(
+      buffer, [&] { return buffer->SetBufferStartAndLength(start, length, list); }, list);
+}
+
+// A move writes a dirty buffer back first: its vectors go into the copy before they leave.
+int QenSegmentDs::MoveBuffer(SegmentBuffer* buffer, const std::function<int()>& move, ConditionList& list) {
   if (int status = FindBuffer(buffer, list)) return status;
-  return buffer->SetBufferStartAndLength(start, length, list);
+  if (int status = CheckWrite(buffer, list)) return status;
+  const bool wasDirty = buffer->mDirty && mNumber != 0;
+  if (wasDirty && mCopy) AfterWrite(buffer, true);
+  if (int status = move()) return status;
+  if (wasDirty && !mCopy) KeepCopy();
+  return SegmentStatus::kOk;
 }
 
 long QenSegmentDs::GetBufferLength(const SegmentBuffer* buffer) const {
@@ -291,7 +325,11 @@ int QenSegmentDs::Read(SegmentBuffer* buffer, ConditionList& list) {
 
 int QenSegmentDs::Write(SegmentBuffer* buffer, ConditionList& list) {
   if (int status = FindBuffer(buffer, list)) return status;
-  return buffer->Write(list);
+  if (int status = CheckWrite(buffer, list)) return status;
+  const bool wasDirty = buffer->mDirty;
+  if (int status = buffer->Write(list)) return status;
+  AfterWrite(buffer, wasDirty);
+  return SegmentStatus::kOk;
 }
 
 int QenSegmentDs::Read(ConditionList& list) {
@@ -309,7 +347,10 @@ int QenSegmentDs::Write(ConditionList& list) {
   if (mBuffers.empty()) return SegmentStatus::kOk;
   if (int status = guard.Block()) return status;
   for (const auto& buffer : mBuffers) {
+    if (int status = CheckWrite(buffer.get(), list)) return status;
+    const bool wasDirty = buffer->mDirty;
     if (int status = buffer->Write(list)) return status;
+    AfterWrite(buffer.get(), wasDirty);
   }
   return SegmentStatus::kOk;
 }
@@ -385,17 +426,11 @@ int QenSegmentDs::DigitOf(const SegmentBuffer* buffer, long vector, long trace, 
   const DataFormatInfo& info = InfoOf(format);
   const long low = d * info.tracesPerDigit;
   const long high = std::min(low + info.tracesPerDigit, buffer->mWidth) - 1;
-  unsigned value = 0;
-  bool unknown = false, errored = false;
-  for (long t = high; t >= low; --t) {
-    char state = 0;
-    if (int status = buffer->GetState(vector, t, state, list)) return status;
-    const int bit = BitOf(state);
-    unknown = unknown || bit < 0;
-    errored = errored || IsErrored(state);
-    value = (value << 1) | (bit > 0 ? 1u : 0u);
+  char states[4];
+  for (long t = low; t <= high; ++t) {
+    if (int status = buffer->GetState(vector, t, states[t - low], list)) return status;
   }
-  digit = !unknown ? info.digits[value] : (errored ? '!' : '?');
+  digit = DigitOfStates(states, high - low + 1, format);
   return SegmentStatus::kOk;
 }
 
@@ -444,6 +479,7 @@ int QenSegmentDs::Modify(const DstringList& cmds, ChangeKind kind, bool dimensio
   if (range == nullptr && First() != nullptr) {
     mLastModifiedRange = StateRange(0, 0, First()->mWidth - 1, First()->mSegmentLength - 1);
   }
+  KeepCopy();
   return Notify(kind, list);
 }
 
@@ -464,5 +500,200 @@ int QenSegmentDs::UpdateAll(ConditionList& list) {
   if (int status = guard.Block()) return status;
   if (int status = Write(list)) return status;
   if (int status = Reread(true, list)) return status;
+  KeepCopy();
   return Notify(kUpdatedAll, list);
+}
+
+// --- Another client's change -------------------------------------------------------------------
+
+bool QenSegmentDs::HasUnwrittenStates() const {
+  return std::any_of(mBuffers.begin(), mBuffers.end(), [](const auto& b) { return b->mDirty; });
+}
+
+int QenSegmentDs::CheckWrite(const SegmentBuffer* buffer, ConditionList& list) const {
+  if (!mChangedElsewhere || !buffer->mDirty) return SegmentStatus::kOk;
+  return SegmentReply::Refuse(list, "GUI_SEGMENTDS_CHANGED_ELSEWHERE", {mName},
+                              SegmentStatus::kChangedElsewhere);
+}
+
+int QenSegmentDs::IsShapeUnchanged(bool& unchanged, ConditionList& list) {
+  unchanged = false;
+  const SegmentBuffer* first = First();
+  Dstring coding;
+  long length = 0, width = 0;
+  if (int status = GetCoding(coding, list, true)) return status;
+  if (int status = GetLength(length, list, true)) return status;
+  if (int status = GetWidth(width, list, true)) return status;
+  unchanged = first != nullptr && coding == first->mAlphabet && length == first->mSegmentLength &&
+              width == first->mWidth;
+  return SegmentStatus::kOk;
+}
+
+int QenSegmentDs::IsHeldUnchanged(bool& unchanged, ConditionList& list) {
+  if (int status = IsShapeUnchanged(unchanged, list)) return status;
+  if (!unchanged) return SegmentStatus::kOk;
+  unchanged = false;
+  std::vector<std::uint8_t> theirs;
+  for (const auto& buffer : mBuffers) {
+    if (!buffer->mDirty) continue;
+    if (int status = buffer->ReadRows(theirs, list)) return status;
+    if (theirs != buffer->mBase) return SegmentStatus::kOk;
+  }
+  unchanged = true;
+  return SegmentStatus::kOk;
+}
+
+int QenSegmentDs::NfyChangedElsewhere(ConditionList& list) {
+  FWBlocker guard("QenSegmentDs::NfyChangedElsewhere", list);
+  if (int status = guard.Block()) return status;
+  // Already waiting for the user, who is shown the server's vectors as they are then.
+  if (mChangedElsewhere) return SegmentStatus::kOk;
+  if (!HasUnwrittenStates()) return UpdateAll(list);
+  bool unchanged = false;
+  if (int status = IsHeldUnchanged(unchanged, list)) return status;
+  if (unchanged) return UpdateAll(list);
+  mChangedElsewhere = true;
+  return Notify(kChangedElsewhere, list);
+}
+
+int QenSegmentDs::KeepMine(ConditionList& list) {
+  FWBlocker guard("QenSegmentDs::KeepMine", list);
+  if (int status = guard.Block()) return status;
+  if (!mChangedElsewhere) return SegmentStatus::kOk;
+  bool unchanged = false;
+  if (int status = IsShapeUnchanged(unchanged, list)) return status;
+  if (!unchanged) {
+    return SegmentReply::Refuse(list, "GUI_SEGMENTDS_RESHAPED_ELSEWHERE", {mName},
+                                SegmentStatus::kChangedElsewhere);
+  }
+  std::vector<std::uint8_t> theirs;
+  for (const auto& buffer : mBuffers) {
+    if (!buffer->mDirty) continue;
+    if (int status = buffer->ReadRows(theirs, list)) return status;
+    buffer->MergeOnto(theirs);
+  }
+  mChangedElsewhere = false;
+  mModified = true;
+  return UpdateAll(list);
+}
+
+int QenSegmentDs::TakeTheirs(ConditionList& list) {
+  FWBlocker guard("QenSegmentDs::TakeTheirs", list);
+  if (int status = guard.Block()) return status;
+  for (const auto& buffer : mBuffers) buffer->mDirty = false;
+  mChangedElsewhere = false;
+  if (int status = Reread(true, list)) return status;
+  KeepCopy();
+  return Notify(kUpdatedAll, list);
+}
+
+int QenSegmentDs::GetDifferences(DataFormat format, std::vector<Difference>& differences,
+                                 ConditionList& list) {
+  FWBlocker guard("QenSegmentDs::GetDifferences", list);
+  if (int status = guard.Block()) return status;
+  differences.clear();
+  std::vector<std::uint8_t> theirs;
+  for (const auto& buffer : mBuffers) {
+    if (!buffer->mDirty) continue;
+    if (int status = buffer->ReadRows(theirs, list)) return status;
+    const SegmentBuffer& b = *buffer;
+    const auto line = [&](const std::vector<std::uint8_t>& rows, long v) {
+      return SegmentTextFile::Line([&](long t) { return b.StateIn(rows, v, t); }, b.mWidth, b.mAlphabet,
+                                   format);
+    };
+    for (long v = b.mBufferStart; v < b.mBufferStart + b.mBufferLength; ++v) {
+      Difference d{v, line(b.mBase, v), line(b.mRows, v), line(theirs, v)};
+      if (d.before != d.mine || d.before != d.theirs) differences.push_back(std::move(d));
+    }
+  }
+  return SegmentStatus::kOk;
+}
+
+// --- Unsaved work when the server is gone ---------------------------------------------------------
+
+Dstring QenSegmentDs::LineOf(const SegmentBuffer* buffer, long vector) const {
+  return SegmentTextFile::Line([&](long t) { return buffer->StateIn(buffer->mRows, vector, t); },
+                               buffer->mWidth, buffer->mAlphabet, DataFormat::kHex);
+}
+
+void QenSegmentDs::KeepCopy() {
+  if (!QenSegmentPool::mKeepCopies || !mModified || mNumber == 0) {
+    mCopy.reset();
+    return;
+  }
+  SegmentBuffer scratch(this);
+  ConditionList ignored;
+  if (scratch.ReadDimension(ignored) != 0) {
+    mCopy.reset();
+    return;
+  }
+  const long width = scratch.mWidth, length = scratch.mSegmentLength;
+  const long columns = width == 0                  ? 0
+                       : scratch.mAlphabet == "01" ? MaxDigitOf(DataFormat::kHex, width) + 1
+                                                   : width;
+  if (static_cast<std::size_t>(columns + 1) * static_cast<std::size_t>(length) > kMaxCopyChars) {
+    mCopy.reset();
+    return;
+  }
+  auto copy = std::make_unique<SegmentCopy>(scratch.mAlphabet, width, length, columns);
+  const long step = std::max(1L, SegmentBuffer::VectorsPerBlock(width, scratch.mStateWidth));
+  for (long from = 0; from < length && width > 0; from += step) {
+    if (scratch.Move(from, std::min(step, length - from), ignored) != 0) {
+      mCopy.reset();
+      return;
+    }
+    for (long v = from; v < from + scratch.mBufferLength; ++v) copy->SetLine(v, LineOf(&scratch, v));
+  }
+  mCopy = std::move(copy);
+}
+
+void QenSegmentDs::AfterWrite(const SegmentBuffer* buffer, bool wasDirty) {
+  if (!wasDirty || !QenSegmentPool::mKeepCopies) return;
+  if (!mCopy || mCopy->GetWidth() != buffer->mWidth || mCopy->GetLength() != buffer->mSegmentLength ||
+      mCopy->GetCoding() != buffer->mAlphabet) {
+    return KeepCopy();
+  }
+  for (long v = buffer->mBufferStart; v < buffer->mBufferStart + buffer->mBufferLength; ++v) {
+    mCopy->SetLine(v, LineOf(buffer, v));
+  }
+}
+
+void QenSegmentDs::GetHeldTexts(std::vector<HeldText>& texts) const {
+  if (!HasUnsavedWork()) return;
+  const SegmentBuffer* first = First();
+  const bool whole = mCopy && (first == nullptr || (first->mWidth == mCopy->GetWidth() &&
+                                                    first->mSegmentLength == mCopy->GetLength() &&
+                                                    first->mAlphabet == mCopy->GetCoding()));
+  // What was typed goes last, over what the other buffers hold of the same vectors.
+  const std::array<bool, 2> order = {false, true};
+  if (whole) {
+    SegmentCopy copy = *mCopy;
+    for (const bool dirty : order) {
+      for (const auto& buffer : mBuffers) {
+        if (buffer->mDirty != dirty) continue;
+        for (long v = buffer->mBufferStart; v < buffer->mBufferStart + buffer->mBufferLength; ++v) {
+          copy.SetLine(v, LineOf(buffer.get(), v));
+        }
+      }
+    }
+    const long length = copy.GetLength();
+    texts.push_back(
+        {copy.GetCoding(), copy.GetWidth(), length, 0, length, true,
+         SegmentTextFile::Header(mName, length, copy.GetWidth(), copy.GetCoding(), DataFormat::kHex) + "\n" +
+             copy.GetBody()});
+    return;
+  }
+  // Without a copy only the held vectors are known.
+  for (const bool dirty : order) {
+    for (const auto& buffer : mBuffers) {
+      const SegmentBuffer& b = *buffer;
+      if (b.mDirty != dirty || !b.mHasDimension || b.mBufferLength == 0 || b.mWidth == 0) continue;
+      Dstring text = SegmentTextFile::PartHeader(mName, b.mBufferStart, b.mBufferStart + b.mBufferLength - 1,
+                                                 b.mSegmentLength, b.mWidth, b.mAlphabet, DataFormat::kHex) +
+                     "\n";
+      for (long v = b.mBufferStart; v < b.mBufferStart + b.mBufferLength; ++v) text += LineOf(&b, v) + "\n";
+      texts.push_back(
+          {b.mAlphabet, b.mWidth, b.mSegmentLength, b.mBufferStart, b.mBufferLength, false, std::move(text)});
+    }
+  }
 }

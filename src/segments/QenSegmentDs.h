@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -13,6 +14,7 @@
 #include "support/DstringList.h"
 
 class SegmentBuffer;
+class SegmentCopy;
 
 // One open segment, shared by every editor that shows it: the server's handle of the open
 // segment, the buffers (slices) the editors hold, and the commands on the segment. Created and
@@ -34,6 +36,30 @@ class QenSegmentDs : public QenDs {
     kTypeChanged = 5,
     kSerialized = 6,
     kUpdatedAll = 7,
+    // Another client changed the segment under states typed here and not yet written: nothing
+    // was written or read; the user chooses (KeepMine, TakeTheirs).
+    kChangedElsewhere = 8,
+  };
+
+  // A held vector whose states differ between the last read, this side and the server now,
+  // each as a line of the text form.
+  struct Difference {
+    long vector = 0;
+    Dstring before;
+    Dstring mine;
+    Dstring theirs;
+  };
+
+  // What this side holds of a segment with unsaved work, as the text form (hexadecimal for the
+  // coding "01"): the whole segment, or only the vectors first .. first + count - 1.
+  struct HeldText {
+    Dstring coding;
+    long width = 0;
+    long length = 0;
+    long first = 0;
+    long count = 0;
+    bool whole = false;
+    Dstring text;
   };
 
   explicit QenSegmentDs(const Dstring& name);
@@ -107,6 +133,9 @@ class QenSegmentDs : public QenDs {
   int MaxDigit(DataFormat format, long& max, ConditionList& list);
   // A state as one bit of a digit: 0, 1, or -1 when it is neither.
   static int BitOf(char state);
+  // The digit character of `count` states of one digit, `states[0]` the lowest trace's; '?'
+  // and '!' as GetDigit says.
+  static char DigitOfStates(const char* states, long count, DataFormat format);
   // A compare state that counts as an error ('k', 'r', either case).
   static bool IsErrored(char state);
   // The last digit index of `format` over `width` traces.
@@ -165,6 +194,33 @@ class QenSegmentDs : public QenDs {
   // the views (change kind kUpdatedAll).
   int UpdateAll(ConditionList& list);
 
+  // --- Another client's change ---------------------------------------------------------------
+  // Whether a buffer holds states not yet written.
+  bool HasUnwrittenStates() const;
+  // The poll's report that another client changed the segment. Without unwritten states, or
+  // when the other client left the held vectors and the dimensions as they were, this is
+  // UpdateAll. Otherwise nothing is written or read: the source is changed elsewhere until the
+  // user chooses, every write of a dirty buffer is refused ("GUI_SEGMENTDS_CHANGED_ELSEWHERE")
+  // and the views are told (kChangedElsewhere).
+  int NfyChangedElsewhere(ConditionList& list);
+  bool IsChangedElsewhere() const { return mChangedElsewhere; }
+  // The states typed here put over the server's vectors as they are now, then written; refused
+  // while the other client's width or coding differs from this side's, or the held vectors no
+  // longer lie inside the segment.
+  int KeepMine(ConditionList& list);
+  // The states typed here dropped; everything read again.
+  int TakeTheirs(ConditionList& list);
+  int GetDifferences(DataFormat format, std::vector<Difference>& differences, ConditionList& list);
+
+  // --- Unsaved work when the server is gone ---------------------------------------------------
+  // Whether the server holds changes it has not saved, or a buffer holds states not yet written.
+  bool HasUnsavedWork() const { return mModified || HasUnwrittenStates(); }
+  // The unsaved work as text from what this side holds, asking the server nothing: the whole
+  // segment when a copy is kept (every buffer put over it), else each buffer's vectors.
+  void GetHeldTexts(std::vector<HeldText>& texts) const;
+  // The most text a kept copy may take; a longer segment is held as its buffers only.
+  static constexpr std::size_t kMaxCopyChars = 16u << 20;
+
  private:
   Dstring Cmd(const char* tail) const;
   int Send(const Dstring& cmd, ConditionList& list);
@@ -187,6 +243,19 @@ class QenSegmentDs : public QenDs {
   int PositionQuery(const Dstring& cmd, long& vector, long& trace, ConditionList& list);
   int SetGeneratorProperties(const SegmentProperties& properties, ConditionList& list);
   int GetGeneratorProperties(SegmentProperties& properties, ConditionList& list);
+  int MoveBuffer(SegmentBuffer* buffer, const std::function<int()>& move, ConditionList& list);
+  // Refuses the write of a dirty buffer while the segment is changed elsewhere.
+  int CheckWrite(const SegmentBuffer* buffer, ConditionList& list) const;
+  // Whether the server's dimensions and coding are those the buffers last read.
+  int IsShapeUnchanged(bool& unchanged, ConditionList& list);
+  // Whether the server still has the held vectors and the dimensions the buffers last read.
+  int IsHeldUnchanged(bool& unchanged, ConditionList& list);
+  // While copies are kept and the segment is modified and open: the whole segment read into
+  // the copy (after a change the server made), or the vectors a buffer just wrote put into it.
+  // A copy that cannot be read, or would be too long, is dropped.
+  void KeepCopy();
+  void AfterWrite(const SegmentBuffer* buffer, bool wasDirty);
+  Dstring LineOf(const SegmentBuffer* buffer, long vector) const;
 
   Dstring mName;
   unsigned mNumber = 0;
@@ -196,4 +265,6 @@ class QenSegmentDs : public QenDs {
   bool mModified = false;
   int mOpenCount = 0;
   long mViewWords[2] = {0, 0};
+  bool mChangedElsewhere = false;
+  std::unique_ptr<SegmentCopy> mCopy;
 };

@@ -9,6 +9,7 @@
 #include "instrument/CommandText.h"
 #include "instrument/QenGuiInst.h"
 #include "segments/QenSegmentDs.h"
+#include "segments/SegmentCatalogDs.h"
 #include "segments/SegmentKeywords.h"
 #include "segments/SegmentReply.h"
 #include "segments/SegmentStatus.h"
@@ -19,11 +20,14 @@
 
 std::vector<QenSegmentDs*> QenSegmentPool::mPool;
 DirtyFlagDs* QenSegmentPool::mDirtyFlag = nullptr;
+SegmentCatalogDs* QenSegmentPool::mCatalog = nullptr;
+bool QenSegmentPool::mKeepCopies = false;
 
 namespace {
 
 constexpr std::string_view kUnshared = "Analyzer";
 constexpr std::string_view kSegmentHeader = ":EDIT:SEGM";
+constexpr std::string_view kCatalogHeader = ":EDIT:SEGM:CAT";
 
 Dstring Handle() {
   return QenGuiInst::GetAppHandle();
@@ -41,12 +45,16 @@ void QenSegmentPool::Init(DirtyFlagDs* dirtyFlag) {
   mPool.reserve(64);
   mDirtyFlag = dirtyFlag;
   if (mDirtyFlag) mDirtyFlag->RegisterProc(&NfyViewDataUpdatedDirtyFlag, &NfyMatchDirtyFlag, nullptr);
+  if (mCatalog == nullptr) mCatalog = new SegmentCatalogDs;
 }
 
 void QenSegmentPool::End() {
   if (mDirtyFlag) mDirtyFlag->UnregisterProc(&NfyViewDataUpdatedDirtyFlag, &NfyMatchDirtyFlag, nullptr);
   mDirtyFlag = nullptr;
   mPool.clear();
+  if (mCatalog != nullptr) mCatalog->Release();
+  mCatalog = nullptr;
+  mKeepCopies = false;
 }
 
 void QenSegmentPool::Enter(QenSegmentDs* ds) {
@@ -123,22 +131,14 @@ int QenSegmentPool::Sync(QenSegmentDs* ds, ConditionList& list) {
   return ds->Write(list);
 }
 
+// Every open source reads again and tells its views.
 int QenSegmentPool::UpdateAll(ConditionList& list) {
   FWBlocker guard("QenSegmentPool::UpdateAll", list);
   if (int status = guard.Block()) return status;
-  return UpdateWhere(true, list);
-}
-
-// Every open source (all, or those the dirty-flag pass names) reads again and tells its views.
-int QenSegmentPool::UpdateWhere(bool all, ConditionList& list) {
-  std::set<unsigned> changed;
-  if (!all && mDirtyFlag) {
-    for (const Dstring& name : mDirtyFlag->GetChangedNames()) changed.insert(NumberOf(name));
-  }
   PinnedSources<QenSegmentDs> held(mPool);
   int first = SegmentStatus::kOk;
   for (QenSegmentDs* ds : held.Get()) {
-    if (ds->GetNumber() == 0 || (!all && !changed.contains(ds->GetNumber()))) continue;
+    if (ds->GetNumber() == 0) continue;
     const int status = ds->UpdateAll(list);
     if (first == 0) first = status;
   }
@@ -157,16 +157,50 @@ unsigned QenSegmentPool::NumberOf(const Dstring& name) {
   return ended && number <= UINT_MAX ? static_cast<unsigned>(number) : 0;
 }
 
+bool QenSegmentPool::IsCatalogName(const Dstring& name) {
+  return std::string_view(name).ends_with(kCatalogHeader);
+}
+
+void QenSegmentPool::NfyCatalogChanged() {
+  ConditionList ignored;
+  if (mCatalog != nullptr && mCatalog->NumViews() > 0) mCatalog->Read(ignored);
+}
+
 int QenSegmentPool::NfyMatchDirtyFlag(QenDs*, void*, const Dstring& name) {
+  if (IsCatalogName(name)) return 1;
   const unsigned number = NumberOf(name);
   if (number == 0) return 0;
   return std::any_of(mPool.begin(), mPool.end(),
                      [&](const QenSegmentDs* ds) { return ds->GetNumber() == number; });
 }
 
+// Another client changed segments (or everything): each open one that it may concern is told,
+// and the catalogue is read again for the lists that follow it.
 int QenSegmentPool::NfyViewDataUpdatedDirtyFlag(QenDs*, void*, ConditionList& list) {
   LgsDebug trace("QenSegmentPool::NfyViewDataUpdatedDirtyFlag ", "segments");
-  return UpdateWhere(mDirtyFlag == nullptr || mDirtyFlag->IsAllChanged(), list);
+  const bool all = mDirtyFlag == nullptr || mDirtyFlag->IsAllChanged();
+  std::set<unsigned> changed;
+  bool catalog = all;
+  if (!all) {
+    for (const Dstring& name : mDirtyFlag->GetChangedNames()) {
+      changed.insert(NumberOf(name));
+      catalog = catalog || IsCatalogName(name);
+    }
+  }
+  int first = SegmentStatus::kOk;
+  {
+    PinnedSources<QenSegmentDs> held(mPool);
+    for (QenSegmentDs* ds : held.Get()) {
+      if (ds->GetNumber() == 0 || (!all && !changed.contains(ds->GetNumber()))) continue;
+      const int status = ds->NfyChangedElsewhere(list);
+      if (first == 0) first = status;
+    }
+  }
+  if (catalog && mCatalog != nullptr && mCatalog->NumViews() > 0) {
+    const int status = mCatalog->Read(list);
+    if (first == 0) first = status;
+  }
+  return first;
 }
 
 int QenSegmentPool::Create(const SegmentProperties& properties, unsigned& created, ConditionList& list) {
@@ -206,6 +240,7 @@ int QenSegmentPool::Create(const SegmentProperties& properties, unsigned& create
   const int closed = Close(created, list);
   if (status == 0) status = closed;
   if (status != 0 && Exists(properties.name, exists, list) == 0 && exists) Delete(properties.name, list);
+  NfyCatalogChanged();
   return status;
 }
 
@@ -229,7 +264,10 @@ int QenSegmentPool::Open(const Dstring& name, SegmentProperties& properties, Qen
 
 int QenSegmentPool::Delete(const Dstring& name, ConditionList& list) {
   if (int status = CommandText::CheckArgument(name, list)) return status;
-  return Call(Dstring::Format("%s:EDIT:SEGM:DEL \"%s\"", Handle().c_str(), name.c_str()), list);
+  if (int status = Call(Dstring::Format("%s:EDIT:SEGM:DEL \"%s\"", Handle().c_str(), name.c_str()), list))
+    return status;
+  NfyCatalogChanged();
+  return SegmentStatus::kOk;
 }
 
 int QenSegmentPool::Exists(const Dstring& name, bool& exists, ConditionList& list) {
@@ -240,6 +278,16 @@ int QenSegmentPool::Exists(const Dstring& name, bool& exists, ConditionList& lis
   if (SegmentReply::Truth(reply, exists)) return SegmentStatus::kOk;
   return SegmentReply::Refuse(list, "GUI_SEGMENTDS_BAD_REPLY", {cmd, SegmentReply::Shown(reply)},
                               SegmentStatus::kBadReply);
+}
+
+bool QenSegmentPool::IsOpenHere(const Dstring& name) {
+  const QenSegmentDs* open = GetSegmentDsByName(name);
+  return open != nullptr && open->GetNumber() != 0;
+}
+
+int QenSegmentPool::IsAvailable(const Dstring& name, bool& available, ConditionList& list) {
+  available = IsOpenHere(name);
+  return available ? SegmentStatus::kOk : Exists(name, available, list);
 }
 
 int QenSegmentPool::Catalog(std::vector<Dstring>& names, ConditionList& list) {

@@ -13,6 +13,7 @@ class DirtyFlagDs;
 class QenDs;
 class QenDsView;
 class QenSegmentDs;
+class SegmentCatalogDs;
 
 // The registry of the segment data sources, one per segment name, and the home of the
 // operations that address a segment by name or by server number only. Static: lives from
@@ -38,6 +39,18 @@ class QenSegmentPool {
   static int RegisterView(const Dstring& name, QenDsView* view, ConditionList& list);
   static int UnregisterView(QenSegmentDs* ds, QenDsView* view, ConditionList& list);
   static std::size_t NumSources() { return mPool.size(); }
+  // Every source, in the order they were made.
+  static const std::vector<QenSegmentDs*>& GetSources() { return mPool; }
+
+  // The catalogue every list of segments follows; lives from Init to End.
+  static SegmentCatalogDs* GetCatalogDs() { return mCatalog; }
+  // After this side saved, made or deleted a segment: the catalogue is read again when a list
+  // follows it (its conditions are dropped: the operation itself went through).
+  static void NfyCatalogChanged();
+
+  // Whether the modified segments keep a copy of their whole text form, so that unsaved work
+  // can be written out when the server is gone (QenSegmentDs::GetHeldTexts). Off by default.
+  static void SetKeepCopies(bool keep) { mKeepCopies = keep; }
 
   // Writes the dirty buffers back to the server: of every source, of the name's, of one.
   static int Sync(ConditionList& list);
@@ -56,6 +69,10 @@ class QenSegmentPool {
                   ConditionList& list);
   static int Delete(const Dstring& name, ConditionList& list);
   static int Exists(const Dstring& name, bool& exists, ConditionList& list);
+  // Whether the segment is open here: made or changed and perhaps not saved, but the server has it.
+  static bool IsOpenHere(const Dstring& name);
+  // Whether the instrument has the segment: saved (Exists), or open here.
+  static int IsAvailable(const Dstring& name, bool& available, ConditionList& list);
   // The names of the saved segments, as the server sorts them.
   static int Catalog(std::vector<Dstring>& names, ConditionList& list);
   static int Save(unsigned number, ConditionList& list);
@@ -64,7 +81,9 @@ class QenSegmentPool {
   static int GetType(const Dstring& name, SegmentType& type, ConditionList& list);
 
   // The dirty-flag registration: a changed name ":<handle>:EDIT:SEGM<n>..." matches when
-  // segment n is open here.
+  // segment n is open here, and ":<handle>:EDIT:SEGM:CAT" (the catalogue) always. A changed
+  // segment is told with QenSegmentDs::NfyChangedElsewhere, so digits typed here are not written
+  // over another client's change without a word.
   static int NfyMatchDirtyFlag(QenDs* source, void* client, const Dstring& name);
   static int NfyViewDataUpdatedDirtyFlag(QenDs* source, void* client, ConditionList& list);
 
@@ -75,8 +94,10 @@ class QenSegmentPool {
   static void Forget(QenSegmentDs* ds);
   // The segment number a changed name is about; 0 when it is about none.
   static unsigned NumberOf(const Dstring& name);
-  static int UpdateWhere(bool all, ConditionList& list);
+  static bool IsCatalogName(const Dstring& name);
 
   static std::vector<QenSegmentDs*> mPool;
   static DirtyFlagDs* mDirtyFlag;
+  static SegmentCatalogDs* mCatalog;
+  static bool mKeepCopies;
 };

@@ -69,13 +69,14 @@ int SegmentBuffer::ReadDimension(ConditionList& list) {
   mBufferLength = std::min({mBufferLength, length, fitting});
   mBufferStart = std::clamp(mBufferStart, 0L, length - mBufferLength);
   mRows.assign(static_cast<std::size_t>(BlockBytes()), 0);
+  mBase = mRows;
   mDirty = false;
   mHasDimension = true;
   return SegmentStatus::kOk;
 }
 
-Dstring SegmentBuffer::RangeArgs() const {
-  return Dstring::Format("%ld,%ld,%ld,%ld", 0L, mBufferStart, mWidth - 1, mBufferStart + mBufferLength - 1);
+Dstring SegmentBuffer::RangeArgs(long start, long length) const {
+  return Dstring::Format("%ld,%ld,%ld,%ld", 0L, start, mWidth - 1, start + length - 1);
 }
 
 int SegmentBuffer::CheckOpen(ConditionList& list) const {
@@ -83,10 +84,10 @@ int SegmentBuffer::CheckOpen(ConditionList& list) const {
   return SegmentReply::Refuse(list, "GUI_SEGMENTDS_NOT_OPEN", {mSegment->GetName()}, SegmentStatus::kNotOpen);
 }
 
-Dstring SegmentBuffer::ReadCommand() const {
-  if (mBufferLength == 0 || mWidth == 0) return {};
+Dstring SegmentBuffer::ReadCommand(long start, long length) const {
+  if (length == 0 || mWidth == 0) return {};
   return Dstring::Format("%s:EDIT:SEGM%u:PATT:DATA? %s,BIN", QenGuiInst::GetAppHandle().c_str(),
-                         mSegment->GetNumber(), RangeArgs().c_str());
+                         mSegment->GetNumber(), RangeArgs(start, length).c_str());
 }
 
 int SegmentBuffer::WriteCommand(Dstring& cmd, ConditionList& list) const {
@@ -99,25 +100,33 @@ int SegmentBuffer::WriteCommand(Dstring& cmd, ConditionList& list) const {
                                 SegmentStatus::kBlockTooLarge);
   }
   cmd = Dstring::Format("%s:EDIT:SEGM%u:PATT:DATA %s,#5%05u", QenGuiInst::GetAppHandle().c_str(),
-                        mSegment->GetNumber(), RangeArgs().c_str(), static_cast<unsigned>(bytes));
+                        mSegment->GetNumber(), RangeArgs(mBufferStart, mBufferLength).c_str(),
+                        static_cast<unsigned>(bytes));
   // Room for the read that a move joins to it, so that the bytes are copied once.
   cmd.reserve(cmd.size() + mRows.size() + kJoinedReadRoom);
   cmd.append(mRows.begin(), mRows.end());
   return SegmentStatus::kOk;
 }
 
-// The reply must be exactly one block of the window's size; otherwise nothing is taken.
-int SegmentBuffer::TakeBlock(const Dstring& reply, ConditionList& list) {
+// The reply must be exactly one block of `bytes`; otherwise `rows` stays as it was.
+int SegmentBuffer::CopyBlock(const Dstring& reply, long bytes, std::vector<std::uint8_t>& rows,
+                             ConditionList& list) const {
   DataParcel items;
   ConditionList ignored;
   const bool isBlock = ParserExpression::Parse(reply, items, ignored) == 0 && items.size() == 1 &&
                        items[0].GetType() == DataItemType::Block &&
-                       static_cast<long>(items[0].GetText().size()) == BlockBytes();
+                       static_cast<long>(items[0].GetText().size()) == bytes;
   if (!isBlock) {
     return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_BAD_BLOCK",
-                                {SegmentReply::Shown(reply), Number(BlockBytes())}, SegmentStatus::kBadReply);
+                                {SegmentReply::Shown(reply), Number(bytes)}, SegmentStatus::kBadReply);
   }
-  std::copy(items[0].GetText().begin(), items[0].GetText().end(), mRows.begin());
+  rows.assign(items[0].GetText().begin(), items[0].GetText().end());
+  return SegmentStatus::kOk;
+}
+
+int SegmentBuffer::TakeBlock(const Dstring& reply, ConditionList& list) {
+  if (int status = CopyBlock(reply, BlockBytes(), mRows, list)) return status;
+  mBase = mRows;
   mDirty = false;
   return SegmentStatus::kOk;
 }
@@ -131,12 +140,41 @@ int SegmentBuffer::Read(ConditionList& list) {
   return TakeBlock(reply, list);
 }
 
+int SegmentBuffer::ReadRows(std::vector<std::uint8_t>& rows, ConditionList& list) const {
+  rows.assign(mRows.size(), 0);
+  const Dstring cmd = ReadCommand();
+  if (cmd.empty()) return SegmentStatus::kOk;
+  if (int status = CheckOpen(list)) return status;
+  Dstring reply;
+  if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  return CopyBlock(reply, BlockBytes(), rows, list);
+}
+
+char SegmentBuffer::StateIn(const std::vector<std::uint8_t>& rows, long vector, long trace) const {
+  const unsigned number = ReadBitsOf(rows, vector, trace);
+  return number < mAlphabet.size() ? mAlphabet[number] : '?';
+}
+
+void SegmentBuffer::MergeOnto(const std::vector<std::uint8_t>& theirs) {
+  std::vector<std::uint8_t> mine = theirs;
+  std::swap(mRows, mine);
+  for (long t = 0; t < mWidth; ++t) {
+    for (long v = mBufferStart; v < mBufferStart + mBufferLength; ++v) {
+      const unsigned state = ReadBitsOf(mine, v, t);
+      if (state != ReadBitsOf(mBase, v, t)) WriteBits(v, t, state);
+    }
+  }
+  mBase = theirs;
+  mDirty = true;
+}
+
 int SegmentBuffer::Write(ConditionList& list) {
   Dstring cmd, reply;
   if (int status = WriteCommand(cmd, list)) return status;
   if (cmd.empty()) return SegmentStatus::kOk;
   if (int status = CheckOpen(list)) return status;
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
+  mBase = mRows;
   mDirty = false;
   return SegmentStatus::kOk;
 }
@@ -178,35 +216,37 @@ int SegmentBuffer::CheckWindow(long start, long length, ConditionList& list) con
 }
 
 // Unsaved edits are written back before the window moves, in the same frame as the read of
-// the new window, so that a move costs one round trip. If anything in it fails, the buffer
-// keeps its window, its states and its dirty flag: a write sent again sends the same bytes.
+// the new window, so that a move costs one round trip. The buffer takes the new window only
+// once the reply is in: if anything fails, or the server dies meanwhile, it still holds its
+// window, its states and its dirty flag, and a write sent again sends the same bytes.
 int SegmentBuffer::Move(long start, long length, ConditionList& list) {
   if (int status = CheckWindow(start, length, list)) return status;
   if (mSegment->GetNumber() == 0) {
     mBufferStart = start;
-    if (std::exchange(mBufferLength, length) != length)
+    if (std::exchange(mBufferLength, length) != length) {
       mRows.assign(static_cast<std::size_t>(BlockBytes()), 0);
+      mBase = mRows;
+    }
     return SegmentStatus::kOk;
   }
   Dstring cmd, reply;
   if (int status = WriteCommand(cmd, list)) return status;
   const bool writeBack = !cmd.empty();
-  const long oldStart = std::exchange(mBufferStart, start);
-  const long oldLength = std::exchange(mBufferLength, length);
-  std::vector<std::uint8_t> oldRows;
-  if (length != oldLength) oldRows = std::exchange(mRows, std::vector<std::uint8_t>(BlockBytes(), 0));
-  const Dstring read = ReadCommand();
+  const Dstring read = ReadCommand(start, length);
   if (writeBack && !read.empty()) cmd += ";";
   cmd += read;
-  int status = cmd.empty() ? SegmentStatus::kOk : QenGuiInst::Call(cmd, reply, list);
-  if (status == 0 && !read.empty()) status = TakeBlock(reply, list);
-  if (status != 0) {
-    mBufferStart = oldStart;
-    mBufferLength = oldLength;
-    if (length != oldLength) mRows = std::move(oldRows);
-    return status;
+  if (!cmd.empty()) {
+    if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
   }
-  if (writeBack) mDirty = false;
+  std::vector<std::uint8_t> rows(static_cast<std::size_t>(RowBytes(length, mStateWidth) * mWidth), 0);
+  if (!read.empty()) {
+    if (int status = CopyBlock(reply, static_cast<long>(rows.size()), rows, list)) return status;
+  }
+  mBufferStart = start;
+  mBufferLength = length;
+  mRows = std::move(rows);
+  mBase = mRows;
+  mDirty = false;
   return SegmentStatus::kOk;
 }
 
@@ -229,8 +269,8 @@ long SegmentBuffer::StateNumber(char state) const {
   return at == Dstring::npos ? -1 : static_cast<long>(at);
 }
 
-unsigned SegmentBuffer::ReadBits(long vector, long trace) const {
-  const std::uint8_t* row = mRows.data() + trace * RowSize();
+unsigned SegmentBuffer::ReadBitsOf(const std::vector<std::uint8_t>& rows, long vector, long trace) const {
+  const std::uint8_t* row = rows.data() + trace * RowSize();
   long bit = (vector - mBufferStart) * mStateWidth;
   unsigned value = 0;
   for (long i = 0; i < mStateWidth; ++i, ++bit)

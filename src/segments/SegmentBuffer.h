@@ -51,20 +51,33 @@ class SegmentBuffer {
   int CheckPosition(long vector, long trace, ConditionList& list) const;
   // The index of `state` in the alphabet, or -1.
   long StateNumber(char state) const;
-  unsigned ReadBits(long vector, long trace) const;
+  unsigned ReadBits(long vector, long trace) const { return ReadBitsOf(mRows, vector, trace); }
+  unsigned ReadBitsOf(const std::vector<std::uint8_t>& rows, long vector, long trace) const;
   void WriteBits(long vector, long trace, unsigned value);
   int CheckOpen(ConditionList& list) const;
   // The block commands of the window; empty when there is nothing to send.
-  Dstring ReadCommand() const;
+  Dstring ReadCommand() const { return ReadCommand(mBufferStart, mBufferLength); }
+  Dstring ReadCommand(long start, long length) const;
   int WriteCommand(Dstring& cmd, ConditionList& list) const;
   int TakeBlock(const Dstring& reply, ConditionList& list);
+  int CopyBlock(const Dstring& reply, long bytes, std::vector<std::uint8_t>& rows, ConditionList& list) const;
+  // The server's rows of the window as they are now, into `rows`; the buffer stays as it is.
+  int ReadRows(std::vector<std::uint8_t>& rows, ConditionList& list) const;
+  // The state of (vector, trace) in `rows`, rows of this window; the position must lie inside.
+  char StateIn(const std::vector<std::uint8_t>& rows, long vector, long trace) const;
+  // `theirs` (the server's rows now) with every state this buffer changed since the rows were
+  // last read or written put over them; `theirs` becomes the base. The buffer stays dirty.
+  void MergeOnto(const std::vector<std::uint8_t>& theirs);
   int CheckWindow(long start, long length, ConditionList& list) const;
   int Move(long start, long length, ConditionList& list);
-  Dstring RangeArgs() const;
+  Dstring RangeArgs(long start, long length) const;
 
   long mBufferLength = 0;
   long mBufferStart = 0;
   std::vector<std::uint8_t> mRows;
+  // The rows as last read from or written to the server: what the other side held then. A
+  // state that differs from it is one the user changed here.
+  std::vector<std::uint8_t> mBase;
   QenSegmentDs* mSegment;
   Dstring mAlphabet;
   long mStateWidth = 0;

@@ -10,4 +10,6 @@ inline constexpr int kBlockTooLarge = -42;
 inline constexpr int kUnknownState = -43;
 inline constexpr int kNotOpen = -44;
 inline constexpr int kBadArgument = -45;
+// Another client changed the segment under states typed here; the user has not chosen yet.
+inline constexpr int kChangedElsewhere = -46;
 }  // namespace SegmentStatus

@@ -116,26 +116,28 @@ int Put(QenSegmentDs& ds, DataFormat format, const Layout& layout, const std::ve
 }
 
 // The lines of an area, each ended by a newline.
-int Lines(QenSegmentDs& ds, DataFormat format, const Layout& layout, const StateRange& range, std::ostream& out,
-          ConditionList& list) {
-  std::string line;
+int Lines(QenSegmentDs& ds, DataFormat format, const Layout& layout, const StateRange& range,
+          std::ostream& out, ConditionList& list) {
   const long firstColumn = ColumnOf(layout, range.GetLastTrace());
   const long lastColumn = ColumnOf(layout, range.GetFirstTrace());
   return SegmentTextFile::ForEachBlock(
       ds, false, range.GetFirstVector(), range.GetLastVector(),
       [&](SegmentBuffer* buffer, long from, long to, ConditionList& l) {
-        for (long v = from; v < to; ++v) {
-          line.clear();
-          for (long c = firstColumn; c <= lastColumn; ++c) {
-            const long trace = (layout.columns - 1 - c) * layout.k;
-            char ch = ' ';
-            const int status = layout.digits ? ds.DigitOf(buffer, v, trace, format, ch, l) : ds.GetState(buffer, v, trace, ch, l);
-            if (status != 0) return status;
-            line += ch;
-          }
-          out << line << '\n';
+        int status = 0;
+        for (long v = from; v < to && status == 0; ++v) {
+          const Dstring line = SegmentTextFile::Line(
+              [&](long trace) {
+                char state = '?';
+                if (status == 0) status = ds.GetState(buffer, v, trace, state, l);
+                return state;
+              },
+              layout.width, layout.coding, format);
+          if (status == 0)
+            out << std::string_view(line).substr(static_cast<std::size_t>(firstColumn),
+                                                 static_cast<std::size_t>(lastColumn - firstColumn + 1))
+                << '\n';
         }
-        return 0;
+        return status;
       },
       list);
 }
@@ -182,9 +184,39 @@ int SegmentTextFile::ForEachBlock(QenSegmentDs& ds, bool write, long first, long
 int SegmentTextFile::Write(QenSegmentDs& ds, DataFormat format, std::ostream& out, ConditionList& list) {
   Layout layout;
   if (int status = LayoutOf(ds, format, layout, list)) return status;
-  out << "# segment " << ds.GetName() << ": " << layout.length << " vectors of " << layout.width << " traces, coding \""
-      << layout.coding << "\", " << (layout.digits ? InfoOf(format).word : "one state per trace") << ", vector 0 first\n";
+  out << Header(ds.GetName(), layout.length, layout.width, layout.coding, format) << '\n';
   return Lines(ds, format, layout, StateRange(0, 0, layout.width - 1, layout.length - 1), out, list);
+}
+
+Dstring SegmentTextFile::Header(const Dstring& name, long length, long width, const Dstring& coding,
+                                DataFormat format) {
+  return Dstring::Format("# segment %s: %ld vectors of %ld traces, coding \"%s\", %s, vector 0 first",
+                         name.c_str(), length, width, coding.c_str(),
+                         coding == "01" ? InfoOf(format).word : "one state per trace");
+}
+
+Dstring SegmentTextFile::PartHeader(const Dstring& name, long first, long last, long length, long width,
+                                    const Dstring& coding, DataFormat format) {
+  return Dstring::Format("# segment %s: vectors %ld to %ld of %ld vectors of %ld traces, coding \"%s\", %s",
+                         name.c_str(), first, last, length, width, coding.c_str(),
+                         coding == "01" ? InfoOf(format).word : "one state per trace");
+}
+
+Dstring SegmentTextFile::Line(const StateAt& state, long width, const Dstring& coding, DataFormat format) {
+  Dstring line;
+  if (coding != "01") {
+    for (long t = width - 1; t >= 0; --t) line += state(t);
+    return line;
+  }
+  const long k = InfoOf(format).tracesPerDigit;
+  char states[4];
+  for (long d = QenSegmentDs::MaxDigitOf(format, width); d >= 0; --d) {
+    const long low = d * k;
+    const long count = std::min(k, width - low);
+    for (long i = 0; i < count; ++i) states[i] = state(low + i);
+    line += QenSegmentDs::DigitOfStates(states, count, format);
+  }
+  return line;
 }
 
 int SegmentTextFile::RangeText(QenSegmentDs& ds, DataFormat format, const StateRange& range, Dstring& text, ConditionList& list) {

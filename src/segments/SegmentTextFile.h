@@ -37,6 +37,17 @@ class SegmentTextFile {
   // `vector` on.
   static int Paste(QenSegmentDs& ds, DataFormat format, const Dstring& text, long vector, long trace, ConditionList& list);
 
+  // The comment line that opens an export: the segment's name, dimensions, coding and format.
+  static Dstring Header(const Dstring& name, long length, long width, const Dstring& coding,
+                        DataFormat format);
+  // The comment line of a part: the vectors first .. last of such a segment.
+  static Dstring PartHeader(const Dstring& name, long first, long last, long length, long width,
+                            const Dstring& coding, DataFormat format);
+  // One vector as a line of the text form (without its newline); `state(trace)` gives the
+  // state of each trace. Needs no server: the rescue writes what this side holds with it.
+  using StateAt = std::function<char(long trace)>;
+  static Dstring Line(const StateAt& state, long width, const Dstring& coding, DataFormat format);
+
   // Told after each block of a transfer how many of its vectors are done; false stops it with
   // "GUI_TRANSFER_STOPPED". A scope installs one for the transfers run inside it (GUI thread).
   using Progress = std::function<bool(long done, long total)>;

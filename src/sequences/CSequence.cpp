@@ -17,6 +17,8 @@
 #include "sequences/CSequenceReader.h"
 #include "sequences/CSequenceStructure.h"
 #include "sequences/CSequenceWriter.h"
+#include "sequences/SequenceSegmentSync.h"
+#include "sequences/SequenceSegmentUse.h"
 #include "support/ConditionListLoader.h"
 #include "support/FWBlocker.h"
 #include "support/LgsDebug.h"
@@ -661,10 +663,20 @@ int CSequence::ClearExistingStartLabel(ConditionList& cond) {
   });
 }
 
+// A segment the instrument does not have would start a run that plays nothing there: the run
+// is refused before anything is written, naming every such segment and its blocks.
 int CSequence::SyncSegments(ConditionList& cond) {
   FWBlocker guard("CSequence::SyncSegments", cond);
   if (int status = guard.Block()) return status;
   if (mSegmentSync == nullptr) return 0;
+  std::vector<Dstring> missing;
+  if (int status = mSegmentSync->FindMissing(SequenceSegmentUse::NamedSegments(*this), missing, cond))
+    return status;
+  if (!missing.empty()) {
+    return Refuse(cond,
+                  missing.size() == 1 ? "GUI_SEQUENCE_MISSING_SEGMENT" : "GUI_SEQUENCE_MISSING_SEGMENTS",
+                  {SequenceSegmentUse::SegmentsText(*this, missing)});
+  }
   std::set<Dstring> done;
   for (const auto& block : mContent.blocks) {
     if (int status = block->SyncSegments(*mSegmentSync, done, cond)) return status;

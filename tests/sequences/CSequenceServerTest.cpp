@@ -1,6 +1,8 @@
 // The exchange with the server: loop levels, events, the dirty flag and segment sync.
 #include <gtest/gtest.h>
 
+#include <algorithm>
+
 #include "data/DirtyFlagDs.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceFixture.h"
@@ -179,8 +181,18 @@ class RecordingSync : public SequenceSegmentSync {
     }
     return 0;
   }
+  int FindMissing(const std::vector<Dstring>& asked, std::vector<Dstring>& out, ConditionList&) override {
+    questions.push_back(asked);
+    out.clear();
+    for (const Dstring& name : asked) {
+      if (std::find(missing.begin(), missing.end(), name) != missing.end()) out.push_back(name);
+    }
+    return 0;
+  }
   DstringList names;
   Dstring failOn;
+  DstringList missing;
+  std::vector<std::vector<Dstring>> questions;
 };
 
 TEST_F(ServerTest, SyncSegmentsHandsEveryNamedSegmentOnceInOrder) {
@@ -199,6 +211,43 @@ TEST_F(ServerTest, SyncSegmentsHandsEveryNamedSegmentOnceInOrder) {
   mSeq.SetSegmentSync(nullptr);
 }
 
+// A segment the instrument does not have stops everything before the first write, and the
+// refusal names every such segment with the blocks that play it.
+TEST_F(ServerTest, SyncSegmentsRefusesMissingSegmentsNamingTheirBlocks) {
+  Load(Seq("(SEQ," + Blk(1, "\"walkB8\"", "\"a\"") + ",\"\"," + Blk(2, "PAUSE", "\"cnt32\"") + ",\"\"," +
+           Blk(3, "\"walkB8\"") + ",\"\"," + Blk(4, "\"walkB8\"", "\"walkB8\"") + ")"));
+  RecordingSync sync;
+  mSeq.SetSegmentSync(&sync);
+  struct Case {
+    DstringList missing;
+    const char* text;
+  };
+  const Case cases[] = {
+      {{"cnt32"},
+       "The sequence names the segment \"cnt32\" (block 2), which the instrument does not have; nothing was "
+       "started. Put a segment in its place or make it again."},
+      {{"walkB8", "cnt32"},
+       "The sequence names segments the instrument does not have: \"walkB8\" (blocks 1, 3 and 4), "
+       "\"cnt32\" (block 2); nothing was started. Put segments in their place or make them again."},
+  };
+  for (const Case& c : cases) {
+    sync.missing = c.missing;
+    sync.names.clear();
+    sync.questions.clear();
+    ConditionList list;
+    EXPECT_EQ(mSeq.SyncSegments(list), CSequence::kStatusError);
+    ASSERT_EQ(list.Size(), 1u);
+    EXPECT_EQ(list[0].GetMessage(), c.text);
+    EXPECT_TRUE(sync.names.empty()) << "nothing is written back";
+    EXPECT_EQ(sync.questions, (std::vector<std::vector<Dstring>>{{"walkB8", "a", "cnt32"}}))
+        << "one question, each once";
+  }
+  sync.missing.clear();
+  EXPECT_EQ(mSeq.SyncSegments(mList), 0);
+  EXPECT_EQ(sync.names, (DstringList{"walkB8", "a", "cnt32"}));
+  mSeq.SetSegmentSync(nullptr);
+}
+
 TEST_F(ServerTest, TheFirstGenerationIsReadFromTheServerAndWrittenBackInTheThird) {
   Load("(1.0,\"\",(BLOCK,64,PAUSE,PAUSE0))");
   ASSERT_EQ(mSeq.SetBlockTrigger(1, 1, mList), 0);
@@ -206,13 +255,26 @@ TEST_F(ServerTest, TheFirstGenerationIsReadFromTheServerAndWrittenBackInTheThird
 }
 
 TEST(SequenceMessages, EveryKeyOfTheSubsystemHasAText) {
-  for (const char* key :
-       {"GUI_SEQUENCE_SYNTAX", "GUI_SEQUENCE_WRONG_VERSION", "GUI_SEQUENCE_IMPOSSIBLE_NESTING_LOOPS",
-        "GUI_SEQUENCE_EVENT_EXPR_SYNTAX", "GUI_SEQUENCE_NO_BLOCK", "GUI_SEQUENCE_NO_PORT",
-        "GUI_SEQUENCE_NO_LOOP_LEVEL", "GUI_SEQUENCE_NO_LOOP", "GUI_SEQUENCE_NO_REACTION",
-        "GUI_SEQUENCE_BAD_LOOP_RANGE", "GUI_SEQUENCE_BAD_SEGMENT", "GUI_SEQUENCE_BAD_MOVE",
-        "GUI_SEQUENCE_CLIPBOARD_EMPTY", "GUI_SEQUENCE_BAD_LOOP_LEVELS", "GUI_PORTINFO_BAD_CONFIGURATION",
-        "GUI_PORTINFO_NO_PORT", "GUI_OPERATION_BUSY", "GUI_COMMAND_BAD_TEXT"}) {
+  for (const char* key : {"GUI_SEQUENCE_SYNTAX",
+                          "GUI_SEQUENCE_WRONG_VERSION",
+                          "GUI_SEQUENCE_IMPOSSIBLE_NESTING_LOOPS",
+                          "GUI_SEQUENCE_EVENT_EXPR_SYNTAX",
+                          "GUI_SEQUENCE_NO_BLOCK",
+                          "GUI_SEQUENCE_NO_PORT",
+                          "GUI_SEQUENCE_NO_LOOP_LEVEL",
+                          "GUI_SEQUENCE_NO_LOOP",
+                          "GUI_SEQUENCE_NO_REACTION",
+                          "GUI_SEQUENCE_BAD_LOOP_RANGE",
+                          "GUI_SEQUENCE_BAD_SEGMENT",
+                          "GUI_SEQUENCE_BAD_MOVE",
+                          "GUI_SEQUENCE_CLIPBOARD_EMPTY",
+                          "GUI_SEQUENCE_BAD_LOOP_LEVELS",
+                          "GUI_SEQUENCE_MISSING_SEGMENT",
+                          "GUI_SEQUENCE_MISSING_SEGMENTS",
+                          "GUI_PORTINFO_BAD_CONFIGURATION",
+                          "GUI_PORTINFO_NO_PORT",
+                          "GUI_OPERATION_BUSY",
+                          "GUI_COMMAND_BAD_TEXT"}) {
     EXPECT_NE(MessageCatalogue::Find(key), nullptr) << key;
   }
 }

@@ -8,6 +8,7 @@
 #include <QMdiArea>
 #include <QMdiSubWindow>
 #include <QMimeData>
+#include <QPushButton>
 #include <QScreen>
 #include <QScrollBar>
 #include <QTableWidget>
@@ -24,10 +25,12 @@
 #include "sequences/ui/LoopGridManager.h"
 #include "windows/InstanceWindows.h"
 #include "windows/MainWin.h"
+#include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/loopgridedit/LoopGridEditWin.h"
 #include "windows/seqedit/SeqeditEventWin.h"
 #include "windows/seqedit/SeqeditSeqEdWin.h"
 #include "windows/seqedit/SequenceWindows.h"
+#include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
 
@@ -464,4 +467,83 @@ TEST_F(LoopGridTest, TiledWithOtherWindowsTheGridScrollsAndKeepsEveryPortColumn)
     EXPECT_LE(column->x() + column->width(), shown) << port;
     EXPECT_EQ(across->value(), mGrid->GetScrollX());
   }
+}
+
+// A segment the sequence plays: deleting it warns with the blocks; every list and both sequence
+// editors follow the catalogue within a poll, this client's delete or another's; its name opens
+// no empty new segment; and Run is refused before anything starts, naming blocks and segment.
+TEST_F(LoopGridTest, ASegmentInUseIsDeletedOnlyWithAWarningAndRunIsRefusedWithoutIt) {
+  MakeSegment("walkB8", 512, 1);
+  MakeSegment("spare", 512, 1);
+  Key(Qt::Key_Insert);
+  Key(Qt::Key_Insert);
+  for (unsigned long block : {1UL, 3UL})
+    mGrid->SetCellText(block, mGrid->PortField(1), QStringLiteral("walkB8"));
+  auto* editor =
+      qobject_cast<DataeditSegmentEditWin*>(mMain->OpenWindow(QStringLiteral("dataedit.SegmentEditWin")));
+  auto* simple = qobject_cast<SmseqeditWin*>(mMain->OpenWindow(QStringLiteral("smseqedit.Win")));
+  ASSERT_TRUE(editor != nullptr && simple != nullptr);
+  const auto listed = [](QListWidget* list, const char* name) {
+    return !list->findItems(QString::fromLatin1(name), Qt::MatchExactly).isEmpty();
+  };
+  const auto red = [&](unsigned long block) {
+    const QTableWidgetItem* cell = simple->Table()->item(static_cast<int>(block) - 1, 2);
+    return cell->foreground().color() == QColor(Qt::red);
+  };
+  const auto marked = [&](unsigned long block) {
+    for (GridDisp* disp : mGrid->Disps()) {
+      if (disp->objectName() == QLatin1String("port1"))
+        return mGrid->DispCell(*disp, static_cast<long>(block) - 1, 0).marked;
+    }
+    return false;
+  };
+  ASSERT_TRUE(listed(editor->SegmentList(), "walkB8") && listed(mWin->Segments(), "walkB8"));
+  EXPECT_FALSE(red(1) || marked(1));
+
+  EXPECT_EQ(DataeditSegmentEditWin::DeleteQuestion("spare"),
+            "Delete the segment \"spare\" from the instrument?");
+  EXPECT_EQ(
+      DataeditSegmentEditWin::DeleteQuestion("walkB8"),
+      "The sequence plays the segment \"walkB8\" in blocks 1 and 3. Once it is deleted, Run is refused until "
+      "those blocks play another segment.\n\nDelete \"walkB8\" anyway?");
+  const auto pickAndDelete = [&](const char* name, int answer) {
+    editor->SegmentList()->setCurrentItem(
+        editor->SegmentList()->findItems(QString::fromLatin1(name), Qt::MatchExactly).front());
+    mToolkit.QueueAnswer(answer);
+    editor->findChild<QPushButton*>(QStringLiteral("PButDelete"))->click();
+  };
+  pickAndDelete("walkB8", ToolkitPort::kNo);
+  EXPECT_EQ(Other(":EDIT:SEGM:EXIS? \"walkB8\""), "TRUE");
+  pickAndDelete("walkB8", ToolkitPort::kYes);
+  EXPECT_EQ(Other(":EDIT:SEGM:EXIS? \"walkB8\""), "FALSE");
+  // This client's own delete: every list and both sequence editors at once.
+  EXPECT_FALSE(listed(editor->SegmentList(), "walkB8") || listed(mWin->Segments(), "walkB8"));
+  EXPECT_TRUE(red(1) && red(3) && marked(1) && marked(3));
+  EXPECT_FALSE(red(2) || marked(2));
+
+  // Another client's delete: within one poll.
+  Other(":EDIT:SEGM:DEL \"spare\"");
+  ASSERT_TRUE(listed(editor->SegmentList(), "spare"));
+  Poll();
+  EXPECT_FALSE(listed(editor->SegmentList(), "spare") || listed(mWin->Segments(), "spare"));
+
+  // The stale name opens nothing, and makes nothing.
+  mAlerts.clear();
+  EXPECT_EQ(SequenceWindows::OpenSegment(mWin, 1, 1), nullptr);
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find("The instrument has no segment \"walkB8\""), std::string::npos) << mAlerts[0];
+  EXPECT_EQ(QenSegmentPool::GetSegmentDsByName("walkB8"), nullptr);
+  EXPECT_EQ(Other(":EDIT:SEGM:EXIS? \"walkB8\""), "FALSE");
+
+  mAlerts.clear();
+  mWin->findChild<QPushButton*>(QStringLiteral("PButRun"))->click();
+  QCoreApplication::processEvents();
+  ASSERT_EQ(mAlerts.size(), 1u);
+  EXPECT_NE(mAlerts[0].find(
+                "The sequence names the segment \"walkB8\" (blocks 1 and 3), which the instrument does not "
+                "have; nothing was started."),
+            std::string::npos)
+      << mAlerts[0];
+  EXPECT_EQ(Other(":SGEN:GLOB:INIT:CONT?"), "OFF");
 }

@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <QAction>
+#include <QApplication>
 #include <QClipboard>
 #include <QComboBox>
 #include <QDir>
@@ -8,6 +9,9 @@
 #include <QLabel>
 #include <QLineEdit>
 #include <QListWidget>
+#include <QMessageBox>
+#include <QPlainTextEdit>
+#include <QPointer>
 #include <QProgressDialog>
 #include <QPushButton>
 #include <QTest>
@@ -73,6 +77,20 @@ class SegmentEditTest : public GuiSimFixture {
     ASSERT_NE(a, nullptr) << action;
     ASSERT_TRUE(a->isEnabled()) << action;
     a->trigger();
+  }
+
+  // Another client's view of a vector of the open segment `number` of 16 traces: four hex digits.
+  QString OtherVector(const Dstring& number, long vector) {
+    const Dstring block =
+        Other(":EDIT:SEGM" + number + Dstring::Format(":PATT:DATA? 0,%ld,15,%ld,BIN", vector, vector));
+    QString digits;
+    for (int d = 3; d >= 0 && block.size() == 23; --d) {
+      int value = 0;
+      for (int t = 4 * d + 3; t >= 4 * d; --t)
+        value = value * 2 + ((static_cast<unsigned char>(block[7 + t]) & 0x80) ? 1 : 0);
+      digits += QString::number(value, 16);
+    }
+    return digits;
   }
 
   static constexpr const char* kName = "Edit/Work";
@@ -442,4 +460,120 @@ TEST_F(SegmentEditTest, ALongFillShowsItsProgressAndCancelLeavesTheSegmentAsItWa
   Other(":EDIT:SEGM" + number + ":CLOS");
   ASSERT_EQ(grid->Release(mList), 0);
   QenSegmentPool::Delete("Edit/Huge", mList);
+}
+
+namespace {
+
+// What the user does when another client changed the segment under the digits typed here: the
+// buttons clicked on the dialogs that come up, in order (the compare dialog after "Look First").
+struct Answer {
+  const char* name;
+  std::vector<const char*> buttons;
+};
+
+class ChangedElsewhereTest : public SegmentEditTest, public testing::WithParamInterface<Answer> {
+ protected:
+  // Clicks the buttons in order, each on the next modal dialog once it shows; what the dialogs
+  // said is kept, and what the instrument held while the first one was up.
+  void ClickWhenShown(std::vector<const char*> buttons) {
+    auto* timer = new QTimer(mWin.get());
+    timer->setInterval(0);
+    QObject::connect(timer, &QTimer::timeout, [this, timer, buttons, next = std::size_t{0}]() mutable {
+      QWidget* dialog = QApplication::activeModalWidget();
+      if (dialog == nullptr || (next > 0 && dialog == mLastDialog)) return;
+      mLastDialog = dialog;
+      if (auto* box = qobject_cast<QMessageBox*>(dialog)) mSaid.push_back(box->text());
+      if (auto* text = dialog->findChild<QPlainTextEdit*>(QStringLiteral("TextDifferences")))
+        mSaid.push_back(text->toPlainText());
+      if (next == 0) mHeldThen = OtherVector(35);
+      dialog->findChild<QPushButton*>(QLatin1String(buttons[next]))->click();
+      if (++next == buttons.size()) timer->deleteLater();
+    });
+    timer->start();
+  }
+  QString OtherVector(long vector) { return SegmentEditTest::OtherVector(mNumber, vector); }
+
+  Dstring mNumber;
+  // Guarded: the next dialog may well be made where the last one was.
+  QPointer<QWidget> mLastDialog;
+  QStringList mSaid;
+  QString mHeldThen;
+};
+
+}  // namespace
+
+// Digits typed at vector 0 and not yet written; another client fills vector 35. The poll that
+// reports it writes nothing: the editor asks first, and does what the user chose.
+TEST_P(ChangedElsewhereTest, TheEditorAsksBeforeItWritesOverAnotherClientsChange) {
+  SegmentGridManager* grid = mWin->Grid();
+  QTest::keyClicks(grid, QStringLiteral("c3"));
+  mNumber = Other(":EDIT:SEGM:OPEN? \"Edit/Work\"");
+  Other(":EDIT:SEGM" + mNumber + ":PATT:MOD:FILL 0,35,15,35,1");
+  ClickWhenShown(GetParam().buttons);
+  Poll();
+  QCoreApplication::processEvents();
+  EXPECT_EQ(mHeldThen, QStringLiteral("ffff")) << "nothing was written before the question";
+  ASSERT_FALSE(mSaid.isEmpty());
+  EXPECT_TRUE(mSaid.front().startsWith(
+      QStringLiteral("Another client changed the segment \"Edit/Work\" while digits you typed")))
+      << mSaid.front().toStdString();
+  const std::string name = GetParam().name;
+  if (name == "look") {
+    ASSERT_EQ(mSaid.size(), 2);
+    EXPECT_EQ(mSaid[1], QStringLiteral("Vector    Before  Yours   Theirs\n"
+                                       "0         0000    c300    0000\n"
+                                       "35        0000    0000    ffff\n"));
+    // Decided later: the digits stay, nothing is written, and a save says why.
+    EXPECT_TRUE(grid->GetSegmentDs()->IsChangedElsewhere());
+    Trigger("Save");
+    QCoreApplication::processEvents();
+    EXPECT_EQ(OtherVector(0), QStringLiteral("0000"));
+    ASSERT_FALSE(mAlerts.empty());
+    EXPECT_NE(mAlerts.back().find("nothing was written. Choose first"), std::string::npos) << mAlerts.back();
+    mAlerts.clear();
+    Trigger("KeepMine");
+  }
+  const bool mine = name != "theirs";
+  EXPECT_FALSE(grid->GetSegmentDs()->IsChangedElsewhere());
+  EXPECT_TRUE(grid->IsDirty()) << "their change is not saved either";
+  EXPECT_FALSE(grid->GetSegmentDs()->HasUnwrittenStates());
+  EXPECT_EQ(Row(grid, 0), mine ? QStringLiteral("c300") : QStringLiteral("0000"));
+  EXPECT_EQ(Row(grid, 35), QStringLiteral("ffff")) << "their vector survives either way";
+  EXPECT_EQ(OtherVector(0), Row(grid, 0));
+  EXPECT_EQ(OtherVector(35), QStringLiteral("ffff"));
+  EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
+  Other(":EDIT:SEGM" + mNumber + ":CLOS");
+}
+
+INSTANTIATE_TEST_SUITE_P(Choices, ChangedElsewhereTest,
+                         testing::Values(Answer{"mine", {"PButKeepMine"}},
+                                         Answer{"theirs", {"PButTakeTheirs"}},
+                                         Answer{"look", {"PButLookFirst", "PButLater"}}),
+                         [](const testing::TestParamInfo<Answer>& info) {
+                           return std::string(info.param.name);
+                         });
+
+// A change of the other client outside the vectors held here is no conflict: the digits typed
+// are written as before, and nothing is asked.
+TEST_F(SegmentEditTest, AnotherClientsChangeElsewhereInTheSegmentAsksNothing) {
+  SegmentProperties properties;
+  properties.name = "Edit/Far";
+  properties.length = 1 << 16;
+  properties.width = 16;
+  properties.coding = "01";
+  ASSERT_EQ(mWin->CreateSegment(properties, mList), 0) << mList.ToText();
+  SegmentGridManager* grid = mWin->Grid();
+  ASSERT_LT(grid->HeldVectors(), 60000);
+  QTest::keyClicks(grid, QStringLiteral("5a"));
+  const Dstring number = Other(":EDIT:SEGM:OPEN? \"Edit/Far\"");
+  Other(":EDIT:SEGM" + number + ":PATT:MOD:FILL 0,60000,15,60000,1");
+  Poll();
+  QCoreApplication::processEvents();
+  EXPECT_EQ(QApplication::activeModalWidget(), nullptr);
+  EXPECT_FALSE(grid->GetSegmentDs()->IsChangedElsewhere());
+  EXPECT_EQ(OtherVector(number, 0), QStringLiteral("5a00")) << "the digits typed were written";
+  EXPECT_EQ(Row(grid, 60000), QStringLiteral("ffff"));
+  Other(":EDIT:SEGM" + number + ":CLOS");
+  ASSERT_EQ(grid->Release(mList), 0);
+  QenSegmentPool::Delete("Edit/Far", mList);
 }

@@ -29,11 +29,18 @@ QString TextOf(const ConditionList& list) { return QString::fromStdString(list.T
 
 }  // namespace
 
-// Another editor or client changed the segment: its dimensions may have changed too.
+// Another editor or client changed the segment: its dimensions may have changed too. When
+// another client changed it under digits typed here, nothing was read: the buffer still holds
+// them, and the window asks the user what to do.
 class SegmentGridManager::View : public QenDsView {
  public:
   explicit View(SegmentGridManager& grid) : mGrid(grid) {}
-  int NfyViewDataUpdated(QenDs*, ConditionList& list) override {
+  int NfyViewDataUpdated(QenDs* source, ConditionList& list) override {
+    if (static_cast<QenSegmentDs*>(source)->GetChangeKind() == QenSegmentDs::kChangedElsewhere) {
+      emit mGrid.ChangedElsewhere();
+      emit mGrid.StateChanged();
+      return 0;
+    }
     const int status = mGrid.ReadDimensions(list);
     mGrid.Refresh();
     emit mGrid.StateChanged();
@@ -48,9 +55,16 @@ SegmentGridManager::SegmentGridManager(QWidget* parent) : GridManager(parent), m
   setObjectName(QString::fromLatin1(Class()));
 }
 
+// A grid that goes must let go of the segment whatever happens: what could not be written is
+// said, and the view leaves the source, which would otherwise tell a grid that is gone.
 SegmentGridManager::~SegmentGridManager() {
   ConditionList list;
-  if (Release(list) != 0) QenGuiInst::ShowErrorDlg(list, 1);
+  if (Release(list) == 0) return;
+  QenGuiInst::ShowErrorDlg(list, 1);
+  ConditionList ignored;
+  mDs->Close(ignored);
+  mDs->DestroyBuffer(mBuffer, ignored);
+  QenSegmentPool::UnregisterView(mDs, mView.get(), ignored);
 }
 
 void SegmentGridManager::CppRegister() {

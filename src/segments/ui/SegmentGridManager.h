@@ -137,6 +137,9 @@ class SegmentGridManager : public GridManager {
  signals:
   // A refusal the user should read where they type (a digit the format does not know).
   void Message(const QString& text);
+  // Another client changed the segment under digits typed here and not yet written: nothing is
+  // written until the user chooses (QenSegmentDs::KeepMine, TakeTheirs).
+  void ChangedElsewhere();
 
  protected:
   void keyPressEvent(QKeyEvent* event) override;

@@ -9,6 +9,7 @@
 #include <QPainter>
 #include <algorithm>
 
+#include "segments/QenSegmentPool.h"
 #include "segments/ui/GridDisp.h"
 #include "segments/ui/NameDisp.h"
 #include "sequences/CLoop.h"
@@ -213,6 +214,12 @@ QString LoopGridManager::DispHeader(const GridDisp& disp, int) const {
                                       : QString();
 }
 
+void LoopGridManager::SetSegmentNames(const QStringList& names) {
+  mSegmentNames = names;
+  mSegmentsKnown = true;
+  Refresh();
+}
+
 GridCell LoopGridManager::DispCell(const GridDisp& disp, long line, int cell) const {
   GridCell out;
   const auto block = static_cast<unsigned long>(line) + 1;
@@ -224,7 +231,10 @@ GridCell LoopGridManager::DispCell(const GridDisp& disp, long line, int cell) co
   } else if (field >= 0) {
     out.text = CellText(block, field);
     const unsigned long port = PortOf(field);
-    out.dim = port != 0 && mSequence->GetType(block, port) != CSequence::SEG_NAMED;
+    const bool named = port != 0 && mSequence->GetType(block, port) == CSequence::SEG_NAMED;
+    out.dim = port != 0 && !named;
+    out.marked = named && mSegmentsKnown && !mSegmentNames.contains(out.text) &&
+                 !QenSegmentPool::IsOpenHere(out.text.toStdString());
     out.cursor = line == mRow && field == mField && !IsEditing();
   }
   // A run of blocks shows as selected; a single block by its number.

@@ -50,7 +50,9 @@ class LoopGridManager : public GridManager {
   // The largest count a loop may have on the instrument; 0 when not known.
   void SetLargestCount(unsigned long largest) { mLargestCount = largest; }
   // The names the cell editor of a port offers, besides the built-in kinds.
-  void SetSegmentNames(const QStringList& names) { mSegmentNames = names; }
+  // The instrument's segments: the port editor completes them, and once they are known a port
+  // naming a segment that is not among them is drawn in the alert colour.
+  void SetSegmentNames(const QStringList& names);
 
   // Fields of a line, left to right: the loop lanes (the top level first), label, length, ports.
   int NumFields() const;
@@ -166,6 +168,7 @@ class LoopGridManager : public GridManager {
   std::unique_ptr<SequenceUndo> mUndo;
   std::function<QString(unsigned long, int)> mPortHeader;
   QStringList mSegmentNames;
+  bool mSegmentsKnown = false;
   unsigned long mLargestCount = 0;
   QLineEdit* mEditor = nullptr;
   long mFirst = 0;

@@ -3,7 +3,10 @@
 #include <QAction>
 #include <QCloseEvent>
 #include <QComboBox>
+#include <QDialog>
+#include <QDialogButtonBox>
 #include <QFileDialog>
+#include <QFontDatabase>
 #include <QInputDialog>
 #include <QLabel>
 #include <QLayout>
@@ -12,17 +15,25 @@
 #include <QMdiSubWindow>
 #include <QMenuBar>
 #include <QMessageBox>
+#include <QPlainTextEdit>
 #include <QProgressDialog>
 #include <QPushButton>
 #include <QSpinBox>
+#include <QTimer>
+#include <QVBoxLayout>
 
 #include "instrument/CallProgressScope.h"
 #include "instrument/QenStatus.h"
 #include "params/ui/BoundControl.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
+#include "segments/SegmentCatalogFollower.h"
 #include "segments/SegmentTextFile.h"
 #include "segments/ui/SegmentGridManager.h"
+#include "sequences/CPortInfo.h"
+#include "sequences/CSequence.h"
+#include "sequences/SequenceSegmentUse.h"
+#include "support/ConditionListLoader.h"
 #include "support/FWBlocker.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
@@ -69,6 +80,9 @@ int DataeditSegmentEditWin::Load(ConditionList& list) {
   BuildMenus();
   connect(mGrid, &GridManager::StateChanged, this, &DataeditSegmentEditWin::ShowState);
   connect(mGrid, &SegmentGridManager::Message, mMessage, &QLabel::setText);
+  // The question waits for the poll that brought the change to end.
+  connect(mGrid, &SegmentGridManager::ChangedElsewhere, this,
+          [this] { QTimer::singleShot(0, this, &DataeditSegmentEditWin::AskChangedElsewhere); });
   connect(mSegments, &QListWidget::itemActivated, this, &DataeditSegmentEditWin::HitSegmentChosen);
   // Arrow keys in the list open what they land on, as a click does.
   connect(mSegments, &QListWidget::currentItemChanged, this, &DataeditSegmentEditWin::HitSegmentChosen);
@@ -89,6 +103,7 @@ int DataeditSegmentEditWin::Load(ConditionList& list) {
   connect(findChild<QPushButton*>(QStringLiteral("PButFindPrev")), &QPushButton::clicked, Action(QStringLiteral("FindPrevious")), &QAction::trigger);
   connect(mGoto, &QLineEdit::returnPressed, this, &DataeditSegmentEditWin::HitGoto);
   setFocusProxy(mGrid);
+  mCatalog = std::make_unique<SegmentCatalogFollower>([this] { FillList(); });
   const int status = ReadCatalog(list);
   ShowState();
   return status;
@@ -97,6 +112,9 @@ int DataeditSegmentEditWin::Load(ConditionList& list) {
 void DataeditSegmentEditWin::BuildMenus() {
   using G = SegmentGridManager;
   const auto editable = [](G& g) { return g.IsFillPossible(); };
+  const auto elsewhere = [](G& g) {
+    return g.GetSegmentDs() != nullptr && g.GetSegmentDs()->IsChangedElsewhere();
+  };
   const Command commands[] = {
       {"&Segment", "Save", "&Save", QKeySequence::Save,
        [](G& g, ConditionList& l) { return g.SaveSegment(0, 0, l); }, [](G& g) { return g.IsDirty(); }},
@@ -106,6 +124,11 @@ void DataeditSegmentEditWin::BuildMenus() {
        [](G& g) { return g.GetSegmentDs() != nullptr; }},
       {"&Segment", "ExportText", "&Export Text…", QKeySequence(), nullptr, editable},
       {"&Segment", "ExportVcd", "Export &VCD…", QKeySequence(), nullptr, editable},
+      {"&Segment", "KeepMine", "&Keep My Digits", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.GetSegmentDs()->KeepMine(l); }, elsewhere},
+      {"&Segment", "TakeTheirs", "&Take Their Version", QKeySequence(),
+       [](G& g, ConditionList& l) { return g.GetSegmentDs()->TakeTheirs(l); }, elsewhere},
+      {"&Segment", "LookFirst", "&Compare with Their Version…", QKeySequence(), nullptr, elsewhere},
       {"&Edit", "Fill0", "Fill with &0", QKeySequence(Qt::CTRL | Qt::Key_L),
        [](G& g, ConditionList& l) {
          g.SetFillState(0);
@@ -207,6 +230,8 @@ void DataeditSegmentEditWin::BuildMenus() {
   connect(Action(QStringLiteral("InsertVectors")), &QAction::triggered, this, [this] { HitInsert(VectorTrace::kVector); });
   connect(Action(QStringLiteral("InsertTraces")), &QAction::triggered, this, [this] { HitInsert(VectorTrace::kTrace); });
   connect(Action(QStringLiteral("Deserialize")), &QAction::triggered, this, &DataeditSegmentEditWin::HitDeserialize);
+  connect(Action(QStringLiteral("LookFirst")), &QAction::triggered, this,
+          [this] { Choose(AskAfterLooking()); });
   connect(Action(QStringLiteral("Coding")), &QAction::triggered, this, &DataeditSegmentEditWin::HitCoding);
   connect(Action(QStringLiteral("Goto")), &QAction::triggered, this, [this] {
     mGoto->setFocus();
@@ -267,15 +292,19 @@ void DataeditSegmentEditWin::Run(const std::function<int(ConditionList&)>& opera
 }
 
 int DataeditSegmentEditWin::ReadCatalog(ConditionList& list) {
-  std::vector<Dstring> names;
-  if (int status = QenSegmentPool::Catalog(names, list)) return status;
+  const int status = mCatalog->Read(list);
+  FillList();
+  return status;
+}
+
+void DataeditSegmentEditWin::FillList() {
   {
     const QSignalBlocker quiet(mSegments);
     mSegments->clear();
-    for (const Dstring& name : names) new QListWidgetItem(QString::fromStdString(name), mSegments);
+    for (const Dstring& name : mCatalog->GetNames())
+      new QListWidgetItem(QString::fromStdString(name), mSegments);
   }
   MarkOpen();
-  return 0;
 }
 
 void DataeditSegmentEditWin::MarkOpen() {
@@ -303,6 +332,24 @@ int DataeditSegmentEditWin::CreateSegment(const SegmentProperties& properties, C
   return status;
 }
 
+Dstring DataeditSegmentEditWin::DeleteQuestion(const Dstring& name) {
+  CSequence* sequence = CPortInfo::GetSequence();
+  std::vector<unsigned long> blocks;
+  if (sequence != nullptr) {
+    // The sequence as the instrument holds it now; under a lock, as last read.
+    ConditionList ignored;
+    sequence->ReadSequence(ignored, 0);
+    blocks = SequenceSegmentUse::BlocksNaming(*sequence, name);
+  }
+  if (blocks.empty()) return Dstring::Format("Delete the segment \"%s\" from the instrument?", name.c_str());
+  const Dstring where = SequenceSegmentUse::BlocksText(blocks);
+  return Dstring::Format(
+      "The sequence plays the segment \"%s\" in %s. Once it is deleted, Run is refused until %s another "
+      "segment.\n\nDelete \"%s\" anyway?",
+      name.c_str(), where.c_str(), blocks.size() == 1 ? "that block plays" : "those blocks play",
+      name.c_str());
+}
+
 int DataeditSegmentEditWin::DeleteSegment(const Dstring& name, ConditionList& list) {
   Dstring open;
   mGrid->GetSegmentName(0, 0, open, list);
@@ -318,6 +365,9 @@ int DataeditSegmentEditWin::DeleteSegment(const Dstring& name, ConditionList& li
 // The instrument forgets a segment's unsaved changes when it is closed: before the editor lets
 // go of one, the user saves them, lets them go, or stays.
 bool DataeditSegmentEditWin::ConfirmLeave(const char* doing) {
+  // Digits held back from another client's change are settled first.
+  AskChangedElsewhere();
+  if (mGrid->GetSegmentDs() != nullptr && mGrid->GetSegmentDs()->IsChangedElsewhere()) return false;
   if (!mGrid->IsDirty()) return true;
   Dstring name;
   ConditionList ignored;
@@ -334,11 +384,20 @@ void DataeditSegmentEditWin::closeEvent(QCloseEvent* event) {
   QWidget::closeEvent(event);
 }
 
+// A name the instrument no longer has (deleted by another client, or named by a sequence) opens
+// nothing: opening it would make a new, empty segment of that name.
 int DataeditSegmentEditWin::ShowSegment(const Dstring& name, ConditionList& list) {
   Dstring open;
   mGrid->GetSegmentName(0, 0, open, list);
   int status = 0;
-  if (open != name && ConfirmLeave("opening another")) status = OpenSegment(name, list);
+  bool available = true;
+  if (open != name) status = QenSegmentPool::IsAvailable(name, available, list);
+  if (status == 0 && !available) {
+    ConditionListLoader::ConditionToken(list, "GUI_SEGMENTDS_NOT_ON_INSTRUMENT", {name}, 1);
+    status = 1;
+    ReadCatalog(list);
+  }
+  if (status == 0 && open != name && ConfirmLeave("opening another")) status = OpenSegment(name, list);
   // The list marks the segment open now, whichever it is.
   MarkOpen();
   return status;
@@ -375,11 +434,8 @@ void DataeditSegmentEditWin::HitPButNew() {
 void DataeditSegmentEditWin::HitPButDelete() {
   QListWidgetItem* item = mSegments->currentItem();
   if (item == nullptr) return;
-  if (QMessageBox::question(this, QStringLiteral("Delete Segment"),
-                            QStringLiteral("Delete the segment \"%1\" from the instrument?").arg(item->text())) != QMessageBox::Yes) {
-    return;
-  }
   const Dstring name = item->text().toStdString();
+  if (Toolkit::Get().AskYesNo(DeleteQuestion(name)) != ToolkitPort::kYes) return;
   Run([this, &name](ConditionList& l) { return DeleteSegment(name, l); });
 }
 
@@ -482,4 +538,118 @@ void DataeditSegmentEditWin::HitGoto() {
   }
   Run([this, vector](ConditionList& l) { return mGrid->GoToVectorTrace(vector, mGrid->CursorTrace(), l); });
   mGrid->setFocus();
+}
+
+// --- Another client's change under digits typed here ----------------------------------------------
+
+void DataeditSegmentEditWin::AskChangedElsewhere() {
+  const QenSegmentDs* ds = mGrid->GetSegmentDs();
+  if (ds == nullptr || !ds->IsChangedElsewhere()) return;
+  Choice choice = AskChoice();
+  if (choice == Choice::kLookFirst) choice = AskAfterLooking();
+  Choose(choice);
+}
+
+DataeditSegmentEditWin::Choice DataeditSegmentEditWin::AskChoice() {
+  QMessageBox box(
+      QMessageBox::Warning, QStringLiteral("Segment Changed Elsewhere"),
+      QStringLiteral("Another client changed the segment \"%1\" while digits you typed here were not yet "
+                     "written. Writing them now would put your version of the vectors held here back over "
+                     "theirs.\n\nKeep Mine puts the digits you typed over their version and writes them. "
+                     "Take Theirs drops your digits and shows their version. Look First shows the vectors "
+                     "as they were, as you typed them and as the other client left them.")
+          .arg(QString::fromStdString(mGrid->GetSegmentDs()->GetName())),
+      QMessageBox::NoButton, this);
+  box.setObjectName(QStringLiteral("ChangedElsewhereQuestion"));
+  QPushButton* keep = box.addButton(QStringLiteral("Keep Mine"), QMessageBox::AcceptRole);
+  QPushButton* take = box.addButton(QStringLiteral("Take Theirs"), QMessageBox::DestructiveRole);
+  QPushButton* look = box.addButton(QStringLiteral("Look First"), QMessageBox::ActionRole);
+  keep->setObjectName(QStringLiteral("PButKeepMine"));
+  take->setObjectName(QStringLiteral("PButTakeTheirs"));
+  look->setObjectName(QStringLiteral("PButLookFirst"));
+  box.setDefaultButton(look);
+  box.setEscapeButton(look);
+  box.exec();
+  return box.clickedButton() == keep   ? Choice::kKeepMine
+         : box.clickedButton() == take ? Choice::kTakeTheirs
+                                       : Choice::kLookFirst;
+}
+
+DataeditSegmentEditWin::Choice DataeditSegmentEditWin::AskAfterLooking() {
+  QDialog dialog(this);
+  dialog.setObjectName(QStringLiteral("ChangedElsewhereCompare"));
+  dialog.setWindowTitle(QStringLiteral("Compare with Their Version"));
+  auto* layout = new QVBoxLayout(&dialog);
+  layout->addWidget(
+      new QLabel(QStringLiteral("The vectors held here that differ: as they were read, as you typed them "
+                                "and as the other client left them.")));
+  auto* table = new QPlainTextEdit(DifferencesText());
+  table->setObjectName(QStringLiteral("TextDifferences"));
+  table->setReadOnly(true);
+  table->setLineWrapMode(QPlainTextEdit::NoWrap);
+  table->setFont(QFontDatabase::systemFont(QFontDatabase::FixedFont));
+  table->setMinimumSize(520, 260);
+  layout->addWidget(table);
+  auto* buttons = new QDialogButtonBox;
+  QPushButton* keep = buttons->addButton(QStringLiteral("Keep Mine"), QDialogButtonBox::AcceptRole);
+  QPushButton* take = buttons->addButton(QStringLiteral("Take Theirs"), QDialogButtonBox::DestructiveRole);
+  QPushButton* later = buttons->addButton(QStringLiteral("Decide Later"), QDialogButtonBox::RejectRole);
+  keep->setObjectName(QStringLiteral("PButKeepMine"));
+  take->setObjectName(QStringLiteral("PButTakeTheirs"));
+  later->setObjectName(QStringLiteral("PButLater"));
+  layout->addWidget(buttons);
+  Choice choice = Choice::kLater;
+  connect(keep, &QPushButton::clicked, &dialog, [&] {
+    choice = Choice::kKeepMine;
+    dialog.accept();
+  });
+  connect(take, &QPushButton::clicked, &dialog, [&] {
+    choice = Choice::kTakeTheirs;
+    dialog.accept();
+  });
+  connect(later, &QPushButton::clicked, &dialog, &QDialog::reject);
+  dialog.exec();
+  return choice;
+}
+
+QString DataeditSegmentEditWin::DifferencesText() const {
+  constexpr std::size_t kShown = 500;
+  QenSegmentDs* ds = mGrid->GetSegmentDs();
+  std::vector<QenSegmentDs::Difference> differences;
+  ConditionList list;
+  if (ds == nullptr ||
+      ds->GetDifferences(static_cast<DataFormat>(mGrid->GetDataFormat(0)), differences, list) != 0) {
+    return QString::fromStdString(list.ToText()).trimmed();
+  }
+  int width = 8;
+  for (const auto& d : differences) width = std::max(width, static_cast<int>(d.before.size()) + 2);
+  const auto cell = [width](const QString& text) { return text.leftJustified(width); };
+  QString text = QStringLiteral("Vector    ") + cell(QStringLiteral("Before")) +
+                 cell(QStringLiteral("Yours")) + QStringLiteral("Theirs\n");
+  for (std::size_t i = 0; i < differences.size() && i < kShown; ++i) {
+    const auto& d = differences[i];
+    text += QString::number(d.vector).leftJustified(10) + cell(QString::fromStdString(d.before)) +
+            cell(QString::fromStdString(d.mine)) + QString::fromStdString(d.theirs) + QLatin1Char('\n');
+  }
+  if (differences.size() > kShown)
+    text += QStringLiteral("… and %1 more vectors\n").arg(differences.size() - kShown);
+  return text;
+}
+
+void DataeditSegmentEditWin::Choose(Choice choice) {
+  switch (choice) {
+    case Choice::kKeepMine:
+      Run([this](ConditionList& l) { return mGrid->GetSegmentDs()->KeepMine(l); });
+      break;
+    case Choice::kTakeTheirs:
+      Run([this](ConditionList& l) { return mGrid->GetSegmentDs()->TakeTheirs(l); });
+      break;
+    case Choice::kLookFirst:
+    case Choice::kLater:
+      mMessage->setText(
+          QStringLiteral("Another client changed this segment under your digits: nothing of yours is "
+                         "written until you choose in the Segment menu."));
+      ShowState();
+      break;
+  }
 }

@@ -2,6 +2,7 @@
 
 #include <QWidget>
 #include <functional>
+#include <memory>
 #include <vector>
 
 #include "segments/SegmentProperties.h"
@@ -12,6 +13,7 @@ class QComboBox;
 class QLabel;
 class QLineEdit;
 class QListWidget;
+class SegmentCatalogFollower;
 class SegmentGridManager;
 
 // The segment editor ("dataedit.SegmentEditWin"): the saved segments of the instrument on the
@@ -19,6 +21,11 @@ class SegmentGridManager;
 // one with its menus: the editing commands, each offered only while the grid says it is
 // possible, find, go to, the error vectors, save and save as. Refusals are shown in the error
 // dialog; what only concerns typing (a digit the format does not know) in the line below the grid.
+//
+// The list follows the instrument's catalogue within a poll. A segment another client changed
+// under digits typed here is not written over without a word: the window asks whether to keep
+// the digits, take the other client's version, or look at both first. A segment the sequence
+// plays is deleted only after a warning naming its blocks.
 class DataeditSegmentEditWin : public QWidget {
   Q_OBJECT
 
@@ -41,6 +48,18 @@ class DataeditSegmentEditWin : public QWidget {
   // Makes a segment of these properties and opens it.
   int CreateSegment(const SegmentProperties& properties, ConditionList& list);
   int DeleteSegment(const Dstring& name, ConditionList& list);
+  // The question to put before `name` is deleted: a warning naming the blocks of the sequence
+  // that play it, or the plain question.
+  static Dstring DeleteQuestion(const Dstring& name);
+
+  // What the user chose when another client changed the segment under digits typed here.
+  enum class Choice { kKeepMine, kTakeTheirs, kLookFirst, kLater };
+  // Asks, unless the segment is no longer changed elsewhere, and does what was chosen; "look
+  // first" shows the held vectors as they were, as typed and as the other client left them,
+  // and asks again. Later keeps everything as it is: the Segment menu offers the choice.
+  void AskChangedElsewhere();
+  // The table of differences shown by "look first".
+  QString DifferencesText() const;
 
  protected:
   // Edits not saved are saved, let go, or the window stays, as the user answers.
@@ -70,6 +89,11 @@ class DataeditSegmentEditWin : public QWidget {
   // The codings a segment can have, as the server spells them.
   static QStringList Codings();
   void HitGoto();
+  // Fills the list from the catalogue and marks the open segment.
+  void FillList();
+  Choice AskChoice();
+  Choice AskAfterLooking();
+  void Choose(Choice choice);
 
   SegmentGridManager* mGrid = nullptr;
   QListWidget* mSegments = nullptr;
@@ -80,4 +104,5 @@ class DataeditSegmentEditWin : public QWidget {
   QLabel* mCursor = nullptr;
   QLabel* mMessage = nullptr;
   std::vector<std::pair<QAction*, std::function<bool()>>> mOffered;
+  std::unique_ptr<SegmentCatalogFollower> mCatalog;
 };

@@ -9,7 +9,7 @@
 
 #include "core/uiapp.h"
 #include "params/ui/BoundControl.h"
-#include "segments/QenSegmentPool.h"
+#include "segments/SegmentCatalogFollower.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SequenceLoopRules.h"
@@ -103,6 +103,7 @@ int LoopGridEditWin::Load(ConditionList& list) {
   ConditionList ignored;
   if (SequenceLoopRules::ReadLargestCount(largest, ignored) == 0) mGrid->SetLargestCount(largest);
   mFollower->Follow(sequence);
+  mCatalog = std::make_unique<SegmentCatalogFollower>([this] { ShowSegments(); });
   int status = sequence->ReadSequence(list, 0);
   mGrid->SetSequence(sequence);
   if (int rc = FillSegments(list); status == 0) status = rc;
@@ -111,14 +112,18 @@ int LoopGridEditWin::Load(ConditionList& list) {
 }
 
 int LoopGridEditWin::FillSegments(ConditionList& list) {
-  std::vector<Dstring> names;
-  const int status = QenSegmentPool::Catalog(names, list);
+  const int status = mCatalog->Read(list);
+  ShowSegments();
+  return status;
+}
+
+void LoopGridEditWin::ShowSegments() {
+  if (!mCatalog->IsRead()) return;
   QStringList items;
-  for (const Dstring& name : names) items << QString::fromStdString(name);
+  for (const Dstring& name : mCatalog->GetNames()) items << QString::fromStdString(name);
   mSegments->clear();
   mSegments->addItems(items);
   mGrid->SetSegmentNames(items);
-  return status;
 }
 
 void LoopGridEditWin::ShowState() {
@@ -133,7 +138,7 @@ void LoopGridEditWin::ShowState() {
     cursor = QStringLiteral("Block %1. ").arg(mGrid->CursorBlock());
   }
   mState->setText(QStringLiteral("%1%2 %3, %4 loop levels (the top runs for ever). Marks: M measure, S sync, "
-                                 "T trigger, R reactions.")
+                                 "T trigger, R reactions; a segment in red is not on the instrument.")
                       .arg(cursor)
                       .arg(blocks)
                       .arg(blocks == 1 ? QStringLiteral("block") : QStringLiteral("blocks"))

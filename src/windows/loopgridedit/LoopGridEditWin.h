@@ -9,6 +9,7 @@ class CSequence;
 class LoopGridManager;
 class QLabel;
 class QListWidget;
+class SegmentCatalogFollower;
 class SequenceFollower;
 
 // The loop grid editor ("LoopGridEdit.Win"): the loop grid of the one sequence, the list of the
@@ -28,7 +29,8 @@ class LoopGridEditWin : public QWidget {
   static CSequence* GetSequence();
   LoopGridManager* Grid() const { return mGrid; }
   QListWidget* Segments() const { return mSegments; }
-  // Reads the instrument's catalogue of segments into the list and the cell editor.
+  // Reads the instrument's catalogue of segments into the list and the grid (which marks a
+  // port naming a segment the instrument does not have); the list follows it within a poll.
   int FillSegments(ConditionList& list);
 
  private:
@@ -37,9 +39,11 @@ class LoopGridEditWin : public QWidget {
   void HitPButOpenSegment(unsigned long block, unsigned long port);
   void HitPButEvents(unsigned long block);
   void HitSegmentDoubleClicked();
+  void ShowSegments();
 
   LoopGridManager* mGrid = nullptr;
   QListWidget* mSegments = nullptr;
   QLabel* mState = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
+  std::unique_ptr<SegmentCatalogFollower> mCatalog;
 };

@@ -1,11 +1,13 @@
 #include "windows/seqedit/SequenceWindows.h"
 
 #include "params/ui/BoundControl.h"
+#include "segments/QenSegmentPool.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SegmentPortInstanceInfo.h"
 #include "sequences/SequenceBlockInstanceInfo.h"
 #include "sequences/SequenceInstanceInfo.h"
+#include "support/ConditionListLoader.h"
 #include "windows/InstanceWindows.h"
 #include "windows/MainWin.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
@@ -61,12 +63,20 @@ QWidget* SequenceWindows::OpenSegment(QWidget* from, unsigned long block, unsign
   const CSequence* sequence = CPortInfo::GetSequence();
   if (sequence == nullptr || sequence->GetType(block, port) != CSequence::SEG_NAMED) return nullptr;
   const Dstring name = sequence->GetSegment(block, port);
+  // A name the instrument does not have opens no window: it would make a new, empty segment.
+  ConditionList list;
+  bool available = false;
+  const int status = QenSegmentPool::IsAvailable(name, available, list);
+  if (status != 0 || !available) {
+    if (status == 0) ConditionListLoader::ConditionToken(list, "GUI_SEGMENTDS_NOT_ON_INSTRUMENT", {name}, 1);
+    BoundControl::Report(list);
+    return nullptr;
+  }
   const SegmentPortInstanceInfo info("PDAT", port, name);
   auto* editor = qobject_cast<DataeditSegmentEditWin*>(
       Open<DataeditSegmentEditWin>(from, "dataedit.SegmentEditWin", info,
                                    QStringLiteral("Segment Editor - %1").arg(QString::fromStdString(name))));
   if (editor == nullptr) return nullptr;
-  ConditionList list;
   editor->ShowSegment(name, list);
   BoundControl::Report(list);
   return editor;

@@ -8,6 +8,7 @@
 #include <QTableWidget>
 
 #include "params/ui/BoundControl.h"
+#include "segments/SegmentCatalogFollower.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
@@ -57,7 +58,9 @@ int SmseqeditWin::Load(ConditionList& list) {
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   mFollower->Follow(GetSequence());
   mUndo = std::make_unique<SequenceUndo>(*GetSequence());
-  const int status = GetSequence()->ReadSequence(list, 0);
+  mCatalog = std::make_unique<SegmentCatalogFollower>([this] { Rebuild(); });
+  int status = GetSequence()->ReadSequence(list, 0);
+  if (int read = mCatalog->Read(list); status == 0) status = read;
   Rebuild();
   return status;
 }
@@ -103,6 +106,10 @@ void SmseqeditWin::Rebuild() {
       }
       item->setText(texts[c]);
       item->setFlags(editable ? item->flags() | Qt::ItemIsEditable : item->flags() & ~Qt::ItemIsEditable);
+      const bool missing =
+          c >= kFirstPortColumn && IsMissing(b, static_cast<unsigned long>(c - kFirstPortColumn + 1));
+      item->setForeground(missing ? QBrush(Qt::red) : QBrush());
+      item->setToolTip(missing ? QStringLiteral("The instrument has no segment of this name.") : QString());
     }
   }
   if (mTable->rowCount() > 0) {
@@ -201,6 +208,11 @@ void SmseqeditWin::AddBlockActions() {
     });
   }
   mTable->setContextMenuPolicy(Qt::ActionsContextMenu);
+}
+
+bool SmseqeditWin::IsMissing(unsigned long block, unsigned long port) const {
+  if (mCatalog == nullptr || GetSequence()->GetType(block, port) != CSequence::SEG_NAMED) return false;
+  return mCatalog->IsMissing(GetSequence()->GetSegment(block, port));
 }
 
 Dstring SmseqeditWin::CurrentSegment() const {

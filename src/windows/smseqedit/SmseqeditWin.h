@@ -9,6 +9,7 @@
 #include "support/Dstring.h"
 
 class CSequence;
+class SegmentCatalogFollower;
 class SequenceFollower;
 class SequenceUndo;
 class QLabel;
@@ -19,7 +20,8 @@ class QTableWidget;
 // with its label, its length and the segment of every port. Each change is an edit of the one
 // sequence model, written to the instrument and read back; a refusal is shown and the table
 // shows what the instrument holds. A change by another client reaches the table through the
-// model's reports. A sequence with loops is shown but not changed here.
+// model's reports. A sequence with loops is shown but not changed here. A port naming a segment
+// the instrument does not have (the catalogue, followed within a poll) is drawn in red.
 class SmseqeditWin : public QWidget {
   Q_OBJECT
 
@@ -36,6 +38,8 @@ class SmseqeditWin : public QWidget {
   Dstring CurrentSegment() const;
   // Fills the table from the model again.
   void Rebuild();
+  // Whether the port of the block names a segment the instrument does not have.
+  bool IsMissing(unsigned long block, unsigned long port) const;
 
   // Takes back the last step of this window (Ctrl+Z), or does it again (Ctrl+Shift+Z). Steps
   // are forgotten when another client changes the sequence.
@@ -65,4 +69,5 @@ class SmseqeditWin : public QWidget {
   std::unique_ptr<SequenceFollower> mFollower;
   bool mFilling = false;
   std::unique_ptr<SequenceUndo> mUndo;
+  std::unique_ptr<SegmentCatalogFollower> mCatalog;
 };
