@@ -98,6 +98,9 @@ int RunSession(const HostOptions& options, bool& reconnect) {
   auto window = std::make_unique<MainWin>();
   window->Attach();
   if (!options.screenshot.empty()) return Screenshot(*window, options);
+  // The first poll reads every state: nothing marks them changed when the start keeps what
+  // the instrument holds.
+  uiapp::GetDirtyFlagDs()->ForceUpdate();
   uiapp::StartPolling();
   window->show();
   // Where most work starts; the frame is never empty on a first run.

@@ -225,7 +225,8 @@ TEST_F(MainWinTest, ALockTurnsOffWhatWouldChangeTheInstrumentAndKeepsWhatOnlyRea
   };
   const Expected commands[] = {
       {"New Setting", false},   {"Open Setting...", false},   {"Recent Settings", false},
-      {"Save Setting", false},  {"Save Setting As...", false}, {"Quit", true},
+      {"Save Setting", false},  {"Save Setting As...", false}, {"Export Setting...", false},
+      {"Import Setting...", false}, {"Quit", true},
       {"\u25B6 Run", false},    {"\u25A0 Stop", false},        {"Sequence Force", false},
       {"Outputs On", false},    {"Outputs Off", false},       {"Check Trigger Mode", false},
       {"Self Test...", false},  {"Parameter Editor", true},   {"Segment Editor", false},
