@@ -15,6 +15,7 @@
 #include "common/gui/GuiSimFixture.h"
 #include "core/uiapp.h"
 #include "data/BerSvr.h"
+#include "data/RunStopDs.h"
 #include "support/NumberText.h"
 #include "windows/StateStatusBar.h"
 #include "windows/ber/BerBerWin.h"
@@ -115,6 +116,8 @@ TEST_F(BerWinTest, TheTableAndTheStatusBarWriteRatiosAndCountsInOneForm) {
   bar.Attach();
   Other(mPort + ":INJ 1E-2");
   Other(":SGEN:GLOB:INIT:CONT ON");
+  // The counts an earlier run left are there from the start: wait for this run to be seen.
+  for (int i = 0; i < 200 && !uiapp::GetRunStopDs()->IsRunning(); ++i) Poll();
   PollUntilErrors();
   bar.ShowState();
   unsigned long long compared = 0;

@@ -21,10 +21,7 @@ class EditorKeysTest : public GuiSimFixture {
  protected:
   void SetUp() override {
     GuiSimFixture::SetUp();
-    mWin = std::make_unique<MainWin>();
-    mWin->Attach();
-    mWin->show();
-    QApplication::setActiveWindow(mWin.get());
+    mWin = ShowMainWin();
     Poll();
   }
   void TearDown() override {

@@ -66,10 +66,7 @@ class InstrumentWaitTest : public GuiSimFixture {
  protected:
   void SetUp() override {
     GuiSimFixture::SetUp();
-    mWin = std::make_unique<MainWin>();
-    mWin->Attach();
-    mWin->show();
-    QApplication::setActiveWindow(mWin.get());
+    mWin = ShowMainWin();
   }
   void TearDown() override {
     QCoreApplication::processEvents();

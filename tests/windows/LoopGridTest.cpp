@@ -44,11 +44,8 @@ class LoopGridTest : public GuiSimFixture {
     mInitial = initial;
     Other(":SGEN:GLOB:SEQ " + initial);
     Poll();
-    mMain = std::make_unique<MainWin>();
-    mMain->Attach();
+    mMain = ShowMainWin();
     mMain->resize(1400, 700);
-    mMain->show();
-    QApplication::setActiveWindow(mMain.get());
     mWin = qobject_cast<LoopGridEditWin*>(mMain->OpenWindow(QStringLiteral("LoopGridEdit.Win")));
     ASSERT_NE(mWin, nullptr) << (mAlerts.empty() ? "" : mAlerts.back()) << mList.ToText();
     mGrid = mWin->Grid();

@@ -65,10 +65,7 @@ class MainWinSettingTest : public GuiSimFixture {
     Other(":CGR1:PER 2E-9");
     Other(":CGR1:MOD1:CONN1:VOLT:AMPL 1");
     ASSERT_EQ(uiapp::GetOpenSettingDs()->Save("bench1", uiapp::GetSettingMRU(), mList), 0) << mList.ToText();
-    mWin = std::make_unique<MainWin>();
-    mWin->Attach();
-    mWin->show();
-    QApplication::setActiveWindow(mWin.get());
+    mWin = ShowMainWin();
     Poll();
   }
   void TearDown() override {

@@ -44,10 +44,7 @@ class MainWinTest : public GuiSimFixture {
     GuiSimFixture::SetUp();
     Other(":CGR1:MOD1:CONN2:VOLT:AMPL 1");
     Other(":CGR2:MOD1:CONN1:VOLT:AMPL 1");
-    mWin = std::make_unique<MainWin>();
-    mWin->Attach();
-    mWin->show();
-    QApplication::setActiveWindow(mWin.get());
+    mWin = ShowMainWin();
     Poll();
   }
   void TearDown() override {

@@ -21,9 +21,7 @@ class SelfTestTest : public GuiSimFixture {
  protected:
   void SetUp() override {
     GuiSimFixture::SetUp();
-    mWin = std::make_unique<MainWin>();
-    mWin->Attach();
-    mWin->show();
+    mWin = ShowMainWin();
     Poll();
   }
   void TearDown() override {

@@ -46,9 +46,7 @@ class SettingFileWinTest : public GuiSimFixture {
       mTitles << title;
       return QString::fromStdString(mPath);
     });
-    mWin = std::make_unique<MainWin>();
-    mWin->Attach();
-    mWin->show();
+    mWin = ShowMainWin();
     Poll();
   }
   void TearDown() override {

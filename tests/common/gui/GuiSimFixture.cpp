@@ -14,6 +14,7 @@
 #include "segments/QenSegmentPool.h"
 #include "segments/SegmentProperties.h"
 #include "windows/GridClasses.h"
+#include "windows/MainWin.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/WidgetClassTable.h"
 
@@ -103,4 +104,12 @@ void GuiSimFixture::Poll() {
   uiapp::AsyncAlarmProc(nullptr);
   if (uiapp::IsSyncAlarmPending()) uiapp::SyncTimeOut();
   QCoreApplication::processEvents();
+}
+
+std::unique_ptr<MainWin> GuiSimFixture::ShowMainWin() {
+  auto win = std::make_unique<MainWin>();
+  win->Attach();
+  win->show();
+  QApplication::setActiveWindow(win.get());
+  return win;
 }

@@ -10,6 +10,8 @@
 #include "support/ConditionList.h"
 #include "toolkit/qt/QtToolkit.h"
 
+class MainWin;
+
 // The whole library started on Qt (offscreen) against a private qensim, as the window host
 // starts it, with alerts recorded instead of shown; a second client on its own connection
 // plays another user. One qensim serves a suite.
@@ -27,6 +29,8 @@ class GuiSimFixture : public testing::Test {
   void Control(const Dstring& cmd);
   // One tick of the poll as the alarm and then the main loop run it.
   void Poll();
+  // The frame as the window host shows it: attached to the state sources, shown and active.
+  static std::unique_ptr<MainWin> ShowMainWin();
   // A saved segment of coding "01" on the instrument, made through the segment pool.
   void MakeSegment(const Dstring& name, long length, long width);
 
