@@ -1,3 +1,9 @@
 #include "params/ui/LbUnitEd.h"
 
-LbUnitEd::LbUnitEd(QWidget* parent) : UnitLabel("lbundlg") { setParent(parent); }
+#include "params/ui/LbUnitsdlgUnitsDialog.h"
+
+LbUnitEd::LbUnitEd(QWidget* parent) { setParent(parent); }
+
+unsigned LbUnitEd::ProcessUnitsDialog(UnitsRecord& units, ConditionList& list) {
+  return RunUnitsDialog<LbUnitsdlgUnitsDialog, LbUnitsData>(units, list);
+}

@@ -8,4 +8,7 @@ class LbUnitEd : public UnitLabel {
 
  public:
   explicit LbUnitEd(QWidget* parent = nullptr);
+
+ protected:
+  unsigned ProcessUnitsDialog(UnitsRecord& units, ConditionList& list) override;
 };

@@ -1,3 +1,9 @@
 #include "params/ui/UnitEd.h"
 
-UnitEd::UnitEd(QWidget* parent) : UnitLabel("unitsdlg") { setParent(parent); }
+#include "params/ui/UnitsdlgUnitsDialog.h"
+
+UnitEd::UnitEd(QWidget* parent) { setParent(parent); }
+
+unsigned UnitEd::ProcessUnitsDialog(UnitsRecord& units, ConditionList& list) {
+  return RunUnitsDialog<UnitsdlgUnitsDialog, UnitsData>(units, list);
+}

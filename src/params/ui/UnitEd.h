@@ -8,4 +8,7 @@ class UnitEd : public UnitLabel {
 
  public:
   explicit UnitEd(QWidget* parent = nullptr);
+
+ protected:
+  unsigned ProcessUnitsDialog(UnitsRecord& units, ConditionList& list) override;
 };

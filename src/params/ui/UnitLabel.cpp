@@ -8,11 +8,9 @@
 #include "instrument/QenStatus.h"
 #include "params/UnitMenu.h"
 #include "params/ui/QenParField.h"
-#include "params/ui/UnitsDialog.h"
 #include "support/FWBlocker.h"
-#include "toolkit/WaitCursor.h"
 
-UnitLabel::UnitLabel(const char* dialogLibrary) : mDialogLibrary(dialogLibrary) {
+UnitLabel::UnitLabel() {
   setObjectName(QStringLiteral("UnitLabel"));
   setMinimumWidth(fontMetrics().horizontalAdvance(QStringLiteral("MHz")) + 6);
   setToolTip(QStringLiteral("Click for the units dialog; right-click for prefix and step"));
@@ -52,12 +50,7 @@ void UnitLabel::NfyItemHit(int item) {
   FWBlocker blocker("UnitEd::NfyItemHit", list);
   if (blocker.Block() != 0) return;
   UnitsRecord copy = Units();
-  unsigned result = 1;
-  {
-    WaitCursor wait;
-    UnitsDialog dialog(mDialogLibrary, window());
-    result = dialog.LoadProcess(&copy, list);
-  }
+  const unsigned result = ProcessUnitsDialog(copy, list);
   if (result == 0 && copy != Units()) SendUnits(copy, list);
   BoundControl::Report(list);
 }

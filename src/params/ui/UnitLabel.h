@@ -4,6 +4,7 @@
 
 #include "params/UnitsRecord.h"
 #include "support/ConditionList.h"
+#include "toolkit/WaitCursor.h"
 
 class QenParField;
 class QMenu;
@@ -35,7 +36,23 @@ class UnitLabel : public QLabel {
   bool IsHighlighted() const { return mHighlighted; }
 
  protected:
-  explicit UnitLabel(const char* dialogLibrary);
+  UnitLabel();
+  // Runs this label's own units dialog over `units`; 0 when ended with OK.
+  virtual unsigned ProcessUnitsDialog(UnitsRecord& units, ConditionList& list) = 0;
+  // The dialog class and record type of one of the two names, over a copy of `units`.
+  template <class Dialog, class Record>
+  unsigned RunUnitsDialog(UnitsRecord& units, ConditionList& list) {
+    Record record;
+    static_cast<UnitsRecord&>(record) = units;
+    unsigned result = 1;
+    {
+      WaitCursor wait;
+      Dialog dialog(window());
+      result = dialog.LoadProcess(&record, list);
+    }
+    units = record;
+    return result;
+  }
   void mousePressEvent(QMouseEvent* event) override;
   void mouseMoveEvent(QMouseEvent* event) override;
   void mouseReleaseEvent(QMouseEvent* event) override;
@@ -45,7 +62,6 @@ class UnitLabel : public QLabel {
   void SetHighlighted(bool on);
   const UnitsRecord& Units() const;
 
-  const char* mDialogLibrary;
   QenParField* mField = nullptr;
   int mItemNumber = 300;
   bool mTracking = false;

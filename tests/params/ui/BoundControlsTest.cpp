@@ -25,6 +25,7 @@
 #include "params/ui/QenParLb.h"
 #include "params/ui/UnitLabel.h"
 #include "params/ui/UnitsDialog.h"
+#include "params/ui/UnitsdlgUnitsDialog.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "toolkit/qt/StatusNotice.h"
 #include "toolkit/qt/WidgetClassTable.h"
@@ -202,7 +203,7 @@ TEST_F(BoundControlsTest, PrefixFromTheMenuGoesToTheServerAndComesBack) {
 TEST_F(BoundControlsTest, UnitsDialogSetsPrefixAndStep) {
   auto* ampl = Find<QenParEd>("fieldAmpl");
   QTimer::singleShot(0, [] {
-    auto* dialog = qobject_cast<UnitsDialog*>(QApplication::activeModalWidget());
+    auto* dialog = qobject_cast<UnitsdlgUnitsDialog*>(QApplication::activeModalWidget());
     ASSERT_NE(dialog, nullptr);
     EXPECT_FALSE(dialog->findChild<QRadioButton*>("RButUnitKilo")->isVisibleTo(dialog));
     EXPECT_EQ(dialog->findChild<QRadioButton*>("RButUnitMilli")->text(), "mV");
