@@ -239,8 +239,12 @@ void HelpWindow::MarkWords() {
     }
   }
   mBrowser->setExtraSelections(marks);
-  if (!first.isNull()) {
-    mBrowser->setTextCursor(first);
-    mBrowser->ensureCursorVisible();
+  if (first.isNull()) {
+    QTextCursor at = mBrowser->textCursor();
+    at.clearSelection();
+    mBrowser->setTextCursor(at);
+    return;
   }
+  mBrowser->setTextCursor(first);
+  mBrowser->ensureCursorVisible();
 }

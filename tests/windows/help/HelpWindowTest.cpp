@@ -214,6 +214,7 @@ TEST_P(HelpSearchTest, ListsThePagesHoldingTheWordsAndMarksThem) {
   window.SearchField()->clear();
   EXPECT_FALSE(hits->isVisible());
   EXPECT_TRUE(window.Browser()->extraSelections().isEmpty());
+  EXPECT_FALSE(window.Browser()->textCursor().hasSelection());
 }
 
 INSTANTIATE_TEST_SUITE_P(Words, HelpSearchTest,
