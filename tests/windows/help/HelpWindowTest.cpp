@@ -2,7 +2,6 @@
 
 #include <algorithm>
 
-#include <QApplication>
 #include <QDir>
 #include <QFile>
 #include <QImage>
@@ -15,6 +14,7 @@
 #include <QTextList>
 #include <QToolButton>
 
+#include "common/gui/GuiSimFixture.h"
 #include "core/uiapp.h"
 #include "windows/help/HelpWindow.h"
 
@@ -64,13 +64,7 @@ QString PageOf(const QTextBrowser* browser) { return browser->source().path().se
 
 class HelpWindowTest : public testing::Test {
  protected:
-  static void SetUpTestSuite() {
-    static int argc = 1;
-    static char name[] = "test_windows_help";
-    static char* argv[] = {name, nullptr};
-    qputenv("QT_QPA_PLATFORM", "offscreen");
-    if (QApplication::instance() == nullptr) new QApplication(argc, argv);
-  }
+  static void SetUpTestSuite() { EnsureApplication(); }
 };
 
 // Shown in the browser as the reader follows it: each page is rendered, and each link reaches
