@@ -18,7 +18,8 @@ INSTALLED = [
     "share/applications/qengui.desktop",
     "share/icons/hicolor/scalable/apps/qengui.svg",
     "share/doc/qengui/README.md",
-    "share/doc/qengui/guide/windows.md",
+    "share/doc/qengui/guide/index.md",
+    "share/doc/qengui/images/loopgrid.png",
 ]
 
 
