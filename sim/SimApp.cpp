@@ -66,9 +66,19 @@ int SimApp::Run(const SimOptions& options) {
       server.ListenScpi(options.mBind, static_cast<unsigned short>(options.mScpiPort), list) != 0) {
     return Fail(list.ToText());
   }
+  if (options.mVxi11Port >= 0 &&
+      server.ListenVxi11(options.mBind, static_cast<unsigned short>(options.mVxi11Port), list) != 0) {
+    return Fail(list.ToText());
+  }
+  if (options.mPortMapperPort >= 0 &&
+      server.ListenPortMapper(options.mBind, static_cast<unsigned short>(options.mPortMapperPort), list) != 0) {
+    return Fail(list.ToText());
+  }
   SimServer::InstallSignalHandlers();
   std::printf("qensim listening on %s\n", server.GetEndpoint().c_str());
   if (options.mScpiPort >= 0) std::printf("qensim SCPI on %s\n", server.GetScpiEndpoint().c_str());
+  if (options.mVxi11Port >= 0) std::printf("qensim VXI-11 on %s\n", server.GetVxi11Endpoint().c_str());
+  if (options.mPortMapperPort >= 0) std::printf("qensim port mapper on %s\n", server.GetPortMapperEndpoint().c_str());
   std::fflush(stdout);
   return server.Run();
 }
