@@ -1,9 +1,11 @@
 """Scripts qensim through PyVISA (pyvisa-py backend) over VXI-11, and checks the RPC edges.
 
 Usage: pyvisa_vxi11_test.py QENSIM DATA_DIR SCRIPTING_DOC
-Runs the VXI-11 example of the scripting document exactly as written against a qensim that
-answers the port mapper on port 111 (where pyvisa-py asks); where 111 cannot be had, pyvisa-py
-is pointed at qensim's port mapper on a free port instead. Then speaks ONC RPC to qensim itself
+Runs the VXI-11 example of the scripting document exactly as written: first against a qensim
+that registered with a port mapper on port 111 (a stand-in for the machine's, where pyvisa-py
+asks), then against a qensim that answers the port mapper on 111 itself; where 111 cannot be
+had, the registration is not checked and pyvisa-py is pointed at qensim's port mapper on a free
+port instead. Then speaks ONC RPC to qensim itself
 to check what PyVISA does not reach: fragments, wrong programs, bad links, partial reads, the
 status byte and device clear. Exit code 0 on success.
 """
@@ -14,29 +16,110 @@ import socket
 import struct
 import subprocess
 import sys
+import threading
 
 from pyvisa_py.protocols import rpc
 
 CORE_PROG, CORE_VERS = 0x0607AF, 1
 
 
-def start_qensim(program, data_dir, mapper_port):
-    sim = subprocess.Popen([program, "--port", "0", "--vxi11-port", "0", "--portmap-port", str(mapper_port),
-                            "--quiet", "--data-dir", data_dir], stdout=subprocess.PIPE, stderr=subprocess.PIPE)
+def start_qensim(program, data_dir, *args, lines=3):
+    """qensim with the VXI-11 channel and `args`; (process, {line name: port}), or (None, why)."""
+    sim = subprocess.Popen([program, "--port", "0", "--vxi11-port", "0", "--quiet", "--data-dir", data_dir] + list(args),
+                           stdout=subprocess.PIPE, stderr=subprocess.PIPE)
     text = b""
-    while text.count(b"\n") < 3:
+    while text.count(b"\n") < lines:
         ready, _, _ = select.select([sim.stdout], [], [], 20)
         chunk = os.read(sim.stdout.fileno(), 4096) if ready else b""
         if not chunk:
             sim.kill()
             return None, sim.stderr.read().decode()
         text += chunk
-    lines = text.decode().splitlines()
     ports = {}
-    for line in lines[1:3]:
+    for line in text.decode().splitlines():
         name, _, endpoint = line.rpartition(" on ")
         ports[name] = int(endpoint.rsplit(":", 1)[1])
-    return (sim, ports["qensim VXI-11"], ports["qensim port mapper"]), ""
+    return sim, ports
+
+
+class FakePortMapper(threading.Thread):
+    """The machine's port mapper on 127.0.0.1:111: takes SET and UNSET, answers GETPORT."""
+
+    def __init__(self):
+        super().__init__(daemon=True)
+        self.listener = socket.create_server(("127.0.0.1", 111))
+        self.calls = []
+        self.ports = {}
+
+    def run(self):
+        while True:
+            try:
+                conn, _ = self.listener.accept()
+            except OSError:
+                return
+            with conn:
+                self.serve(conn)
+
+    def serve(self, conn):
+        while True:
+            mark = conn.recv(4, socket.MSG_WAITALL)
+            if len(mark) < 4:
+                return
+            record = conn.recv(struct.unpack(">I", mark)[0] & 0x7FFFFFFF, socket.MSG_WAITALL)
+            xid, _, _, _, _, proc = struct.unpack(">6I", record[:24])
+            prog, vers, prot, port = struct.unpack(">4I", record[40:56])
+            self.calls.append((proc, prog, vers, prot, port))
+            if proc == 1:
+                self.ports[(prog, vers, prot)] = port
+                result = 1
+            elif proc == 2:
+                result = 1 if self.ports.pop((prog, vers, prot), None) is not None else 0
+            else:
+                result = self.ports.get((prog, vers, prot), 0)
+            reply = struct.pack(">7I", xid, 1, 0, 0, 0, 0, result)
+            conn.sendall(struct.pack(">I", 0x80000000 | len(reply)) + reply)
+
+    def close(self):
+        # Shutting the listener down wakes the accept that a close alone would leave waiting.
+        self.listener.shutdown(socket.SHUT_RDWR)
+        self.listener.close()
+        self.join(5)
+
+
+def registration(program, data_dir, doc):
+    """qensim registers with the machine's port mapper, PyVISA finds it there, and the
+    registration goes at the end; with no port mapper, qensim says so and serves all the same."""
+    try:
+        mapper = FakePortMapper()
+    except OSError as e:
+        print("port 111 cannot be had (%s): the registration is not checked" % e)
+        return False
+    mapper.start()
+    try:
+        sim, ports = start_qensim(program, data_dir, lines=3)
+        check("qensim with a port mapper", sim is not None, True)
+        vxi11 = ports["qensim VXI-11"]
+        check("registered line", ports.get("qensim VXI-11 registered with the port mapper"), 111)
+        check("SET", mapper.calls, [(1, CORE_PROG, 1, 6, vxi11)])
+        try:
+            exec(compile(doc_example(doc), doc + " (VXI-11 example)", "exec"), {"__name__": "doc_example"})
+        finally:
+            sim.terminate()
+            sim.wait(10)
+        check("UNSET at the end", mapper.calls[-1], (2, CORE_PROG, 1, 6, vxi11))
+        check("nothing left registered", mapper.ports, {})
+    finally:
+        mapper.close()
+    sim, ports = start_qensim(program, data_dir, lines=2)
+    try:
+        check("qensim without a port mapper", sim is not None, True)
+        sim.terminate()
+        sim.wait(10)
+        check("says it is not registered", "is not registered with a port mapper on 127.0.0.1:111" in
+              sim.stderr.read().decode(), True)
+    finally:
+        sim.kill()
+    return True
 
 
 def check(what, got, expected):
@@ -168,22 +251,23 @@ def rpc_edges(vxi11_port, mapper_port):
 
 def main():
     program, data_dir, doc = sys.argv[1:4]
-    started, why = start_qensim(program, data_dir, 111)
-    exact = started is not None
+    registered = registration(program, data_dir, doc)
+    sim, ports = start_qensim(program, data_dir, "--portmap-port", "111")
+    exact = sim is not None
     if not exact:
-        started, why = start_qensim(program, data_dir, 0)
-        if started is None:
-            sys.exit("qensim did not start: " + why)
-        rpc.PMAP_PORT = started[2]
-    sim, vxi11_port, mapper_port = started
+        sim, ports = start_qensim(program, data_dir, "--portmap-port", "0")
+        if sim is None:
+            sys.exit("qensim did not start: " + ports)
+        rpc.PMAP_PORT = ports["qensim port mapper"]
     try:
         exec(compile(doc_example(doc), doc + " (VXI-11 example)", "exec"), {"__name__": "doc_example"})
-        rpc_edges(vxi11_port, mapper_port)
+        rpc_edges(ports["qensim VXI-11"], ports["qensim port mapper"])
     finally:
         sim.terminate()
         sim.wait(10)
-    print("PyVISA scripted qensim over VXI-11 (port mapper on %d, example %s)"
-          % (mapper_port, "as written" if exact else "with pyvisa-py pointed at it"))
+    print("PyVISA scripted qensim over VXI-11 (port mapper on %d, example %s; registration %s)"
+          % (ports["qensim port mapper"], "as written" if exact else "with pyvisa-py pointed at it",
+             "checked" if registered else "not checked"))
 
 
 if __name__ == "__main__":
