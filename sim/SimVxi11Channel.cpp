@@ -229,7 +229,14 @@ void SimVxi11Channel::Write(Link& link, std::uint32_t flags, std::string_view da
       continue;
     }
     Dstring reply;
-    if (mSession->Execute(message, reply)) link.responses.push_back(reply + "\n");
+    if (!mSession->Execute(message, reply)) continue;
+    link.responses.push_back(reply + "\n");
+    link.waiting += reply.size() + 1;
+    while ((link.waiting > kMaxWaiting || link.responses.size() > kMaxResponses) && link.responses.size() > 1) {
+      link.waiting -= link.responses.front().size();
+      link.responses.pop_front();
+      mSession->Interrupted();
+    }
   }
 }
 
@@ -253,5 +260,6 @@ void SimVxi11Channel::Read(Link& link, std::uint32_t requestSize, std::uint32_t 
   if (reason == 0) reason = kReasonRequestCount;
   results.Int(kNoError).Uint(reason).Opaque(std::string_view(response).substr(0, take));
   response.erase(0, take);
+  link.waiting -= take;
   if (response.empty()) link.responses.pop_front();
 }

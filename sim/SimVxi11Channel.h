@@ -30,6 +30,11 @@ class SimVxi11Channel {
   // The largest write the device takes in one call. Clients split longer messages and mark only
   // the last piece with END; some do so only when the pieces are this size.
   static constexpr std::uint32_t kMaxRecvSize = 1024;
+  // The responses a link keeps for device_read: room for the largest block a query answers,
+  // twice, in at most kMaxResponses. Beyond either the oldest go, each with -410 on the error
+  // queue.
+  static constexpr std::size_t kMaxWaiting = 2 * SimScpiReader::kMaxMessage;
+  static constexpr std::size_t kMaxResponses = 1024;
 
   // `vxi11Port` is what GETPORT answers for the device core program over TCP.
   SimVxi11Channel(Program program, SimCommandProcessor& processor, int connection, unsigned short vxi11Port)
@@ -46,6 +51,7 @@ class SimVxi11Channel {
   struct Link {
     SimScpiReader reader;
     std::deque<std::string> responses;
+    std::size_t waiting = 0;  // their bytes
   };
 
   // The reply to one call record; false when the record is not a call at all.

@@ -235,6 +235,18 @@ def rpc_edges(vxi11_port, mapper_port):
     check("clear keeps the status", stb(), (0, 0x04))
     write(b"SYST:ERR?")
     check("the error through VXI-11", read(100), (0, 0, 4, b'-222,"Data out of range"\n'))
+    # A link keeps 1024 responses; the oldest beyond them go, each with -410 queued.
+    for _ in range(7):
+        write(b"*OPC?\n" * 146, flags=0)
+    write(b"*OPC?\n*OPC?\n*OPC?")
+    kept = 0
+    while read(100) == (0, 0, 4, b"1\n"):
+        kept += 1
+    check("responses kept", kept, 1024)
+    write(b"SYST:ERR?")
+    check("interrupted query", read(100), (0, 0, 4, b'-410,"Query INTERRUPTED"\n'))
+    write(b"SYST:ERR?")
+    check("one interrupted query", read(100), (0, 0, 4, b'0,"No error"\n'))
     check("trigger not supported", core.call(CORE_PROG, 1, 14, struct.pack(">iiII", link, 0, 0, 0)),
           (0, struct.pack(">i", 8)))
     check("destroy_link", core.call(CORE_PROG, 1, 23, struct.pack(">i", link)), (0, struct.pack(">i", 0)))
@@ -249,6 +261,26 @@ def rpc_edges(vxi11_port, mapper_port):
     check("oversized record closes", core.sock.recv(1), b"")
 
 
+def long_block():
+    """A message longer than the device's largest write goes in pieces, the last with END."""
+    import pyvisa
+    rm = pyvisa.ResourceManager("@py")
+    inst = rm.open_resource("TCPIP::127.0.0.1::INSTR", read_termination="\n", timeout=5000)
+    try:
+        seg = int(inst.query('EDIT:SEGM:OPEN? "vxi11/block"'))
+        inst.write("EDIT:SEGM%d:PATT:MOD:INS 0,TRAC,BEF,8" % seg)
+        inst.write("EDIT:SEGM%d:PATT:MOD:INS 0,VECT,BEF,3000" % seg)
+        rows = bytes((7 * i + 10) % 256 for i in range(3000))  # holds line feeds and ';'
+        inst.write_binary_values("EDIT:SEGM%d:PATT:DATA 0,0,7,2999," % seg, rows, datatype="B", header_fmt="ieee")
+        back = inst.query_binary_values("EDIT:SEGM%d:PATT:DATA? 0,0,7,2999,BIN" % seg, datatype="B",
+                                        container=bytes, header_fmt="ieee")
+        check("3000 bytes written and read back", back, rows)
+        check("no error after the block", inst.query("SYST:ERR?"), '0,"No error"')
+    finally:
+        inst.close()
+        rm.close()
+
+
 def main():
     program, data_dir, doc = sys.argv[1:4]
     registered = registration(program, data_dir, doc)
@@ -261,6 +293,7 @@ def main():
         rpc.PMAP_PORT = ports["qensim port mapper"]
     try:
         exec(compile(doc_example(doc), doc + " (VXI-11 example)", "exec"), {"__name__": "doc_example"})
+        long_block()
         rpc_edges(ports["qensim VXI-11"], ports["qensim port mapper"])
     finally:
         sim.terminate()
