@@ -10,17 +10,23 @@
 #include "support/ConditionList.h"
 
 int ConsoleHost::Run() {
-  mOut << "Connected; application handle " << QenGuiInst::GetAppHandle() << ". Type help for help.\n";
+  if (mInteractive) mOut << "Connected; application handle " << QenGuiInst::GetAppHandle() << ". Type help for help.\n";
   std::string line;
-  while (mOut << "qen> " << std::flush, std::getline(mIn, line)) {
+  while ((!mInteractive || mOut << "qen> " << std::flush) && std::getline(mIn, line)) {
     if (!HandleLine(Dstring(line).Trimmed()) || InterruptWaiter::IsInterrupted()) break;
   }
-  mOut << "\n";
-  return InterruptWaiter::IsInterrupted() ? kInterruptedExitCode : 0;
+  if (mInteractive) mOut << "\n";
+  mOut << std::flush;
+  if (InterruptWaiter::IsInterrupted()) return kInterruptedExitCode;
+  return mFailed ? kCommandFailedExitCode : 0;
 }
 
 bool ConsoleHost::HandleLine(const Dstring& line) {
-  if (line.empty()) return true;
+  // A script's blank line still gets its line, so that outputs pair with inputs.
+  if (line.empty()) {
+    if (!mInteractive) mOut << "OK\n";
+    return true;
+  }
   if (line == "quit" || line == "exit") return false;
   if (line == "help") {
     PrintHelp();
@@ -32,16 +38,32 @@ bool ConsoleHost::HandleLine(const Dstring& line) {
   }
   Dstring reply;
   ConditionList list;
-  int status = QenGuiInst::Call(CommandText::ExpandHandle(line, QenGuiInst::GetAppHandle()), reply, list);
-  if (!reply.empty()) mOut << reply << "\n";
-  if (status != 0) mOut << "status " << status << "\n";
-  for (const auto& c : list) mOut << "error " << c.GetCode() << ": " << c.GetMessage() << "\n";
+  const int status = QenGuiInst::Call(CommandText::ExpandHandle(line, QenGuiInst::GetAppHandle()), reply, list);
+  if (status != 0 || !list.IsEmpty()) mFailed = true;
+  mOut << ResultLine(status, reply, list) << "\n";
   return true;
 }
 
+Dstring ConsoleHost::ResultLine(int status, const Dstring& reply, const ConditionList& list) {
+  if (status == 0 && list.IsEmpty()) return reply.empty() ? Dstring("OK") : reply;
+  Dstring line = "ERROR ";
+  if (list.IsEmpty()) return line + Dstring::Format("%d,\"Command failed\"", status);
+  bool first = true;
+  for (const auto& c : list) {
+    Dstring text;
+    for (char ch : c.GetMessage()) {
+      if (ch == '"') text += '"';
+      text += ch == '\n' ? ' ' : ch;
+    }
+    line += Dstring::Format("%s%ld,\"%s\"", first ? "" : ";", c.GetCode(), text.c_str());
+    first = false;
+  }
+  return line;
+}
+
 void ConsoleHost::PrintHelp() {
-  mOut << "Type a command of the instrument's language and press Enter; the reply and any errors\n"
-          "that the command queued are printed. Several commands may be joined with \";\".\n"
+  mOut << "Type a command of the instrument's language and press Enter: a write prints OK, a query\n"
+          "its reply, a failure ERROR code,\"text\". Several commands may be joined with \";\".\n"
           "  ::HEADER        the application handle is filled in: ::TRIG:MODE? sends :"
        << QenGuiInst::GetAppHandle()
        << ":TRIG:MODE?\n"

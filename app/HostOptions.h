@@ -8,14 +8,15 @@
 
 // The command line of the qengui host.
 struct HostOptions {
-  enum class Mode { Gui, Console, Headless, Help };
+  enum class Mode { Gui, Console, Headless, Help, Version };
+  static constexpr unsigned short kDefaultPort = 7130;
 
   Mode mode = Mode::Gui;
   bool simulate = false;
   // The GUI was given no server: it asks with the connect dialog.
   bool askServer = false;
   std::string host = "127.0.0.1";
-  unsigned short port = 7130;
+  unsigned short port = kDefaultPort;
   std::string resource = "QEN1";
   std::optional<std::string> logDir;
   std::optional<unsigned long> paramSet;
@@ -31,5 +32,6 @@ struct HostOptions {
 
   // Returns 0, or 1 with a condition naming the bad argument.
   static int Parse(const std::vector<std::string>& args, HostOptions& out, ConditionList& list);
-  static const char* Usage();
+  // Names every window --open takes, from the table the main window opens them by.
+  static std::string Usage();
 };

@@ -1,7 +1,9 @@
 #include <csignal>
+#include <cstdlib>
 #include <iostream>
 #include <memory>
 #include <string>
+#include <unistd.h>
 #include <vector>
 
 #include "ConsoleHost.h"
@@ -27,6 +29,15 @@ void PrintConditions(const ConditionList& list) {
   for (const auto& c : list) std::cerr << "qengui: " << c.GetCode() << ": " << c.GetMessage() << "\n";
 }
 
+// The window needs a display, or a platform chosen explicitly (offscreen, vnc, ...).
+bool HasDisplay() {
+  for (const char* name : {"QT_QPA_PLATFORM", "DISPLAY", "WAYLAND_DISPLAY"}) {
+    const char* value = std::getenv(name);
+    if (value != nullptr && *value != '\0') return true;
+  }
+  return false;
+}
+
 void OnStopSignal(int) {
   InterruptWaiter::Interrupt();
   HeadlessHost::RequestStop();
@@ -48,13 +59,19 @@ int RunConsole(const HostOptions& options) {
   InterruptWaiter waiter;
   QenGuiInst::Init();
   QenGuiInst::SetCallWaiter(&waiter);
+  // A script reads the death from the exit code: the command it sent did not run.
+  QenGuiInst::SetServerDeathHandler([](const Dstring& message) {
+    std::cerr << "qengui: " << message << std::endl;
+    QenGuiInst::RunBeforeServerDeathExit();
+    std::exit(1);
+  });
   if (HostConnection::Open(options.host, options.port, options.resource, list) != QenStatus::kOk) {
     PrintConditions(list);
     QenGuiInst::SetCallWaiter(nullptr);
     QenGuiInst::End();
     return 1;
   }
-  ConsoleHost console(std::cin, std::cout);
+  ConsoleHost console(std::cin, std::cout, isatty(STDIN_FILENO) != 0);
   int code = console.Run();
   AppHandle::Destroy(QenGuiInst::GetInstrument(), QenGuiInst::GetAppHandle(), list);
   QenGuiInst::DisconnectFromServer(list);
@@ -108,6 +125,15 @@ int main(int argc, char** argv) {
     std::cout << HostOptions::Usage();
     return 0;
   }
+  if (options.mode == HostOptions::Mode::Version) {
+    std::cout << "qengui " << QENGUI_VERSION << "\n";
+    return 0;
+  }
+  if (options.mode == HostOptions::Mode::Gui && options.screenshot.empty() && !HasDisplay()) {
+    std::cerr << "qengui: there is no display to show the window on (neither DISPLAY nor WAYLAND_DISPLAY is set);\n"
+                 "use --console, --headless or --screenshot FILE, or set QT_QPA_PLATFORM\n";
+    return 2;
+  }
   if (options.logDir) QenEnvironment::SetLogDirectory(Dstring(*options.logDir));
   if (options.paramSet) QenEnvironment::SetConfigParamSet(*options.paramSet);
   if (options.replyTimeout) QenInstrument::SetDefaultReplyTimeoutMs(static_cast<int>(*options.replyTimeout * 1000.0));
@@ -120,7 +146,8 @@ int main(int argc, char** argv) {
     }
     options.host = "127.0.0.1";
     options.port = sim.Port();
-    std::cout << "Started qensim on 127.0.0.1:" << options.port << std::endl;
+    // On the error stream: the console's output holds one line per input line and no more.
+    std::cerr << "Started qensim on 127.0.0.1:" << options.port << std::endl;
   }
   switch (options.mode) {
     case HostOptions::Mode::Headless: return RunHeadless(options);

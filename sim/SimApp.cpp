@@ -8,6 +8,7 @@
 
 #include "SimCommandProcessor.h"
 #include "SimConfigLoader.h"
+#include "SimPortMapperClient.h"
 #include "SimServer.h"
 #include "SimSteadyClock.h"
 
@@ -66,9 +67,34 @@ int SimApp::Run(const SimOptions& options) {
       server.ListenScpi(options.mBind, static_cast<unsigned short>(options.mScpiPort), list) != 0) {
     return Fail(list.ToText());
   }
+  if (options.mVxi11Port >= 0 &&
+      server.ListenVxi11(options.mBind, static_cast<unsigned short>(options.mVxi11Port), list) != 0) {
+    return Fail(list.ToText());
+  }
+  if (options.mPortMapperPort >= 0 &&
+      server.ListenPortMapper(options.mBind, static_cast<unsigned short>(options.mPortMapperPort), list) != 0) {
+    return Fail(list.ToText());
+  }
+  // Without a port mapper of its own, qensim asks the machine's to name the VXI-11 port.
+  const bool registering = options.mVxi11Port >= 0 && options.mPortMapperPort < 0;
+  Dstring why;
+  const bool registered = registering && SimPortMapperClient::Register(true, server.GetVxi11Port(), why);
+  if (registering && !registered) {
+    std::fprintf(stderr,
+                 "qensim: the VXI-11 port %u is not registered with a port mapper on 127.0.0.1:%u (%s); clients must "
+                 "be given it, or use --portmap-port\n",
+                 server.GetVxi11Port(), SimPortMapperClient::kPort, why.c_str());
+  }
   SimServer::InstallSignalHandlers();
   std::printf("qensim listening on %s\n", server.GetEndpoint().c_str());
   if (options.mScpiPort >= 0) std::printf("qensim SCPI on %s\n", server.GetScpiEndpoint().c_str());
+  if (options.mVxi11Port >= 0) std::printf("qensim VXI-11 on %s\n", server.GetVxi11Endpoint().c_str());
+  if (options.mPortMapperPort >= 0) std::printf("qensim port mapper on %s\n", server.GetPortMapperEndpoint().c_str());
+  if (registered) std::printf("qensim VXI-11 registered with the port mapper on 127.0.0.1:%u\n", SimPortMapperClient::kPort);
   std::fflush(stdout);
-  return server.Run();
+  const int code = server.Run();
+  if (registered && !SimPortMapperClient::Register(false, server.GetVxi11Port(), why)) {
+    std::fprintf(stderr, "qensim: the VXI-11 registration could not be taken back (%s)\n", why.c_str());
+  }
+  return code;
 }

@@ -26,7 +26,9 @@ bool SimConnection::Receive() {
     ssize_t n = recv(mFd, buf, sizeof buf, 0);
     if (n == 0) return false;
     if (n < 0) return WouldBlock();
-    if (mScpi) {
+    if (mRpc) {
+      mRpc->Feed(buf, static_cast<std::size_t>(n));
+    } else if (mScpi) {
       mScpiReader.Feed(buf, static_cast<std::size_t>(n));
     } else {
       mDecoder.Feed(buf, static_cast<std::size_t>(n));

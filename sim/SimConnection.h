@@ -6,6 +6,7 @@
 
 #include "SimScpiReader.h"
 #include "SimScpiSession.h"
+#include "SimVxi11Channel.h"
 #include "instrument/Frame.h"
 
 // One client socket of the server: the frames (or, on the SCPI port, the program messages)
@@ -24,6 +25,9 @@ class SimConnection {
   void SetScpi(std::unique_ptr<SimScpiSession> session) { mScpi = std::move(session); }
   SimScpiSession* Scpi() { return mScpi.get(); }
   SimScpiReader& ScpiReader() { return mScpiReader; }
+  // A VXI-11 or port mapper connection hands its bytes to its RPC channel.
+  void SetRpc(std::unique_ptr<SimVxi11Channel> channel) { mRpc = std::move(channel); }
+  SimVxi11Channel* Rpc() { return mRpc.get(); }
 
   // Reads what the socket has now into the decoder; false once the peer is gone.
   bool Receive();
@@ -46,6 +50,7 @@ class SimConnection {
   FrameDecoder mDecoder;
   SimScpiReader mScpiReader;
   std::unique_ptr<SimScpiSession> mScpi;
+  std::unique_ptr<SimVxi11Channel> mRpc;
   std::string mOut;
   std::size_t mSent = 0;
 };

@@ -32,6 +32,8 @@ class SimScpiSession {
   bool Execute(std::string_view message, Dstring& reply);
   // A message that did not fit the input buffer: -363 "Input buffer overrun".
   void Overrun() { Queue(-363, "Input buffer overrun"); }
+  // A response that was dropped before it was read: -410 "Query INTERRUPTED".
+  void Interrupted() { Queue(-410, "Query INTERRUPTED"); }
 
   const Dstring& GetHandle() const { return mHandle; }
   std::uint8_t StatusByte() const;

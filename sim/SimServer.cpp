@@ -12,6 +12,8 @@
 #include <csignal>
 #include <cstdio>
 #include <cstring>
+#include <iterator>
+#include <utility>
 
 #include "SimFrameFollower.h"
 
@@ -33,6 +35,14 @@ void SetOption(int fd, int level, int name) {
   setsockopt(fd, level, name, &on, sizeof on);
 }
 
+unsigned short PortOf(int fd) {
+  sockaddr_storage addr{};
+  socklen_t len = sizeof addr;
+  getsockname(fd, reinterpret_cast<sockaddr*>(&addr), &len);
+  if (addr.ss_family == AF_INET6) return ntohs(reinterpret_cast<sockaddr_in6*>(&addr)->sin6_port);
+  return ntohs(reinterpret_cast<sockaddr_in*>(&addr)->sin_port);
+}
+
 Dstring EndpointOf(int fd) {
   sockaddr_storage addr{};
   socklen_t len = sizeof addr;
@@ -52,7 +62,7 @@ Dstring EndpointOf(int fd) {
 }
 
 // A non-blocking listening socket on the address and port; -1 with a condition otherwise.
-int OpenListener(const Dstring& address, unsigned short port, ConditionList& list) {
+int OpenSocket(const Dstring& address, unsigned short port, ConditionList& list) {
   addrinfo hints{};
   hints.ai_family = AF_UNSPEC;
   hints.ai_socktype = SOCK_STREAM;
@@ -75,6 +85,14 @@ int OpenListener(const Dstring& address, unsigned short port, ConditionList& lis
   return fd;
 }
 
+// Opens `fd` and names its `endpoint`; 0, or 1 with a condition.
+int OpenListener(const Dstring& address, unsigned short port, ConditionList& list, int& fd, Dstring& endpoint) {
+  fd = OpenSocket(address, port, list);
+  if (fd < 0) return 1;
+  endpoint = EndpointOf(fd);
+  return 0;
+}
+
 }  // namespace
 
 SimServer::SimServer(SimCommandProcessor& processor, const SimClock& clock, bool quiet)
@@ -83,20 +101,26 @@ SimServer::SimServer(SimCommandProcessor& processor, const SimClock& clock, bool
 SimServer::~SimServer() {
   if (mListenFd >= 0) close(mListenFd);
   if (mScpiFd >= 0) close(mScpiFd);
+  if (mVxi11Fd >= 0) close(mVxi11Fd);
+  if (mPortMapperFd >= 0) close(mPortMapperFd);
 }
 
 int SimServer::Listen(const Dstring& address, unsigned short port, ConditionList& list) {
-  mListenFd = OpenListener(address, port, list);
-  if (mListenFd < 0) return 1;
-  mEndpoint = EndpointOf(mListenFd);
-  return 0;
+  return OpenListener(address, port, list, mListenFd, mEndpoint);
 }
 
 int SimServer::ListenScpi(const Dstring& address, unsigned short port, ConditionList& list) {
-  mScpiFd = OpenListener(address, port, list);
-  if (mScpiFd < 0) return 1;
-  mScpiEndpoint = EndpointOf(mScpiFd);
+  return OpenListener(address, port, list, mScpiFd, mScpiEndpoint);
+}
+
+int SimServer::ListenVxi11(const Dstring& address, unsigned short port, ConditionList& list) {
+  if (OpenListener(address, port, list, mVxi11Fd, mVxi11Endpoint) != 0) return 1;
+  mVxi11Port = PortOf(mVxi11Fd);
   return 0;
+}
+
+int SimServer::ListenPortMapper(const Dstring& address, unsigned short port, ConditionList& list) {
+  return OpenListener(address, port, list, mPortMapperFd, mPortMapperEndpoint);
 }
 
 void SimServer::InstallSignalHandlers() {
@@ -121,8 +145,11 @@ int SimServer::Run() {
   std::vector<pollfd> fds;
   std::vector<SimConnection*> polled;
   while (!gStop && !mDie) {
-    // The SCPI listener, when there is none, is a negative descriptor that poll passes over.
-    fds.assign({pollfd{mListenFd, POLLIN, 0}, pollfd{mScpiFd, POLLIN, 0}});
+    // A listener that is not open is a negative descriptor that poll passes over.
+    const std::pair<int, Kind> listeners[] = {
+        {mListenFd, Kind::Frames}, {mScpiFd, Kind::Scpi}, {mVxi11Fd, Kind::Vxi11}, {mPortMapperFd, Kind::PortMapper}};
+    fds.clear();
+    for (const auto& listener : listeners) fds.push_back(pollfd{listener.first, POLLIN, 0});
     polled.clear();
     for (auto& [id, c] : mConnections) {
       short events = c->Pending() < kMaxPendingOut && !c->IsInputEnded() ? POLLIN : 0;
@@ -137,16 +164,18 @@ int SimServer::Run() {
       Log(std::strerror(errno), 0);
       return 1;
     }
-    for (std::size_t i = 0; n > 0 && i < polled.size() && !mDie; ++i) Serve(*polled[i], fds[i + 2].revents);
-    if (n > 0 && (fds[0].revents & POLLIN)) Accept(mListenFd, false);
-    if (n > 0 && (fds[1].revents & POLLIN)) Accept(mScpiFd, true);
+    constexpr std::size_t kListeners = std::size(listeners);
+    for (std::size_t i = 0; n > 0 && i < polled.size() && !mDie; ++i) Serve(*polled[i], fds[i + kListeners].revents);
+    for (std::size_t i = 0; n > 0 && i < kListeners; ++i) {
+      if (fds[i].revents & POLLIN) Accept(listeners[i].first, listeners[i].second);
+    }
     FireTimers();
     Reap();
   }
   return 0;
 }
 
-void SimServer::Accept(int listenFd, bool scpi) {
+void SimServer::Accept(int listenFd, Kind kind) {
   while (true) {
     int fd = accept4(listenFd, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
     if (fd < 0) {
@@ -162,7 +191,11 @@ void SimServer::Accept(int listenFd, bool scpi) {
     SetOption(fd, SOL_SOCKET, SO_KEEPALIVE);
     int id = mNextId++;
     auto connection = std::make_unique<SimConnection>(fd, id);
-    if (scpi) connection->SetScpi(std::make_unique<SimScpiSession>(mProcessor, id));
+    if (kind == Kind::Scpi) connection->SetScpi(std::make_unique<SimScpiSession>(mProcessor, id));
+    if (kind == Kind::Vxi11 || kind == Kind::PortMapper) {
+      const auto program = kind == Kind::Vxi11 ? SimVxi11Channel::Program::DeviceCore : SimVxi11Channel::Program::PortMapper;
+      connection->SetRpc(std::make_unique<SimVxi11Channel>(program, mProcessor, id, mVxi11Port));
+    }
     mConnections.emplace(id, std::move(connection));
   }
 }
@@ -170,7 +203,9 @@ void SimServer::Accept(int listenFd, bool scpi) {
 void SimServer::Serve(SimConnection& connection, short events) {
   if (events & (POLLIN | POLLHUP | POLLERR)) {
     bool open = connection.Receive();
-    if (connection.Scpi()) {
+    if (connection.Rpc()) {
+      HandleRpc(connection);
+    } else if (connection.Scpi()) {
       HandleScpi(connection);
     } else {
       HandleFrames(connection);
@@ -226,6 +261,16 @@ void SimServer::HandleScpi(SimConnection& connection) {
     }
     Dstring reply;
     if (connection.Scpi()->Execute(message, reply)) connection.Queue(reply + "\n");
+  }
+}
+
+void SimServer::HandleRpc(SimConnection& connection) {
+  std::string out;
+  const bool inStep = connection.Rpc()->Serve(out);
+  connection.Queue(out);
+  if (!inStep) {
+    Log("RPC record too large or not a call, connection closed", connection.GetId());
+    connection.EndInput();
   }
 }
 

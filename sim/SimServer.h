@@ -26,6 +26,12 @@ class SimServer {
   // Opens the raw SCPI socket as well (newline-terminated messages); port 0 picks a free one.
   int ListenScpi(const Dstring& address, unsigned short port, ConditionList& list);
   const Dstring& GetScpiEndpoint() const { return mScpiEndpoint; }
+  // Opens the VXI-11 core channel (ONC RPC over TCP), and a port mapper that names its port.
+  int ListenVxi11(const Dstring& address, unsigned short port, ConditionList& list);
+  const Dstring& GetVxi11Endpoint() const { return mVxi11Endpoint; }
+  unsigned short GetVxi11Port() const { return mVxi11Port; }
+  int ListenPortMapper(const Dstring& address, unsigned short port, ConditionList& list);
+  const Dstring& GetPortMapperEndpoint() const { return mPortMapperEndpoint; }
 
   // SIGINT and SIGTERM make Run return; SIGPIPE is ignored. Call once, before Run.
   static void InstallSignalHandlers();
@@ -39,10 +45,12 @@ class SimServer {
     std::string bytes;
   };
 
-  void Accept(int listenFd, bool scpi);
+  enum class Kind { Frames, Scpi, Vxi11, PortMapper };
+  void Accept(int listenFd, Kind kind);
   void Serve(SimConnection& connection, short events);
   void HandleFrames(SimConnection& connection);
   void HandleScpi(SimConnection& connection);
+  void HandleRpc(SimConnection& connection);
   void FireTimers();
   // Closes the connections that are done (also those whose client finished sending and has
   // all its answers) and forgets the closed ones.
@@ -58,6 +66,11 @@ class SimServer {
   Dstring mEndpoint;
   int mScpiFd = -1;
   Dstring mScpiEndpoint;
+  int mVxi11Fd = -1;
+  Dstring mVxi11Endpoint;
+  unsigned short mVxi11Port = 0;
+  int mPortMapperFd = -1;
+  Dstring mPortMapperEndpoint;
   int mNextId = 1;
   bool mDie = false;
   std::map<int, std::unique_ptr<SimConnection>> mConnections;

@@ -2,6 +2,7 @@
 
 #include <csignal>
 #include <fstream>
+#include <regex>
 #include <sstream>
 #include <unistd.h>
 
@@ -44,8 +45,21 @@ constexpr int kPatience = 15000;
 
 }  // namespace
 
+// Every line of the output begins with the UTC time to the millisecond.
+bool EveryLineStamped(const std::string& output) {
+  static const std::regex kStamped(R"(\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{3}Z \S.*)");
+  std::istringstream lines(output);
+  std::string line;
+  int count = 0;
+  while (std::getline(lines, line)) {
+    if (!std::regex_match(line, kStamped)) return false;
+    ++count;
+  }
+  return count > 0;
+}
+
 TEST_F(HeadlessHostTest, ChangeByAnotherClientShowsUp) {
-  HostProcess host(Args({"--watch", ":TRIG:MODE", "--watch", ":CGR1:FREQ"}));
+  HostProcess host(Args({"--watch", "TRIG:MODE", "--watch", ":CGR1:FREQ"}));
   ASSERT_TRUE(host.WaitForOutput(":TRIG:MODE = SEQ\n", kPatience)) << host.Output();
   ASSERT_TRUE(host.WaitForOutput("run: OFF\n", kPatience)) << host.Output();
   ASSERT_EQ(Other(":" + mOtherHandle + ":TRIG:MODE CLOC"), 0);
@@ -58,15 +72,32 @@ TEST_F(HeadlessHostTest, ChangeByAnotherClientShowsUp) {
   EXPECT_TRUE(host.WaitForOutput("system: RUNN\n", kPatience)) << host.Output();
   host.Signal(SIGTERM);
   EXPECT_EQ(host.WaitForExit(kPatience), 0) << host.Output();
+  EXPECT_TRUE(EveryLineStamped(host.Output())) << host.Output();
 }
 
+TEST_F(HeadlessHostTest, UnknownWatchHeaderEndsWithCodeTwoNamingIt) {
+  HostProcess host(Args({"--watch", ":TRIG:MODE", "--watch", "CGR1:BOGUS"}));
+  EXPECT_EQ(host.WaitForExit(kPatience), 2) << host.Output();
+  EXPECT_NE(host.Output().find("--watch :CGR1:BOGUS: the instrument cannot read it (-113: Undefined header)"),
+            std::string::npos)
+      << host.Output();
+  EXPECT_EQ(host.Output().find("run:"), std::string::npos) << host.Output();
+}
+
+// While another client holds the instrument the counts cannot be read: the host says so
+// instead of printing zeros, and prints the counts again once the instrument is free.
 TEST_F(HeadlessHostTest, LockByAnotherClientLocksAndReleasesTheInterface) {
   HostProcess host(Args({}));
   ASSERT_TRUE(host.WaitForOutput("locked by another client: no\n", kPatience)) << host.Output();
+  ASSERT_TRUE(host.WaitForOutput("ber :CGR1:MOD3:CONN1:BER compared=", kPatience)) << host.Output();
   ASSERT_EQ(Other(":TEST:LOCK ON"), 0);
   EXPECT_TRUE(host.WaitForOutput("locked by another client: yes\n", kPatience)) << host.Output();
+  EXPECT_TRUE(host.WaitForOutput(" ber: not counted while another client holds the instrument\n", kPatience))
+      << host.Output();
+  const std::size_t locked = host.Output().size();
   ASSERT_EQ(Other(":TEST:LOCK OFF"), 0);
-  EXPECT_TRUE(host.WaitForOutput("locked by another client: no\n", kPatience)) << host.Output();
+  EXPECT_TRUE(host.WaitForOutput("locked by another client: no\n", kPatience, locked)) << host.Output();
+  EXPECT_TRUE(host.WaitForOutput("ber :CGR1:MOD3:CONN1:BER compared=", kPatience, locked)) << host.Output();
   EXPECT_EQ(host.Output().find("ERROR"), std::string::npos) << host.Output();
   host.Signal(SIGINT);
   EXPECT_EQ(host.WaitForExit(kPatience), 0);
@@ -105,7 +136,8 @@ TEST_F(HeadlessHostTest, CtrlCEndsTheHostAtOnceWhileTheInstrumentIsSlow) {
 }
 
 // Hosts that only look never load nor start a setting, whatever the start-up configuration of
-// the registry they share with the window host asks for.
+// the registry they share with the window host asks for: the setting and the sequence the
+// instrument holds are as before after each of them ran.
 TEST_F(HeadlessHostTest, LookingHostsLeaveTheInstrumentsSettingAlone) {
   FileRegistryStore registry("/tmp/qengui-test-config-" + std::to_string(::getpid()) + "/qengui/registry");
   QENRegistryProfile::SetStore(&registry);
@@ -114,19 +146,31 @@ TEST_F(HeadlessHostTest, LookingHostsLeaveTheInstrumentsSettingAlone) {
   ConditionList list;
   ASSERT_EQ(config.Write(0, list), 0) << list.ToText();
   QENRegistryProfile::SetStore(nullptr);
-  ASSERT_EQ(Other(":" + mOtherHandle + ":CGR1:PER 4E-9"), 0);
-  Dstring reply;
-  ASSERT_EQ(mOther.Call(":" + mOtherHandle + ":DFL?", reply), 0);
+  const std::string h = ":" + mOtherHandle;
+  ASSERT_EQ(Other(h + ":CGR1:PER 4E-9"), 0);
+  std::string ports;
+  for (int port = 0; port < 10; ++port) ports += ",PAUSE1,0,0";
+  ASSERT_EQ(Other(h + ":SGEN:GLOB:SEQ (3.0,\"kept\",(LOOP1,0,3,\"\",(BLOCK,0,64,0,\"\",()" + ports + ")))"), 0);
+  Dstring setting, sequence, reply;
+  ASSERT_EQ(mOther.Call(h + ":MMEM:SETT:DATA?", setting), 0);
+  ASSERT_EQ(mOther.Call(h + ":SGEN:GLOB:SEQ:DATA?", sequence), 0);
+  ASSERT_NE(sequence.find("kept"), Dstring::npos) << sequence;
+  ASSERT_EQ(mOther.Call(h + ":DFL?", reply), 0);
 
-  HostProcess headless(Args({"--seconds", "1"}));
-  EXPECT_EQ(headless.WaitForExit(kPatience), 0) << headless.Output();
   const std::string picture = mLogDir + ".png";
-  HostProcess shot({"--log-dir", mLogDir, "127.0.0.1:" + std::to_string(mSim.Port()), "--screenshot", picture});
-  EXPECT_EQ(shot.WaitForExit(60000), 0) << shot.Output();
+  const std::vector<std::vector<std::string>> hosts = {
+      Args({"--seconds", "1"}),
+      {"--log-dir", mLogDir, "--console", "127.0.0.1:" + std::to_string(mSim.Port())},
+      {"--log-dir", mLogDir, "127.0.0.1:" + std::to_string(mSim.Port()), "--screenshot", picture}};
+  for (const auto& args : hosts) {
+    HostProcess host(args, "::TRIG:MODE?\nquit\n");
+    EXPECT_EQ(host.WaitForExit(60000), 0) << host.Output();
+    ASSERT_EQ(mOther.Call(h + ":MMEM:SETT:DATA?", reply), 0);
+    EXPECT_EQ(reply, setting) << args[2];
+    ASSERT_EQ(mOther.Call(h + ":SGEN:GLOB:SEQ:DATA?", reply), 0);
+    EXPECT_EQ(reply, sequence) << args[2];
+    ASSERT_EQ(mOther.Call(h + ":DFL?", reply), 0);
+    EXPECT_EQ(reply.find("ALL"), Dstring::npos) << args[2] << ": " << reply;
+  }
   std::remove(picture.c_str());
-
-  ASSERT_EQ(mOther.Call(":" + mOtherHandle + ":CGR1:PER?", reply), 0);
-  EXPECT_EQ(reply, "4.000000000000E-09");
-  ASSERT_EQ(mOther.Call(":" + mOtherHandle + ":DFL?", reply), 0);
-  EXPECT_EQ(reply.find("ALL"), Dstring::npos) << reply;
 }

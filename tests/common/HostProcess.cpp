@@ -64,10 +64,10 @@ bool HostProcess::ReadSome(int timeoutMs) {
   return true;
 }
 
-bool HostProcess::WaitForOutput(const std::string& text, int timeoutMs) {
+bool HostProcess::WaitForOutput(const std::string& text, int timeoutMs, std::size_t from) {
   const auto deadline = std::chrono::steady_clock::now() + std::chrono::milliseconds(timeoutMs);
-  while (mOutput.find(text) == std::string::npos) {
-    if (std::chrono::steady_clock::now() >= deadline || !ReadSome(50)) return mOutput.find(text) != std::string::npos;
+  while (mOutput.find(text, from) == std::string::npos) {
+    if (std::chrono::steady_clock::now() >= deadline || !ReadSome(50)) return mOutput.find(text, from) != std::string::npos;
   }
   return true;
 }

@@ -13,8 +13,9 @@ class HostProcess {
   HostProcess(const HostProcess&) = delete;
   HostProcess& operator=(const HostProcess&) = delete;
 
-  // Reads until the output holds `text`; false after the time-out or when the host ended.
-  bool WaitForOutput(const std::string& text, int timeoutMs);
+  // Reads until the output holds `text` at or after `from`; false after the time-out or when
+  // the host ended.
+  bool WaitForOutput(const std::string& text, int timeoutMs, std::size_t from = 0);
   // Its exit code, or -1 after the time-out.
   int WaitForExit(int timeoutMs);
   void Signal(int signal);
