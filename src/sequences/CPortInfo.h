@@ -38,8 +38,8 @@ class CPortInfo {
 
   static void Init(DirtyFlagDs* dirtyFlag, ChangeProc onChange = nullptr, void* client = nullptr);
   static void End();
-  // The one sequence model, which the sequence service owns; kept here because windows and the
-  // rescue reach the sequence through the port information. Null outside that service's life.
+  // The one sequence model, forwarded from SequenceService, which owns it: the model is also
+  // known by this name. Null outside that service's life.
   static CSequence* GetSequence();
 
   // Asks the server for the configuration and takes it; calls the change procedure when a

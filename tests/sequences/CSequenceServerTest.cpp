@@ -145,6 +145,7 @@ TEST_F(ServerTest, TheDirtyFlagReachesTheSequenceAndThePortInformation) {
   CPortInfo::Init(dirty, &SequenceService::NfyPortInfo);
   SequenceService::Init(dirty, &CPortInfo::GetSequencePorts);
   CSequence& seq = *SequenceService::GetSequence();
+  EXPECT_EQ(CPortInfo::GetSequence(), &seq);
   RecordingObserver observer;
   seq.AddObserver(&observer);
   ASSERT_EQ(seq.ReadSequence(mList, 1), 0);
@@ -170,6 +171,7 @@ TEST_F(ServerTest, TheDirtyFlagReachesTheSequenceAndThePortInformation) {
   SequenceService::End();
   CPortInfo::End();
   EXPECT_EQ(SequenceService::GetSequence(), nullptr);
+  EXPECT_EQ(CPortInfo::GetSequence(), nullptr);
   EXPECT_EQ(dirty->NumViews(), 0u) << "End unregisters both";
   dirty->Release();
 }
