@@ -19,6 +19,7 @@
 #include "segments/ui/NameDisp.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
+#include "sequences/SequenceService.h"
 #include "sequences/ui/LoopGridManager.h"
 
 namespace {
@@ -71,7 +72,7 @@ class Rig {
     return rig;
   }
   SequenceStore& Store() { return *mStore; }
-  CSequence& Sequence() { return *CPortInfo::GetSequence(); }
+  CSequence& Sequence() { return *SequenceService::GetSequence(); }
 
   std::unique_ptr<LoopGridManager> MakeGrid() {
     auto grid = std::make_unique<LoopGridManager>();
@@ -103,6 +104,7 @@ class Rig {
     QenGuiInst::SetInstrument(std::move(store));
     QenGuiInst::SetAppHandle("_B");
     CPortInfo::Init(nullptr);
+    SequenceService::Init(nullptr, &CPortInfo::GetSequencePorts);
     CSequence::SetNumLoopLevels(3);
     ConditionList list;
     CPortInfo::SetConfiguration(SequenceStore::Configuration(), list);

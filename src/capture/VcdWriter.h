@@ -28,8 +28,4 @@ class VcdWriter {
   // GUI_EXPORT_FAILED when the file cannot be written.
   static int WriteFile(const CaptureData& data, const Dstring& scope, const Range& range, const Dstring& path,
                        ConditionList& list);
-  // The identifier of signal `index`: printable characters from "!".
-  static Dstring Identifier(std::size_t index);
-  // A module name of `scope` without blanks, colons or slashes; `fallback` when nothing is left.
-  static Dstring ScopeName(const Dstring& scope, const char* fallback);
 };

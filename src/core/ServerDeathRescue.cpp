@@ -8,8 +8,8 @@
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
 #include "segments/QenSegmentPool.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
+#include "sequences/SequenceService.h"
 #include "support/ConditionListLoader.h"
 #include "support/QenEnvironment.h"
 #include "toolkit/Toolkit.h"
@@ -67,7 +67,7 @@ void ServerDeathRescue::AtServerDeath() {
           {ds->GetName(), Dstring::Format("segment-%zu.txt", segments.size() + 1), std::move(held)});
     }
   }
-  const CSequence* sequence = CPortInfo::GetSequence();
+  const CSequence* sequence = SequenceService::GetSequence();
   const Dstring expression = sequence != nullptr ? sequence->GetLastExpression() : Dstring();
   if (segments.empty() && expression.empty()) return;
   const Dstring folder = NewFolder();
@@ -107,7 +107,7 @@ int ServerDeathRescue::OfferPutBack(ConditionList& list) {
       folder.Answer("kept", list);
       continue;
     }
-    const int status = folder.PutBack(*CPortInfo::GetSequence(), list);
+    const int status = folder.PutBack(*SequenceService::GetSequence(), list);
     if (status == QenStatus::kLocked) {
       ConditionListLoader::ConditionToken(list, "GUI_RESCUE_LOCKED", {}, status);
       return status;

@@ -21,6 +21,7 @@
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SegmentPoolSync.h"
+#include "sequences/SequenceService.h"
 #include "settings/OpenSettingDs.h"
 #include "settings/QENSettingProfile.h"
 #include "settings/SettingStartUp.h"
@@ -106,10 +107,11 @@ int uiapp::Init(ConditionList& list) {
                    mPLLStateDs, mDataPortOneLockDs, mConnectDs);
   mSystemStateDs->RegisterProc(&uiapp::NfyViewDataUpdatedSysState, nullptr);
   QenGuiInst::Init();
-  CPortInfo::Init(mDirtyFlagDs);
+  CPortInfo::Init(mDirtyFlagDs, &SequenceService::NfyPortInfo);
+  SequenceService::Init(mDirtyFlagDs, &CPortInfo::GetSequencePorts);
   Dte::Init(mDirtyFlagDs, mErrorMgr);
   QenSegmentPool::Init(mDirtyFlagDs);
-  CPortInfo::GetSequence()->SetSegmentSync(&gSegmentPoolSync);
+  SequenceService::GetSequence()->SetSegmentSync(&gSegmentPoolSync);
   QENSettingProfile::Init(mDirtyFlagDs);
   ServerDeathRescue::Install();
   return 0;
@@ -125,6 +127,7 @@ int uiapp::End(ConditionList& list) {
     DestroyAppHandle(handle, list);
   }
   ServerDeathRescue::Uninstall();
+  SequenceService::End();
   CPortInfo::End();
   CFrontendInfo::Invalidate();
   QenSegmentPool::End();
@@ -225,7 +228,7 @@ int uiapp::Disconnect(ConditionList& list) { return mConnectDs->Disconnect(list)
 int uiapp::Run(ConditionList& list) {
   FWBlocker guard("uiapp::Run", list);
   if (int status = guard.Block()) return status;
-  if (int status = CPortInfo::GetSequence()->SyncSegments(list)) return status;
+  if (int status = SequenceService::GetSequence()->SyncSegments(list)) return status;
   if (int status = MeasconfMeasMode::UpdateBeforeRun(list)) return status;
   return mRunStopDs->Run(list);
 }
@@ -248,7 +251,7 @@ void uiapp::NfyDelayedStop(void*) {
 int uiapp::SequenceForce(ConditionList& list) {
   FWBlocker guard("uiapp::SequenceForce", list);
   if (int status = guard.Block()) return status;
-  if (int status = CPortInfo::GetSequence()->SyncSegments(list)) return status;
+  if (int status = SequenceService::GetSequence()->SyncSegments(list)) return status;
   Dstring reply;
   return QenGuiInst::Call(Dstring::Format(":%s:SGEN:GLOB:SEQ:FORC", QenGuiInst::GetAppHandle().c_str()), reply, list);
 }
@@ -302,7 +305,7 @@ int uiapp::AfterLockReleased(ConditionList& list) {
   int levels = 0;
   if (!CSequence::IsNumLoopLevelsInitialized()) levels = CSequence::InitNumLoopLevels(list);
   // The other client may have changed the sequence: the next read must not take it as known.
-  CPortInfo::GetSequence()->ClearLastExpression();
+  SequenceService::GetSequence()->ClearLastExpression();
   mDirtyFlagDs->ForceUpdate();
   if (levels == 0 && !mBerSvr->IsInitialized()) mBerSvr->Init(list);
   return mGuiLockDs->UnLock(list);

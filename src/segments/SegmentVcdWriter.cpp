@@ -2,10 +2,10 @@
 
 #include <string>
 
-#include "capture/VcdWriter.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/SegmentTextFile.h"
 #include "support/ExportFile.h"
+#include "support/VcdText.h"
 
 namespace {
 
@@ -20,11 +20,13 @@ char VcdValue(char state) {
 int SegmentVcdWriter::Write(QenSegmentDs& ds, std::ostream& out, ConditionList& list) {
   long width = 0;
   if (int status = ds.GetWidth(width, list, true)) return status;
-  const Dstring errorId = VcdWriter::Identifier(static_cast<std::size_t>(width));
+  auto id = [](long t) { return VcdText::Identifier(static_cast<std::size_t>(t)); };
+  const Dstring errorId = id(width);
   out << "$version qengui segment $end\n$timescale 1 ns $end\n";
-  out << "$scope module " << VcdWriter::ScopeName(ds.GetName(), "segment") << " $end\n";
-  for (long t = 0; t < width; ++t) out << "$var wire 1 " << VcdWriter::Identifier(static_cast<std::size_t>(t)) << " t" << t << " $end\n";
-  out << "$var wire 1 " << errorId << " error $end\n$upscope $end\n$enddefinitions $end\n";
+  out << "$scope module " << VcdText::ScopeName(ds.GetName(), "segment") << " $end\n";
+  for (long t = 0; t < width; ++t) VcdText::Wire(out, id(t), Dstring::Format("t%ld", t));
+  VcdText::Wire(out, errorId, "error");
+  out << "$upscope $end\n$enddefinitions $end\n";
   // The values last written, '\0' before the first vector.
   std::string last(static_cast<std::size_t>(width) + 1, '\0');
   long end = 0;
@@ -48,14 +50,10 @@ int SegmentVcdWriter::Write(QenSegmentDs& ds, std::ostream& out, ConditionList& 
             char& before = last[static_cast<std::size_t>(t)];
             if (value == before) continue;
             before = value;
-            changes += value;
-            changes += t < width ? VcdWriter::Identifier(static_cast<std::size_t>(t)) : errorId;
-            changes += '\n';
+            VcdText::AddChange(changes, value, t < width ? id(t) : errorId);
           }
           if (changes.empty()) continue;
-          out << '#' << v << '\n';
-          if (v == 0) out << "$dumpvars\n" << changes << "$end\n";
-          else out << changes;
+          VcdText::Step(out, static_cast<unsigned long long>(v), changes, v == 0);
         }
         end = to;
         return 0;

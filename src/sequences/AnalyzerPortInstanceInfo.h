@@ -3,7 +3,7 @@
 #include "sequences/PortInstanceInfo.h"
 
 // A window that shows an analyser port on one of its displays; the display does not count for
-// equality.
+// equality, which is PortInstanceInfo's (the class name is compared first).
 class AnalyzerPortInstanceInfo : public PortInstanceInfo {
  public:
   AnalyzerPortInstanceInfo() = default;
@@ -13,7 +13,6 @@ class AnalyzerPortInstanceInfo : public PortInstanceInfo {
   explicit AnalyzerPortInstanceInfo(const LispList& list);
 
   const char* IsA() const override { return "AnalyzerPortInstanceInfo"; }
-  bool isEqual(const InstanceInfo* other) const override;
   std::unique_ptr<InstanceInfo> Clone() const override {
     return std::make_unique<AnalyzerPortInstanceInfo>(*this);
   }

@@ -2,13 +2,15 @@
 
 #include <cstddef>
 
-#include "sequences/CSequence.h"
+#include "sequences/SequenceTypes.h"
 #include "support/Dstring.h"
 #include "support/NodeArena.h"
 
+class CSequence;
+
 // One loop: it repeats the blocks start .. start + length - 1, which all point at it on its
 // level (1 = innermost). Owned by the sequence's loop list; blocks only point at it.
-class CSequence::CLoop {
+class SequenceTypes::CLoop {
  public:
   CLoop(CSequence* owner, unsigned long start, unsigned long length)
       : mOwner(owner), mStart(start), mLength(length) {}

@@ -2,13 +2,14 @@
 
 #include "data/DirtyFlagDs.h"
 #include "instrument/QenGuiInst.h"
-#include "sequences/CSequence.h"
+#include "sequences/SequenceService.h"
 #include "support/ConditionListLoader.h"
 #include "support/LispList.h"
 #include "support/ParserExpression.h"
 
-CSequence* CPortInfo::mSequence = nullptr;
 DirtyFlagDs* CPortInfo::mDirtyFlag = nullptr;
+CPortInfo::ChangeProc CPortInfo::mOnChange = nullptr;
+void* CPortInfo::mChangeClient = nullptr;
 bool CPortInfo::mKnown = false;
 bool CPortInfo::mUntold = false;
 Dstring CPortInfo::mMode;
@@ -25,26 +26,24 @@ bool Text(const LispList& e, Dstring& out) {
 
 }  // namespace
 
-void CPortInfo::Init(DirtyFlagDs* dirtyFlag) {
+void CPortInfo::Init(DirtyFlagDs* dirtyFlag, ChangeProc onChange, void* client) {
   End();
-  mSequence = new CSequence;
   mDirtyFlag = dirtyFlag;
-  if (mDirtyFlag) {
-    // The port information first: a changed configuration re-reads the sequence by force.
-    mDirtyFlag->RegisterProc(&CPortInfo::DirtyFlagProc, &CPortInfo::DirtyFlagMatch, nullptr);
-    mSequence->AttachDirtyFlag(mDirtyFlag);
-  }
+  mOnChange = onChange;
+  mChangeClient = client;
+  if (mDirtyFlag) mDirtyFlag->RegisterProc(&CPortInfo::DirtyFlagProc, &CPortInfo::DirtyFlagMatch, nullptr);
 }
 
 void CPortInfo::End() {
-  if (mSequence) mSequence->DetachDirtyFlag();
   if (mDirtyFlag) mDirtyFlag->UnregisterProc(&CPortInfo::DirtyFlagProc, &CPortInfo::DirtyFlagMatch, nullptr);
-  delete mSequence;
-  mSequence = nullptr;
   mDirtyFlag = nullptr;
-  CSequence::EndNumLoopLevels();
-  CSequence::ClearClipboard();
+  mOnChange = nullptr;
+  mChangeClient = nullptr;
   Invalidate();
+}
+
+CSequence* CPortInfo::GetSequence() {
+  return SequenceService::GetSequence();
 }
 
 int CPortInfo::Fetch(ConditionList& cond) {
@@ -58,7 +57,7 @@ int CPortInfo::Update(ConditionList& cond) {
   if (int status = Fetch(cond)) return status;
   if (!mUntold) return 0;
   mUntold = false;
-  return mSequence ? mSequence->NfyPortInfo(cond) : 0;
+  return mOnChange ? mOnChange(mChangeClient, cond) : 0;
 }
 
 int CPortInfo::SetConfiguration(const Dstring& reply, ConditionList& cond) {
@@ -141,4 +140,18 @@ int CPortInfo::DirtyFlagProc(QenDs*, void*, ConditionList& cond) {
 
 int CPortInfo::DirtyFlagMatch(QenDs*, void*, const Dstring& name) {
   return NfyMatchDirtyFlag(name) ? 1 : 0;
+}
+
+int CPortInfo::GetSequencePorts(SequencePorts::Ask ask, SequencePorts& out, ConditionList& cond) {
+  if (ask == SequencePorts::Ask::Server) {
+    if (int status = Fetch(cond)) return status;
+  }
+  out.central = ask == SequencePorts::Ask::IfUnknown ? HasCentral() : !mCentral.empty();
+  out.known = mKnown;
+  out.capture = mMode.StartsWith("CAPT");
+  out.dataPortTypes.clear();
+  for (const Port& port : mPorts) {
+    if (port.portClass == "PDAT") out.dataPortTypes.push_back(port.type);
+  }
+  return 0;
 }

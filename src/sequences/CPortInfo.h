@@ -2,6 +2,7 @@
 
 #include <vector>
 
+#include "sequences/SequencePorts.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
 
@@ -20,7 +21,8 @@ class QenDs;
 // "INPUT_PORT" for an analyser port) and module model, in configuration order. Port n of a
 // class is the n-th port of that class in that order; sequence port p is data port p.
 //
-// Static: Init creates the sequence and registers both on the dirty-flag source; End undoes it.
+// Static: Init registers on the dirty-flag source and takes the procedure told of a changed
+// configuration (the sequence service's); End undoes it.
 class CPortInfo {
  public:
   struct Port {
@@ -31,13 +33,17 @@ class CPortInfo {
     bool operator==(const Port&) const = default;
   };
 
-  static void Init(DirtyFlagDs* dirtyFlag);
-  static void End();
-  // The one sequence model; null outside Init .. End.
-  static CSequence* GetSequence() { return mSequence; }
+  // Told when a configuration known before has changed; `client` is handed back.
+  using ChangeProc = int (*)(void* client, ConditionList& cond);
 
-  // Asks the server for the configuration and takes it; tells the sequence (NfyPortInfo) when
-  // a configuration known before has changed since the sequence was last told.
+  static void Init(DirtyFlagDs* dirtyFlag, ChangeProc onChange = nullptr, void* client = nullptr);
+  static void End();
+  // The one sequence model, forwarded from SequenceService, which owns it: the model is also
+  // known by this name. Null outside that service's life.
+  static CSequence* GetSequence();
+
+  // Asks the server for the configuration and takes it; calls the change procedure when a
+  // configuration known before has changed since it was last called.
   static int Update(ConditionList& cond);
   // Takes a configuration reply without telling anyone (a change is told by the next Update);
   // "GUI_PORTINFO_BAD_CONFIGURATION" and status 1 when it cannot be read, leaving what was known.
@@ -60,6 +66,9 @@ class CPortInfo {
 
   static bool NfyMatchDirtyFlag(const Dstring& name);
 
+  // The configuration as the sequence needs it: a SequencePorts::Source.
+  static int GetSequencePorts(SequencePorts::Ask ask, SequencePorts& out, ConditionList& cond);
+
  private:
   static int DirtyFlagProc(QenDs* source, void* client, ConditionList& cond);
   static int DirtyFlagMatch(QenDs* source, void* client, const Dstring& name);
@@ -67,10 +76,11 @@ class CPortInfo {
   static int Fetch(ConditionList& cond);
   static const Port* FindPort(const Dstring& portClass, unsigned long port);
 
-  static CSequence* mSequence;
   static DirtyFlagDs* mDirtyFlag;
+  static ChangeProc mOnChange;
+  static void* mChangeClient;
   static bool mKnown;
-  static bool mUntold;  // changed since the sequence was last told
+  static bool mUntold;  // changed since the change procedure was last called
   static Dstring mMode;
   static Dstring mCentral;
   static std::vector<Port> mPorts;

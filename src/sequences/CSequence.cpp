@@ -10,7 +10,6 @@
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenStatus.h"
 #include "sequences/CLoop.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequenceAnalyzer.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/CSequenceObserver.h"
@@ -25,8 +24,6 @@
 #include "support/LispList.h"
 #include "support/ParserExpression.h"
 
-unsigned long CSequence::mNumLoopLevels = 0;
-bool CSequence::mIsNumLoopLevelsInitialized = false;
 std::unique_ptr<CSequence::CSequenceBlock> CSequence::mClipboard;
 
 namespace {
@@ -52,22 +49,6 @@ Dstring Command(const char* format) {
 }
 
 }  // namespace
-
-// --- Content ---------------------------------------------------------------------------------
-
-CSequence::Content::Content() {
-  blocks.reserve(64);
-  loops.reserve(64);
-}
-CSequence::Content::~Content() = default;
-CSequence::Content::Content(Content&&) noexcept = default;
-CSequence::Content& CSequence::Content::operator=(Content&&) noexcept = default;
-
-void CSequence::Content::Clear() {
-  blocks.clear();
-  loops.clear();
-  numPorts = 0;
-}
 
 // --- Life and wiring -------------------------------------------------------------------------
 
@@ -95,6 +76,13 @@ void CSequence::AttachDirtyFlag(DirtyFlagDs* dirtyFlag) {
 void CSequence::DetachDirtyFlag() {
   if (mDirtyFlag) mDirtyFlag->UnregisterProc(&CSequence::DirtyFlagProc, &CSequence::DirtyFlagMatch, this);
   mDirtyFlag = nullptr;
+}
+
+SequencePorts CSequence::Ports(SequencePorts::Ask ask) const {
+  SequencePorts ports;
+  ConditionList dropped;
+  if (mPortSource) mPortSource(ask, ports, dropped);
+  return ports;
 }
 
 // --- Reading ---------------------------------------------------------------------------------
@@ -311,14 +299,15 @@ unsigned long CSequence::IterationsFor(unsigned long level, unsigned long reques
 
 void CSequence::InsertBlock(unsigned long block, bool after, std::unique_ptr<CSequenceBlock> newBlock) {
   // An empty model takes its ports from the block given, else from the configuration known.
+  const SequencePorts ports = Ports(SequencePorts::Ask::Known);
   if (mContent.blocks.empty() && mContent.numPorts == 0) {
-    mContent.numPorts = newBlock ? newBlock->GetSegments().size() : CPortInfo::GetNumPorts("PDAT");
+    mContent.numPorts = newBlock ? newBlock->GetSegments().size() : ports.dataPortTypes.size();
   }
   if (!newBlock) {
     newBlock = std::make_unique<CSequenceBlock>();
     newBlock->SetLength(kDefaultBlockLength);
   }
-  newBlock->FitPorts(mContent.numPorts);
+  newBlock->FitPorts(mContent.numPorts, ports);
   CSequenceStructure::Insert(mContent, block, !after, std::move(newBlock));
 }
 
@@ -448,7 +437,7 @@ int CSequence::SetDefaultSegment(unsigned long block, unsigned long port, Condit
   return Edit("CSequence::SetDefaultSegment", cond, [&](bool&) {
     if (int status = CheckBlock(block, cond)) return status;
     if (int status = CheckPort(port, cond)) return status;
-    return MutableBlock(block)->SetDefaultSegment(port, cond);
+    return MutableBlock(block)->SetDefaultSegment(port, mPortSource, cond);
   });
 }
 
@@ -633,7 +622,7 @@ int CSequence::ClearBranchTable(unsigned long block, ConditionList& cond) {
 int CSequence::SetEvent(std::size_t index, const CSequenceEvents::Event& event, ConditionList& cond) {
   const CSequenceEvents before = mEvents;
   const int status = Edit("CSequence::SetEvent", cond, [&](bool&) {
-    if (!CPortInfo::HasCentral()) return Refuse(cond, "GUI_SEQUENCE_NO_EVENTS", {});
+    if (!HasCentral()) return Refuse(cond, "GUI_SEQUENCE_NO_EVENTS", {});
     if (index >= CSequenceEvents::kNumEvents) {
       return Refuse(cond, "GUI_SEQUENCE_NO_EVENT", {Number(index + 1), Number(CSequenceEvents::kNumEvents)});
     }
@@ -704,7 +693,7 @@ void CSequence::EndNumLoopLevels() {
 }
 
 int CSequence::ReadEvents(ConditionList& cond) {
-  if (!CPortInfo::HasCentral()) {
+  if (!HasCentral()) {
     mEvents.Reset();
     return 0;
   }
@@ -714,7 +703,7 @@ int CSequence::ReadEvents(ConditionList& cond) {
 }
 
 int CSequence::WriteEvents(ConditionList& cond) {
-  if (!CPortInfo::HasCentral()) return 0;
+  if (!HasCentral()) return 0;
   Dstring reply;
   return QenGuiInst::Call(Command(":%s:SGEN:GLOB:SEQ:EVEN ") + mEvents.BuildExpression(), reply, cond);
 }

@@ -4,6 +4,8 @@
 #include <vector>
 
 #include "sequences/CSequenceEvents.h"
+#include "sequences/SequenceContent.h"
+#include "sequences/SequencePorts.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
 
@@ -26,47 +28,8 @@ class SequenceSegmentSync;
 // Block, port and loop-level numbers count from 1 in every interface; reactions from 0.
 // Readers given a number out of range return the neutral value (0, "", LOOP_NONE); editors
 // refuse it with a condition and status 1. docs/sequences.md has the rules this class settles.
-class CSequence {
+class CSequence : public SequenceTypes {
  public:
-  class CSequenceBlock;  // CSequenceBlock.h
-  class CLoop;           // CLoop.h
-  using BlockList = std::vector<std::unique_ptr<CSequenceBlock>>;
-  using LoopList = std::vector<std::unique_ptr<CLoop>>;
-
-  // What an expression describes: the blocks (block n is blocks[n - 1]), the loops, which
-  // the blocks point at and this owns, and the number of ports of every block. The readers
-  // build one, the writer writes one, the change analysis compares two.
-  struct Content {
-    Content();
-    ~Content();
-    Content(Content&&) noexcept;
-    Content& operator=(Content&&) noexcept;
-    void Clear();
-
-    unsigned long numPorts = 0;
-    BlockList blocks;
-    LoopList loops;
-  };
-
-  // Segment kind of a port's item; a quoted name and any unknown keyword are SEG_NAMED.
-  enum SeqSegType : int {
-    SEG_NAMED = 0,
-    SEG_PAUSE = 1,
-    SEG_PAUSE0 = 2,
-    SEG_PAUSE1 = 3,
-    SEG_ACQUIRE = 4,
-    SEG_EXPECTED0 = 5,
-    SEG_EXPECTED1 = 6,
-    SEG_DONTCARE = 7,
-  };
-  enum LOOP_STATUS : int { LOOP_NONE = 0, LOOP_SINGLE = 1, LOOP_START = 2, LOOP_END = 3, LOOP_INSIDE = 4 };
-
-  // More levels than any instrument has; a reply or expression beyond it is refused.
-  static constexpr unsigned long kMaxLoopLevels = 16;
-  // The length of a block made by AddBlockBefore/AddBlockAfter (docs/sequences.md).
-  static constexpr unsigned long kDefaultBlockLength = 512;
-  static constexpr int kStatusError = 1;
-
   CSequence();
   virtual ~CSequence();
   CSequence(const CSequence&) = delete;
@@ -83,6 +46,9 @@ class CSequence {
   // and the reverse. Not owned.
   void AttachDirtyFlag(DirtyFlagDs* dirtyFlag);
   void DetachDirtyFlag();
+  // Where the sequence learns the system configuration; without one it knows no ports and no
+  // central module.
+  void SetPortSource(SequencePorts::Source source) { mPortSource = source; }
 
   // --- Reading ----------------------------------------------------------------------------
   unsigned long GetNumBlocks() const { return mContent.blocks.size(); }
@@ -118,8 +84,6 @@ class CSequence {
   bool IsBlockInLoop(unsigned long block, unsigned long level) const;
   unsigned long GetHighestLoopLevel(unsigned long block, unsigned long level) const;
 
-  static unsigned long GetNumLoopLevels() { return mNumLoopLevels; }
-  static bool IsNumLoopLevelsInitialized() { return mIsNumLoopLevelsInitialized; }
   // For hosts and tests that know the number without asking the server.
   static void SetNumLoopLevels(unsigned long levels);
   // Whether the class-wide block clipboard holds a block.
@@ -225,6 +189,9 @@ class CSequence {
   void RestoreLastExpression();
   int Parse(const Dstring& text, ConditionList& cond);
 
+  SequencePorts Ports(SequencePorts::Ask ask) const;
+  bool HasCentral() const { return Ports(SequencePorts::Ask::IfUnknown).central; }
+
   static int DirtyFlagProc(QenDs* source, void* client, ConditionList& cond);
   static int DirtyFlagMatch(QenDs* source, void* client, const Dstring& name);
 
@@ -236,8 +203,7 @@ class CSequence {
   std::vector<CSequenceObserver*> mObservers;
   SequenceSegmentSync* mSegmentSync = nullptr;
   DirtyFlagDs* mDirtyFlag = nullptr;
+  SequencePorts::Source mPortSource = nullptr;
 
-  static unsigned long mNumLoopLevels;
-  static bool mIsNumLoopLevelsInitialized;
   static std::unique_ptr<CSequenceBlock> mClipboard;
 };

@@ -11,8 +11,8 @@
 
 namespace {
 
-using Block = CSequence::CSequenceBlock;
-using Loop = CSequence::CLoop;
+using Block = SequenceTypes::CSequenceBlock;
+using Loop = SequenceTypes::CLoop;
 constexpr unsigned long kGone = static_cast<unsigned long>(-1);
 
 }  // namespace
@@ -31,7 +31,7 @@ int CSequenceAnalyzer::Refresh() {
   return TellAll([&](CSequenceObserver& o) { return o.NfySequence(mCond); });
 }
 
-int CSequenceAnalyzer::Analyze(const CSequence::Content& old, const CSequence::Content& now) {
+int CSequenceAnalyzer::Analyze(const SequenceTypes::Content& old, const SequenceTypes::Content& now) {
   if (old.blocks.empty() || old.numPorts != now.numPorts) return Refresh();
   std::vector<Op> ops;
   if (!Script(old, now, ops)) return Refresh();
@@ -39,7 +39,7 @@ int CSequenceAnalyzer::Analyze(const CSequence::Content& old, const CSequence::C
   return ReportLoops(old, now, ops);
 }
 
-bool CSequenceAnalyzer::Script(const CSequence::Content& old, const CSequence::Content& now,
+bool CSequenceAnalyzer::Script(const SequenceTypes::Content& old, const SequenceTypes::Content& now,
                                std::vector<Op>& ops) const {
   const auto same = [&](std::size_t i, std::size_t j) { return old.blocks[i]->SameContent(*now.blocks[j]); };
   const std::size_t m = old.blocks.size(), n = now.blocks.size();
@@ -85,7 +85,7 @@ bool CSequenceAnalyzer::Script(const CSequence::Content& old, const CSequence::C
   return true;
 }
 
-int CSequenceAnalyzer::ReportBlocks(const CSequence::Content& old, const CSequence::Content& now,
+int CSequenceAnalyzer::ReportBlocks(const SequenceTypes::Content& old, const SequenceTypes::Content& now,
                                     const std::vector<Op>& ops) {
   unsigned long position = 0;  // blocks of the view before the one the next report is about
   for (const Op& op : ops) {
@@ -137,7 +137,7 @@ int CSequenceAnalyzer::ReportBlockChange(const Block& was, const Block& is, unsi
   return 0;
 }
 
-int CSequenceAnalyzer::ReportLoops(const CSequence::Content& old, const CSequence::Content& now,
+int CSequenceAnalyzer::ReportLoops(const SequenceTypes::Content& old, const SequenceTypes::Content& now,
                                    const std::vector<Op>& ops) {
   // Where each old block went (1-based, 0 when it is gone).
   std::vector<unsigned long> newOf(old.blocks.size() + 1, 0);

@@ -2,7 +2,8 @@
 
 #include <vector>
 
-#include "sequences/CSequence.h"
+#include "sequences/SequenceContent.h"
+#include "support/ConditionList.h"
 
 class CSequenceObserver;
 
@@ -23,7 +24,7 @@ class CSequenceAnalyzer {
   CSequenceAnalyzer(const std::vector<CSequenceObserver*>& observers, ConditionList& cond)
       : mObservers(observers), mCond(cond) {}
 
-  int Analyze(const CSequence::Content& old, const CSequence::Content& now);
+  int Analyze(const SequenceTypes::Content& old, const SequenceTypes::Content& now);
   // NfySequence to every observer.
   int Refresh();
 
@@ -37,11 +38,14 @@ class CSequenceAnalyzer {
   template <typename Tell>
   int TellAll(Tell tell);
   // The edit script from old to new; false when the pairing table would be too large.
-  bool Script(const CSequence::Content& old, const CSequence::Content& now, std::vector<Op>& ops) const;
-  int ReportBlocks(const CSequence::Content& old, const CSequence::Content& now, const std::vector<Op>& ops);
-  int ReportBlockChange(const CSequence::CSequenceBlock& was, const CSequence::CSequenceBlock& is,
+  bool Script(const SequenceTypes::Content& old, const SequenceTypes::Content& now,
+              std::vector<Op>& ops) const;
+  int ReportBlocks(const SequenceTypes::Content& old, const SequenceTypes::Content& now,
+                   const std::vector<Op>& ops);
+  int ReportBlockChange(const SequenceTypes::CSequenceBlock& was, const SequenceTypes::CSequenceBlock& is,
                         unsigned long block, unsigned long numPorts);
-  int ReportLoops(const CSequence::Content& old, const CSequence::Content& now, const std::vector<Op>& ops);
+  int ReportLoops(const SequenceTypes::Content& old, const SequenceTypes::Content& now,
+                  const std::vector<Op>& ops);
 
   const std::vector<CSequenceObserver*>& mObservers;
   ConditionList& mCond;

@@ -5,15 +5,18 @@
 #include <set>
 #include <vector>
 
-#include "sequences/CSequence.h"
+#include "sequences/SequencePorts.h"
+#include "sequences/SequenceTypes.h"
 #include "support/DataParcel.h"
 #include "support/Dstring.h"
 #include "support/NodeAllocator.h"
 #include "support/NodeArena.h"
 
+class SequenceSegmentSync;
+
 // One block of the sequence: one segment item per port and the block's attributes, its
 // reaction (branch) table, and a pointer per loop level to the loop it is in (not owned).
-class CSequence::CSequenceBlock {
+class SequenceTypes::CSequenceBlock {
  public:
   // One entry of the branch table.
   struct Reaction {
@@ -42,7 +45,7 @@ class CSequence::CSequenceBlock {
   const DataParcel& GetSegments() const { return mSegments; }
   DataParcel& Segments() { return mSegments; }
   // Pads with the ports' default items (DefaultItem) or cuts to exactly `numPorts` items.
-  void FitPorts(unsigned long numPorts);
+  void FitPorts(unsigned long numPorts, const SequencePorts& ports);
   static SeqSegType TypeOf(const DataItem& item);
   // The keyword of a built-in kind; null for SEG_NAMED and values out of range.
   static const char* KeywordOf(SeqSegType type);
@@ -76,9 +79,9 @@ class CSequence::CSequenceBlock {
   int SyncSegments(SequenceSegmentSync& sync, std::set<Dstring>& done, ConditionList& cond) const;
   // The default segment of `port`: asks the server for the system
   // configuration, under the guard "CSequence::CSequenceBlock::SetDefaultSegment".
-  int SetDefaultSegment(unsigned long port, ConditionList& cond);
+  int SetDefaultSegment(unsigned long port, SequencePorts::Source source, ConditionList& cond);
   // The default item of `port` from the configuration known, without asking the server.
-  static DataItem DefaultItem(unsigned long port);
+  static DataItem DefaultItem(unsigned long port, const SequencePorts& ports);
 
  private:
   DataParcel mSegments;

@@ -9,7 +9,7 @@
 
 namespace {
 
-using Block = CSequence::CSequenceBlock;
+using Block = SequenceTypes::CSequenceBlock;
 
 // `text` equals the upper-case `upper` in any case; no allocation, this runs for every element.
 bool SameWord(std::string_view text, std::string_view upper) {
@@ -71,7 +71,7 @@ namespace {
 
 class Reader {
  public:
-  Reader(CSequenceReader::Generation generation, CSequence* owner, CSequence::Content& out)
+  Reader(CSequenceReader::Generation generation, CSequence* owner, SequenceTypes::Content& out)
       : mSecond(generation == CSequenceReader::Generation::Second), mOwner(owner), mOut(out) {}
 
   // Reads one element; `level` becomes the highest loop level within it.
@@ -90,7 +90,7 @@ class Reader {
 
   bool mSecond;
   CSequence* mOwner;
-  CSequence::Content& mOut;
+  SequenceTypes::Content& mOut;
 };
 
 bool Reader::Element(const LispList& e, unsigned long& level) {
@@ -187,7 +187,7 @@ unsigned long Reader::LevelOf(const LispList& e) {
     if (word[i] < '0' || word[i] > '9') return 0;
     level = level * 10 + static_cast<unsigned long>(word[i] - '0');
   }
-  return level <= CSequence::kMaxLoopLevels ? level : 0;
+  return level <= SequenceTypes::kMaxLoopLevels ? level : 0;
 }
 
 bool Reader::LoopElement(const LispList& e, unsigned long& level) {
@@ -206,8 +206,8 @@ bool Reader::LoopElement(const LispList& e, unsigned long& level) {
   unsigned long inner = 0;
   if (!Element(e[e.Size() - 1], inner)) return false;
   if (!mSecond) own = inner + 1;
-  if (inner >= own || own > CSequence::kMaxLoopLevels) return false;
-  CSequence::CLoop* loop =
+  if (inner >= own || own > SequenceTypes::kMaxLoopLevels) return false;
+  SequenceTypes::CLoop* loop =
       CSequenceStructure::AddLoop(mOut, mOwner, first, mOut.blocks.size() + 1 - first, own);
   loop->SetNumIterations(iterations);
   loop->SetTrigger(trigger);
@@ -219,7 +219,7 @@ bool Reader::LoopElement(const LispList& e, unsigned long& level) {
 }  // namespace
 
 bool CSequenceReader::Read(const LispList& element, Generation generation, CSequence* owner,
-                           CSequence::Content& out) {
+                           SequenceTypes::Content& out) {
   Reader reader(generation, owner, out);
   unsigned long level = 0;
   return reader.Element(element, level);

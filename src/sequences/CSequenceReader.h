@@ -1,8 +1,10 @@
 #pragma once
 
-#include "sequences/CSequence.h"
+#include "sequences/SequenceContent.h"
 #include "support/LispList.h"
 #include "support/ParserExpression.h"
+
+class CSequence;
 
 // Rebuilds the blocks and loops that a block expression (the third top element of a sequence
 // expression) describes. Two generations of layout (docs/sequences.md):
@@ -13,14 +15,15 @@
 //      (BLOCK,length,segment,...)   (SEQ,item,"label",item,...)   (LOOP,iterations|INF,element)
 //    where a loop's level is one above the highest level of the loops inside it.
 // Keywords are read in any case. A loop holds only loops of lower levels; every block has the
-// same number of ports; levels go up to CSequence::kMaxLoopLevels.
+// same number of ports; levels go up to SequenceTypes::kMaxLoopLevels.
 class CSequenceReader {
  public:
   enum class Generation { First, Second };
 
   // Appends to `out`, which must be empty; false when the element breaks the layout (`out` is
   // then half built and must be cleared).
-  static bool Read(const LispList& element, Generation generation, CSequence* owner, CSequence::Content& out);
+  static bool Read(const LispList& element, Generation generation, CSequence* owner,
+                   SequenceTypes::Content& out);
   // The layout a version number of a sequence expression stands for.
   static Generation GenerationOf(double version) { return version <= 1.0 ? Generation::First : Generation::Second; }
 
@@ -30,7 +33,7 @@ class CSequenceReader {
   // not one parenthesised list, are left in the tree for Read.
   class Stream : public ParserExpression::Sink {
    public:
-    Stream(CSequence* owner, CSequence::Content& out) : mOwner(owner), mOut(out) {}
+    Stream(CSequence* owner, SequenceTypes::Content& out) : mOwner(owner), mOut(out) {}
     std::size_t Depth() const override { return 2; }
     bool Take(std::size_t depth, std::size_t index, LispList& element) override;
     // True when it read the block expression; the tree then holds only its SEQ keyword.
@@ -40,7 +43,7 @@ class CSequenceReader {
 
    private:
     CSequence* mOwner;
-    CSequence::Content& mOut;
+    SequenceTypes::Content& mOut;
     std::size_t mTopCount = 0;
     bool mVersionOk = false;
     Generation mGeneration = Generation::Second;
@@ -56,10 +59,10 @@ class CSequenceReader {
   static bool Label(const LispList& element, Dstring& out);
 
   // The reader names, one per generation.
-  static bool ReadBlockExpression(const LispList& element, CSequence* owner, CSequence::Content& out) {
+  static bool ReadBlockExpression(const LispList& element, CSequence* owner, SequenceTypes::Content& out) {
     return Read(element, Generation::First, owner, out);
   }
-  static bool ReadBlockExpression2(const LispList& element, CSequence* owner, CSequence::Content& out) {
+  static bool ReadBlockExpression2(const LispList& element, CSequence* owner, SequenceTypes::Content& out) {
     return Read(element, Generation::Second, owner, out);
   }
 };

@@ -5,14 +5,14 @@
 #include "sequences/CLoop.h"
 #include "sequences/CSequenceBlock.h"
 
-CSequence::LOOP_STATUS CSequenceStructure::LoopStatus(const Content& content, unsigned long block,
-                                                      unsigned long level) {
-  if (block == 0 || block > content.blocks.size()) return CSequence::LOOP_NONE;
+SequenceTypes::LOOP_STATUS CSequenceStructure::LoopStatus(const Content& content, unsigned long block,
+                                                          unsigned long level) {
+  if (block == 0 || block > content.blocks.size()) return SequenceTypes::LOOP_NONE;
   const Loop* loop = content.blocks[block - 1]->GetLoop(level);
-  if (loop == nullptr) return CSequence::LOOP_NONE;
+  if (loop == nullptr) return SequenceTypes::LOOP_NONE;
   if (loop->GetStart() == block)
-    return loop->GetLength() == 1 ? CSequence::LOOP_SINGLE : CSequence::LOOP_START;
-  return loop->GetEnd() == block ? CSequence::LOOP_END : CSequence::LOOP_INSIDE;
+    return loop->GetLength() == 1 ? SequenceTypes::LOOP_SINGLE : SequenceTypes::LOOP_START;
+  return loop->GetEnd() == block ? SequenceTypes::LOOP_END : SequenceTypes::LOOP_INSIDE;
 }
 
 unsigned long CSequenceStructure::MaxLoopLevel(const Content& content) {
@@ -22,7 +22,7 @@ unsigned long CSequenceStructure::MaxLoopLevel(const Content& content) {
 }
 
 unsigned long CSequenceStructure::Levels(const Content& content) {
-  return std::max(CSequence::GetNumLoopLevels(), MaxLoopLevel(content));
+  return std::max(SequenceTypes::GetNumLoopLevels(), MaxLoopLevel(content));
 }
 
 void CSequenceStructure::Insert(Content& content, unsigned long n, bool before,
@@ -30,9 +30,9 @@ void CSequenceStructure::Insert(Content& content, unsigned long n, bool before,
   const unsigned long levels = Levels(content);
   block->ClearLoops();
   for (unsigned long level = 1; level <= levels; ++level) {
-    const CSequence::LOOP_STATUS status = LoopStatus(content, n, level);
-    const bool joins = before ? (status == CSequence::LOOP_END || status == CSequence::LOOP_INSIDE)
-                              : (status == CSequence::LOOP_START || status == CSequence::LOOP_INSIDE);
+    const SequenceTypes::LOOP_STATUS status = LoopStatus(content, n, level);
+    const bool joins = before ? (status == SequenceTypes::LOOP_END || status == SequenceTypes::LOOP_INSIDE)
+                              : (status == SequenceTypes::LOOP_START || status == SequenceTypes::LOOP_INSIDE);
     if (!joins) continue;
     Loop* loop = content.blocks[n - 1]->GetLoop(level);
     loop->SetLength(loop->GetLength() + 1);

@@ -2,17 +2,20 @@
 
 #include <memory>
 
-#include "sequences/CSequence.h"
+#include "sequences/SequenceContent.h"
+
+class CSequence;
 
 // The loop rules of inserting and removing blocks (AddBlockBefore/After and
 // DeleteBlock), shared by the edits, the clipboard and MoveBlock. Numbers count from 1.
 class CSequenceStructure {
  public:
-  using Content = CSequence::Content;
-  using Block = CSequence::CSequenceBlock;
-  using Loop = CSequence::CLoop;
+  using Content = SequenceTypes::Content;
+  using Block = SequenceTypes::CSequenceBlock;
+  using Loop = SequenceTypes::CLoop;
 
-  static CSequence::LOOP_STATUS LoopStatus(const Content& content, unsigned long block, unsigned long level);
+  static SequenceTypes::LOOP_STATUS LoopStatus(const Content& content, unsigned long block,
+                                               unsigned long level);
   // The highest level any loop of the content has (0 without loops).
   static unsigned long MaxLoopLevel(const Content& content);
   // The levels the writer and the loop rules work on: the instrument's, or more when the

@@ -6,12 +6,12 @@
 
 namespace {
 
-using Block = CSequence::CSequenceBlock;
-using Loop = CSequence::CLoop;
+using Block = SequenceTypes::CSequenceBlock;
+using Loop = SequenceTypes::CLoop;
 
 class Writer {
  public:
-  Writer(const CSequence::Content& content, Dstring& out, ConditionList& cond)
+  Writer(const SequenceTypes::Content& content, Dstring& out, ConditionList& cond)
       : mContent(content), mOut(out), mCond(cond) {}
 
   bool Element(unsigned long first, unsigned long last, unsigned long level);
@@ -28,7 +28,7 @@ class Writer {
   void BlockElement(const Block& block);
   bool Fail(unsigned long block, unsigned long level);
 
-  const CSequence::Content& mContent;
+  const SequenceTypes::Content& mContent;
   Dstring& mOut;
   ConditionList& mCond;
 };
@@ -137,13 +137,13 @@ void Writer::BlockElement(const Block& block) {
 bool Writer::Fail(unsigned long block, unsigned long level) {
   ConditionListLoader::ConditionToken(mCond, "GUI_SEQUENCE_IMPOSSIBLE_NESTING_LOOPS",
                                       {Dstring::Format("%lu", block), Dstring::Format("%lu", level)},
-                                      CSequence::kStatusError);
+                                      SequenceTypes::kStatusError);
   return false;
 }
 
 }  // namespace
 
-int CSequenceWriter::Write(const CSequence::Content& content, unsigned long levels, Dstring& out,
+int CSequenceWriter::Write(const SequenceTypes::Content& content, unsigned long levels, Dstring& out,
                            ConditionList& cond) {
   out.clear();
   if (content.blocks.empty()) {
@@ -154,8 +154,8 @@ int CSequenceWriter::Write(const CSequence::Content& content, unsigned long leve
   for (const auto& block : content.blocks) {
     if (block->GetSegments().size() != content.numPorts) {
       ConditionListLoader::ConditionToken(cond, "GUI_SEQUENCE_SYNTAX", {Dstring("(ports)")},
-                                          CSequence::kStatusError);
-      return CSequence::kStatusError;
+                                          SequenceTypes::kStatusError);
+      return SequenceTypes::kStatusError;
     }
   }
   out.reserve(64 + content.blocks.size() * (40 + 12 * content.numPorts));
@@ -163,7 +163,7 @@ int CSequenceWriter::Write(const CSequence::Content& content, unsigned long leve
   AppendQuoted(out, content.blocks.front()->GetLabel());
   out += ',';
   Writer writer(content, out, cond);
-  if (!writer.Element(1, content.blocks.size(), levels)) return CSequence::kStatusError;
+  if (!writer.Element(1, content.blocks.size(), levels)) return SequenceTypes::kStatusError;
   out += ')';
   return 0;
 }

@@ -46,6 +46,8 @@ class InstanceInfo {
   // is missing or of another kind.
   static void ReadText(const LispList& list, std::size_t index, Dstring& out);
   static void ReadNumber(const LispList& list, std::size_t index, unsigned long& out);
+  static void AppendText(LispList& list, const Dstring& text);
+  static void AppendNumber(LispList& list, unsigned long n);
 
  private:
   Dstring mInstanceName;

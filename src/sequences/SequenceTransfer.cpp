@@ -3,6 +3,7 @@
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceEvents.h"
+#include "sequences/SequenceService.h"
 #include "settings/SettingTransfer.h"
 #include "support/ConditionListLoader.h"
 
@@ -51,6 +52,6 @@ int SequenceTransfer::Import(const Dstring& path, ConditionList& list) {
     return status;
   }
   // The instrument tells other clients of the change, not the one that made it.
-  CSequence* sequence = CPortInfo::GetSequence();
+  CSequence* sequence = SequenceService::GetSequence();
   return sequence != nullptr ? sequence->ReadSequence(list, 0) : 0;
 }

@@ -1,6 +1,5 @@
 #include "settings/QENRegistryProfile.h"
 
-
 #include "settings/FileRegistryStore.h"
 #include "settings/ProfileValue.h"
 #include "settings/SettingsStatus.h"
@@ -8,7 +7,9 @@
 
 RegistryStore* QENRegistryProfile::mStore = nullptr;
 
-void QENRegistryProfile::SetStore(RegistryStore* store) { mStore = store; }
+void QENRegistryProfile::SetStore(RegistryStore* store) {
+  mStore = store;
+}
 
 RegistryStore& QENRegistryProfile::GetStore() {
   static FileRegistryStore platform(FileRegistryStore::DefaultPath());
@@ -34,7 +35,8 @@ int QENRegistryProfile::DeleteKey(void* root, const Dstring& key, ConditionList&
   return GetStore().DeleteKey(root, key, list);
 }
 
-int QENRegistryProfile::DeleteValue(void* root, const Dstring& key, const Dstring& name, ConditionList& list) {
+int QENRegistryProfile::DeleteValue(void* root, const Dstring& key, const Dstring& name,
+                                    ConditionList& list) {
   return GetStore().DeleteValue(root, key, name, list);
 }
 
@@ -43,81 +45,20 @@ int QENRegistryProfile::GetTyped(void* root, const Dstring& key, const Dstring& 
                                  ConditionList& list) {
   Dstring data;
   if (int status = GetStore().Query(root, key, name, data, list)) return status;
-  if (ProfileValue::Read(data, value) == ProfileValue::Outcome::kRead) return 0;
-  ConditionListLoader::ConditionToken(list, "GUI_REGISTRY_PROFILE_UNEXPEXPECTED_VALUEDATA", {name, data},
-                                      SettingsStatus::kUnexpectedValue);
-  return SettingsStatus::kUnexpectedValue;
+  if constexpr (std::is_same_v<T, Dstring>) {
+    value = data;  // a text value is the data itself
+    return 0;
+  } else {
+    if (ProfileValue::Read(data, value) == ProfileValue::Outcome::kRead) return 0;
+    ConditionListLoader::ConditionToken(list, "GUI_REGISTRY_PROFILE_UNEXPEXPECTED_VALUEDATA", {name, data},
+                                        SettingsStatus::kUnexpectedValue);
+    return SettingsStatus::kUnexpectedValue;
+  }
 }
 
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, long& value,
-                                 ConditionList& list) {
-  return GetTyped(root, key, name, value, list);
+int QENRegistryProfile::Put(void* root, const Dstring& key, const Dstring& name, const Dstring& text,
+                            ConditionList& list) {
+  return GetStore().Set(root, key, name, text, list);
 }
 
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, unsigned long& value,
-                                 ConditionList& list) {
-  return GetTyped(root, key, name, value, list);
-}
-
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, float& value,
-                                 ConditionList& list) {
-  return GetTyped(root, key, name, value, list);
-}
-
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, double& value,
-                                 ConditionList& list) {
-  return GetTyped(root, key, name, value, list);
-}
-
-// A text value is the data itself.
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, Dstring& value,
-                                 ConditionList& list) {
-  return GetStore().Query(root, key, name, value, list);
-}
-
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, DataParcel& value,
-                                 ConditionList& list) {
-  return GetTyped(root, key, name, value, list);
-}
-
-int QENRegistryProfile::GetValue(void* root, const Dstring& key, const Dstring& name, LispList& value,
-                                 ConditionList& list) {
-  return GetTyped(root, key, name, value, list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, long value,
-                                 ConditionList& list) {
-  return GetStore().Set(root, key, name, ProfileValue::Format(value, false), list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, unsigned long value,
-                                 ConditionList& list) {
-  return GetStore().Set(root, key, name, ProfileValue::Format(value, false), list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, float value,
-                                 ConditionList& list) {
-  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
-  return GetStore().Set(root, key, name, ProfileValue::Format(value, false), list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, double value,
-                                 ConditionList& list) {
-  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
-  return GetStore().Set(root, key, name, ProfileValue::Format(value, false), list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, const Dstring& value,
-                                 ConditionList& list) {
-  return GetStore().Set(root, key, name, value, list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, const DataParcel& value,
-                                 ConditionList& list) {
-  return GetStore().Set(root, key, name, ProfileValue::Format(value), list);
-}
-
-int QENRegistryProfile::SetValue(void* root, const Dstring& key, const Dstring& name, const LispList& value,
-                                 ConditionList& list) {
-  return GetStore().Set(root, key, name, ProfileValue::Format(value), list);
-}
+template class TypedProfile<QENRegistryProfile, void*, const Dstring&>;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "settings/TypedProfile.h"
 #include "support/ConditionList.h"
 #include "support/DataParcel.h"
 #include "support/Dstring.h"
@@ -11,7 +12,7 @@ class RegistryStore;
 // path that the caller names. Every value is kept as text in the forms of ProfileValue
 // without parentheses: "12i", "7u", "1.5f", "2.5e-09d", the text itself, or a list
 // expression "(1,2)".
-class QENRegistryProfile {
+class QENRegistryProfile : public TypedProfile<QENRegistryProfile, void*, const Dstring&> {
  public:
   // The interface's own key, and the key it had under the maker's former name.
   static constexpr const char* kGuiKey = "SOFTWARE\\Corvane\\Corvane 71300\\Gui";
@@ -27,26 +28,17 @@ class QENRegistryProfile {
   static int DeleteKey(void* root, const Dstring& key, ConditionList& list);
   static int DeleteValue(void* root, const Dstring& key, const Dstring& name, ConditionList& list);
 
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, long& value, ConditionList& list);
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, unsigned long& value, ConditionList& list);
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, float& value, ConditionList& list);
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, double& value, ConditionList& list);
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, Dstring& value, ConditionList& list);
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, DataParcel& value, ConditionList& list);
-  static int GetValue(void* root, const Dstring& key, const Dstring& name, LispList& value, ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, long value, ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, unsigned long value, ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, float value, ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, double value, ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, const Dstring& value, ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, const DataParcel& value,
-                      ConditionList& list);
-  static int SetValue(void* root, const Dstring& key, const Dstring& name, const LispList& value,
-                      ConditionList& list);
-
  private:
+  friend class TypedProfile<QENRegistryProfile, void*, const Dstring&>;
+  static constexpr bool kParens = false;
   template <typename T>
   static int GetTyped(void* root, const Dstring& key, const Dstring& name, T& value, ConditionList& list);
+  static int Put(void* root, const Dstring& key, const Dstring& name, const Dstring& text,
+                 ConditionList& list);
+  // A text value is the data itself.
+  static Dstring TextValue(const Dstring& text) { return text; }
 
   static RegistryStore* mStore;
 };
+
+extern template class TypedProfile<QENRegistryProfile, void*, const Dstring&>;

@@ -26,16 +26,21 @@ LispList NewList() {
   return out;
 }
 
-bool IsText(const LispList& node) { return node.IsItem() && node.GetItem().IsText(); }
+bool IsText(const LispList& node) {
+  return node.IsItem() && node.GetItem().IsText();
+}
 
-bool IsPair(const LispList& entry) { return entry.Size() == 2 && IsText(entry[0]) && IsText(entry[1]); }
+bool IsPair(const LispList& entry) {
+  return entry.Size() == 2 && IsText(entry[0]) && IsText(entry[1]);
+}
 
 // The entry that names `name`: a list whose first element is that text; 0 when none (the
 // version holds place 0).
 std::size_t IndexOf(const LispList& values, const Dstring& name) {
   for (std::size_t i = 1; i < values.Size(); ++i) {
     const LispList& entry = values[i];
-    if (entry.IsList() && entry.Size() > 0 && IsText(entry[0]) && entry[0].GetItem().GetText() == name) return i;
+    if (entry.IsList() && entry.Size() > 0 && IsText(entry[0]) && entry[0].GetItem().GetText() == name)
+      return i;
   }
   return 0;
 }
@@ -88,9 +93,11 @@ int QENSettingProfile::Read(ConditionList& list) {
 
 int QENSettingProfile::CheckVersion(const LispList& parsed, ConditionList& list) {
   double version = 0;
-  const bool number = parsed[0].IsItem() && parsed[0].GetItem().IsNumber() && parsed[0].GetItem().GetDouble(version);
+  const bool number =
+      parsed[0].IsItem() && parsed[0].GetItem().IsNumber() && parsed[0].GetItem().GetDouble(version);
   if (number && version == kVersion) return QenStatus::kOk;
-  return Fail(list, "GUI_SETTING_PROFILE_WRONG_VERSION", {parsed[0].AsExpression()}, SettingsStatus::kWrongVersion);
+  return Fail(list, "GUI_SETTING_PROFILE_WRONG_VERSION", {parsed[0].AsExpression()},
+              SettingsStatus::kWrongVersion);
 }
 
 int QENSettingProfile::Write(ConditionList& list) {
@@ -98,7 +105,8 @@ int QENSettingProfile::Write(ConditionList& list) {
   const Dstring expression = mNameValues.AsExpression();
   if (int status = CommandText::CheckValue(expression, list)) return status;
   Dstring reply;
-  const Dstring cmd = Dstring::Format("%s:CONF:CSET:PROF:EXPR ", QenGuiInst::GetAppHandle().c_str()) + expression;
+  const Dstring cmd =
+      Dstring::Format("%s:CONF:CSET:PROF:EXPR ", QenGuiInst::GetAppHandle().c_str()) + expression;
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
   mIsDirty = 0;
   return QenStatus::kOk;
@@ -113,7 +121,8 @@ int QENSettingProfile::FindText(const Dstring& name, Dstring& text, ConditionLis
   std::size_t at = IndexOf(mNameValues, name);
   if (at == 0) return Fail(list, "GUI_SETTING_PROFILE_NO_VALUE", {name}, SettingsStatus::kNoValue);
   const LispList& entry = mNameValues[at];
-  if (!IsPair(entry)) return Fail(list, "GUI_SETTING_PROFILE_BAD_ENTRY", {entry.AsExpression()}, SettingsStatus::kBadEntry);
+  if (!IsPair(entry))
+    return Fail(list, "GUI_SETTING_PROFILE_BAD_ENTRY", {entry.AsExpression()}, SettingsStatus::kBadEntry);
   text = Dstring(entry[1].GetItem().GetText());
   return QenStatus::kOk;
 }
@@ -122,44 +131,20 @@ template <typename T>
 int QENSettingProfile::GetTyped(const Dstring& name, T& value, ConditionList& list) {
   Dstring text;
   if (int status = FindText(name, text, list)) return status;
-  switch (ProfileValue::Read(text, value)) {
-    case Outcome::kRead:
-      return QenStatus::kOk;
-    case Outcome::kUnparsable:
-      return Fail(list, "GUI_SETTING_PROFILE_BAD_VALUE", {text, name}, SettingsStatus::kBadValue);
-    case Outcome::kWrongType:
-      break;
+  if constexpr (std::is_same_v<T, Dstring>) {
+    value = text;  // a text value is the text itself
+    return QenStatus::kOk;
+  } else {
+    switch (ProfileValue::Read(text, value)) {
+      case Outcome::kRead:
+        return QenStatus::kOk;
+      case Outcome::kUnparsable:
+        return Fail(list, "GUI_SETTING_PROFILE_BAD_VALUE", {text, name}, SettingsStatus::kBadValue);
+      case Outcome::kWrongType:
+        break;
+    }
+    return Fail(list, "GUI_SETTING_PROFILE_UNEXPEXPECTED_VALUE", {name}, SettingsStatus::kUnexpectedValue);
   }
-  return Fail(list, "GUI_SETTING_PROFILE_UNEXPEXPECTED_VALUE", {name}, SettingsStatus::kUnexpectedValue);
-}
-
-int QENSettingProfile::GetValue(const Dstring& name, long& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSettingProfile::GetValue(const Dstring& name, unsigned long& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSettingProfile::GetValue(const Dstring& name, float& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSettingProfile::GetValue(const Dstring& name, double& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-// A text value is the text itself.
-int QENSettingProfile::GetValue(const Dstring& name, Dstring& value, ConditionList& list) {
-  return FindText(name, value, list);
-}
-
-int QENSettingProfile::GetValue(const Dstring& name, DataParcel& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSettingProfile::GetValue(const Dstring& name, LispList& value, ConditionList& list) {
-  return GetTyped(name, value, list);
 }
 
 int QENSettingProfile::Put(const Dstring& name, const Dstring& text, ConditionList& list) {
@@ -170,7 +155,8 @@ int QENSettingProfile::Put(const Dstring& name, const Dstring& text, ConditionLi
   entry.Append(DataItem::MakeString(text));
   std::size_t at = IndexOf(mNameValues, name);
   if (at != 0 && !IsPair(mNameValues[at])) {
-    return Fail(list, "GUI_SETTING_PROFILE_BAD_ENTRY", {mNameValues[at].AsExpression()}, SettingsStatus::kBadEntry);
+    return Fail(list, "GUI_SETTING_PROFILE_BAD_ENTRY", {mNameValues[at].AsExpression()},
+                SettingsStatus::kBadEntry);
   }
   if (at == 0) {
     mNameValues.Append(std::move(entry));
@@ -181,35 +167,7 @@ int QENSettingProfile::Put(const Dstring& name, const Dstring& text, ConditionLi
   return QenStatus::kOk;
 }
 
-int QENSettingProfile::SetValue(const Dstring& name, long value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSettingProfile::SetValue(const Dstring& name, unsigned long value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSettingProfile::SetValue(const Dstring& name, float value, ConditionList& list) {
-  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSettingProfile::SetValue(const Dstring& name, double value, ConditionList& list) {
-  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSettingProfile::SetValue(const Dstring& name, const Dstring& value, ConditionList& list) {
-  return Put(name, value, list);
-}
-
-int QENSettingProfile::SetValue(const Dstring& name, const DataParcel& value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value), list);
-}
-
-int QENSettingProfile::SetValue(const Dstring& name, const LispList& value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value), list);
-}
+template class TypedProfile<QENSettingProfile>;
 
 // The name as it stands, or with the handle of this client first (":_H:CONF:CSET:PROF:EXPR").
 int QENSettingProfile::MatchDirtyFlag(QenDs*, void*, const Dstring& name) {

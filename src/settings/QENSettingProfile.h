@@ -1,5 +1,6 @@
 #pragma once
 
+#include "settings/TypedProfile.h"
 #include "support/ConditionList.h"
 #include "support/DataParcel.h"
 #include "support/Dstring.h"
@@ -19,7 +20,7 @@ class QenDs;
 //
 // Every failure adds its condition and returns nonzero; the held list stays as it was, except
 // that a list of another version is replaced by an empty one of version 2.0.
-class QENSettingProfile {
+class QENSettingProfile : public TypedProfile<QENSettingProfile> {
  public:
   static constexpr double kVersion = 2.0;
   // The changed-setting name that the procedure follows (after the handle).
@@ -36,26 +37,16 @@ class QENSettingProfile {
   static const LispList& GetNameValues() { return mNameValues; }
 
   static int Exists(const Dstring& name, int& exists, ConditionList& list);
-  static int GetValue(const Dstring& name, long& value, ConditionList& list);
-  static int GetValue(const Dstring& name, unsigned long& value, ConditionList& list);
-  static int GetValue(const Dstring& name, float& value, ConditionList& list);
-  static int GetValue(const Dstring& name, double& value, ConditionList& list);
-  static int GetValue(const Dstring& name, Dstring& value, ConditionList& list);
-  static int GetValue(const Dstring& name, DataParcel& value, ConditionList& list);
-  static int GetValue(const Dstring& name, LispList& value, ConditionList& list);
-  static int SetValue(const Dstring& name, long value, ConditionList& list);
-  static int SetValue(const Dstring& name, unsigned long value, ConditionList& list);
-  static int SetValue(const Dstring& name, float value, ConditionList& list);
-  static int SetValue(const Dstring& name, double value, ConditionList& list);
-  static int SetValue(const Dstring& name, const Dstring& value, ConditionList& list);
-  static int SetValue(const Dstring& name, const DataParcel& value, ConditionList& list);
-  static int SetValue(const Dstring& name, const LispList& value, ConditionList& list);
 
   // The procedures on the dirty-flag source.
   static int MatchDirtyFlag(QenDs* source, void* client, const Dstring& name);
   static int NfyDirtyFlag(QenDs* source, void* client, ConditionList& list);
 
  private:
+  friend class TypedProfile<QENSettingProfile>;
+  static constexpr bool kParens = true;
+  // A text value is the text itself.
+  static Dstring TextValue(const Dstring& text) { return text; }
   // The value text of the entry of `name`.
   static int FindText(const Dstring& name, Dstring& text, ConditionList& list);
   template <typename T>
@@ -67,3 +58,5 @@ class QENSettingProfile {
   static unsigned mIsDirty;
   static DirtyFlagDs* mDirtyFlag;
 };
+
+extern template class TypedProfile<QENSettingProfile>;

@@ -18,7 +18,9 @@ int Unexpected(const Dstring& name, const Dstring& reply, ConditionList& list) {
   return SettingsStatus::kUnexpectedValue;
 }
 
-Outcome ReadReply(const Dstring& reply, Dstring& value) { return ProfileValue::ReadText(reply, value); }
+Outcome ReadReply(const Dstring& reply, Dstring& value) {
+  return ProfileValue::ReadText(reply, value);
+}
 
 template <typename T>
 Outcome ReadReply(const Dstring& reply, T& value) {
@@ -44,7 +46,8 @@ int QENSystemProfile::Names(DstringList& out, ConditionList& list) {
   // A name is any plain item, quoted or not, as its text.
   for (const DataItem& item : names) ok = ok && item.GetType() != DataItemType::Block;
   if (!ok) {
-    ConditionListLoader::ConditionToken(list, "GUI_SYSTEM_PROFILE_BAD_LIST", {reply}, SettingsStatus::kBadReply);
+    ConditionListLoader::ConditionToken(list, "GUI_SYSTEM_PROFILE_BAD_LIST", {reply},
+                                        SettingsStatus::kBadReply);
     return SettingsStatus::kBadReply;
   }
   out.clear();
@@ -54,7 +57,8 @@ int QENSystemProfile::Names(DstringList& out, ConditionList& list) {
 
 int QENSystemProfile::Query(const Dstring& name, Dstring& reply, ConditionList& list) {
   if (int status = CommandText::CheckArgument(name, list)) return status;
-  const Dstring cmd = Dstring::Format("%s:CONF:PROF? \"%s\"", QenGuiInst::GetAppHandle().c_str(), name.c_str());
+  const Dstring cmd =
+      Dstring::Format("%s:CONF:PROF? \"%s\"", QenGuiInst::GetAppHandle().c_str(), name.c_str());
   return QenGuiInst::Call(cmd, reply, list);
 }
 
@@ -63,34 +67,6 @@ int QENSystemProfile::GetTyped(const Dstring& name, T& value, ConditionList& lis
   Dstring reply;
   if (int status = Query(name, reply, list)) return status;
   return ReadReply(reply, value) == Outcome::kRead ? QenStatus::kOk : Unexpected(name, reply, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, long& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, unsigned long& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, float& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, double& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, Dstring& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, DataParcel& value, ConditionList& list) {
-  return GetTyped(name, value, list);
-}
-
-int QENSystemProfile::GetValue(const Dstring& name, LispList& value, ConditionList& list) {
-  return GetTyped(name, value, list);
 }
 
 int QENSystemProfile::Put(const Dstring& name, const Dstring& valueText, ConditionList& list) {
@@ -102,32 +78,9 @@ int QENSystemProfile::Put(const Dstring& name, const Dstring& valueText, Conditi
   return QenGuiInst::Call(cmd, reply, list);
 }
 
-int QENSystemProfile::SetValue(const Dstring& name, long value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value, true), list);
+// A text travels quoted, so that commas and parentheses in it survive.
+Dstring QENSystemProfile::TextValue(const Dstring& text) {
+  return DataItem::MakeString(text).AsExpression();
 }
 
-int QENSystemProfile::SetValue(const Dstring& name, unsigned long value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSystemProfile::SetValue(const Dstring& name, float value, ConditionList& list) {
-  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSystemProfile::SetValue(const Dstring& name, double value, ConditionList& list) {
-  if (int status = ProfileValue::CheckFinite(value, name, list)) return status;
-  return Put(name, ProfileValue::Format(value, true), list);
-}
-
-int QENSystemProfile::SetValue(const Dstring& name, const Dstring& value, ConditionList& list) {
-  return Put(name, DataItem::MakeString(value).AsExpression(), list);
-}
-
-int QENSystemProfile::SetValue(const Dstring& name, const DataParcel& value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value), list);
-}
-
-int QENSystemProfile::SetValue(const Dstring& name, const LispList& value, ConditionList& list) {
-  return Put(name, ProfileValue::Format(value), list);
-}
+template class TypedProfile<QENSystemProfile>;

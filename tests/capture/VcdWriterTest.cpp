@@ -61,13 +61,6 @@ TEST(VcdWriterTest, APeriodOfNoWholePicosecondsIsWrittenInFemtoseconds) {
   EXPECT_NE(text.find("#333333\n1\"\n#666667\n"), std::string::npos) << text;
 }
 
-TEST(VcdWriterTest, IdentifiersArePrintableAndUnique) {
-  EXPECT_EQ(VcdWriter::Identifier(0), "!");
-  EXPECT_EQ(VcdWriter::Identifier(93), "~");
-  EXPECT_EQ(VcdWriter::Identifier(94), "!\"");
-  EXPECT_NE(VcdWriter::Identifier(95), VcdWriter::Identifier(1));
-}
-
 TEST(VcdWriterTest, AnUnwritablePathIsACondition) {
   ConditionList list;
   EXPECT_NE(VcdWriter::WriteFile(Sample(1e-9), "p", {0, 6, 0, 1}, "/nonexistent/dir/x.vcd", list), 0);

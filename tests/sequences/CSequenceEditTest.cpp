@@ -204,6 +204,38 @@ TEST_F(EditTest, DefaultSegmentsFollowThePortTypeAndTheMode) {
   EXPECT_EQ(CPortInfo::GetMode(), "CAPT") << "the reply is taken as the configuration known";
 }
 
+// The model knows the system only as the value its port source hands over: the items of a new
+// block and whether there are events come from it, whatever the port information holds.
+TEST_F(EditTest, NewBlocksAndEventsFollowThePortSourceOnly) {
+  static SequencePorts given;
+  const SequencePorts::Source source = [](SequencePorts::Ask, SequencePorts& out, ConditionList&) {
+    out = given;
+    return 0;
+  };
+  mSeq.SetPortSource(source);
+  const struct {
+    bool capture;
+    std::vector<Dstring> types;
+    std::vector<std::string> items;
+  } cases[] = {
+      {true, {"OUTPUT_PORT", "INPUT_PORT", "OUTPUT_PORT"}, {"ACQUIRE", "PAUSE0", "ACQUIRE"}},
+      {false, {"INPUT_PORT", "OUTPUT_PORT"}, {"PAUSE0", "PAUSE"}},
+  };
+  for (const auto& c : cases) {
+    given = SequencePorts{true, false, c.capture, c.types};
+    ASSERT_EQ(mSeq.fromExpression("(3.0,,)", mList), 0) << mList.ToText();
+    ASSERT_EQ(mSeq.GetNumPorts(), c.items.size());
+    for (unsigned long p = 1; p <= c.items.size(); ++p) EXPECT_EQ(mSeq.GetSegment(1, p), c.items[p - 1]) << p;
+  }
+  given = SequencePorts{true, true, false, {"OUTPUT_PORT"}};
+  Load(Seq(Blk(1)));
+  ASSERT_EQ(mSeq.SetEvent(0, {"Arm", 3, {}}, mList), 0) << mList.ToText();
+  EXPECT_EQ(mSeq.GetEvents().GetEvent(0).name, "Arm");
+  mSeq.SetPortSource(nullptr);
+  ASSERT_EQ(mSeq.fromExpression("(3.0,,)", mList), 0);
+  EXPECT_EQ(mSeq.GetNumPorts(), 0u) << "without a source there are no ports";
+}
+
 TEST_F(EditTest, CutCopyAndPaste) {
   EXPECT_FALSE(CSequence::IsPasteBlockPossible());
   LoadFive();

@@ -7,6 +7,7 @@
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceFixture.h"
 #include "sequences/SequenceSegmentSync.h"
+#include "sequences/SequenceService.h"
 #include "support/MessageCatalogue.h"
 
 namespace {
@@ -141,8 +142,10 @@ INSTANTIATE_TEST_SUITE_P(Table, DirtyFlagNames,
 // information and the sequence; a changed configuration re-reads the sequence by force.
 TEST_F(ServerTest, TheDirtyFlagReachesTheSequenceAndThePortInformation) {
   auto* dirty = new DirtyFlagDs;
-  CPortInfo::Init(dirty);
-  CSequence& seq = *CPortInfo::GetSequence();
+  CPortInfo::Init(dirty, &SequenceService::NfyPortInfo);
+  SequenceService::Init(dirty, &CPortInfo::GetSequencePorts);
+  CSequence& seq = *SequenceService::GetSequence();
+  EXPECT_EQ(CPortInfo::GetSequence(), &seq);
   RecordingObserver observer;
   seq.AddObserver(&observer);
   ASSERT_EQ(seq.ReadSequence(mList, 1), 0);
@@ -165,7 +168,9 @@ TEST_F(ServerTest, TheDirtyFlagReachesTheSequenceAndThePortInformation) {
   EXPECT_EQ(observer.log, std::vector<std::string>{"Sequence"});
 
   seq.RemoveObserver(&observer);
+  SequenceService::End();
   CPortInfo::End();
+  EXPECT_EQ(SequenceService::GetSequence(), nullptr);
   EXPECT_EQ(CPortInfo::GetSequence(), nullptr);
   EXPECT_EQ(dirty->NumViews(), 0u) << "End unregisters both";
   dirty->Release();

@@ -95,6 +95,7 @@ class SequenceFixture : public InstrumentFixture {
     CPortInfo::Invalidate();
     ASSERT_EQ(CPortInfo::SetConfiguration(FakeSequencer::kConfiguration, mList), 0);
     mFake.Install(Inst());
+    mSeq.SetPortSource(&CPortInfo::GetSequencePorts);
     mSeq.AddObserver(&mObserver);
   }
   void TearDown() override {

@@ -15,6 +15,7 @@
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceFixture.h"
+#include "sequences/SequenceService.h"
 #include "sequences/SequenceTransfer.h"
 #include "support/QenEnvironment.h"
 
@@ -240,8 +241,9 @@ class SimModelTest : public SimSequenceTest {
     QenGuiInst::SetInstrument(std::move(inst));
     QenGuiInst::SetAppHandle(handle);
     mDirty = new DirtyFlagDs;
-    CPortInfo::Init(mDirty);
-    CPortInfo::GetSequence()->AddObserver(&mObserver);
+    CPortInfo::Init(mDirty, &SequenceService::NfyPortInfo);
+    SequenceService::Init(mDirty, &CPortInfo::GetSequencePorts);
+    SequenceService::GetSequence()->AddObserver(&mObserver);
     ASSERT_EQ(CSequence::InitNumLoopLevels(mList), 0);
     mOther = std::make_unique<SimClient>(sDefault->Port(), "_OTHER");
     ASSERT_EQ(mOther->Call(":SGEN:GLOB:SEQ " + InitialOf("PAUSE")), 0);
@@ -251,7 +253,8 @@ class SimModelTest : public SimSequenceTest {
     mObserver.log.clear();
   }
   void TearDown() override {
-    CPortInfo::GetSequence()->RemoveObserver(&mObserver);
+    SequenceService::GetSequence()->RemoveObserver(&mObserver);
+    SequenceService::End();
     CPortInfo::End();
     mDirty->Release();
     mOther.reset();
@@ -259,7 +262,7 @@ class SimModelTest : public SimSequenceTest {
     QenEnvironment::SetLogDirectory(std::nullopt);
     std::filesystem::remove_all(mDir);
   }
-  CSequence& Seq() { return *CPortInfo::GetSequence(); }
+  CSequence& Seq() { return *SequenceService::GetSequence(); }
 
   std::string mDir;
   DirtyFlagDs* mDirty = nullptr;

@@ -18,9 +18,9 @@
 #include "common/gui/GuiSimFixture.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/ui/GridDisp.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SequenceBlockInstanceInfo.h"
+#include "sequences/SequenceService.h"
 #include "sequences/SequenceUndo.h"
 #include "sequences/ui/LoopGridManager.h"
 #include "windows/InstanceWindows.h"
@@ -144,7 +144,7 @@ TEST_P(LoopGridRefusals, ShowTheConditionAndWriteNothing) {
   ASSERT_EQ(mAlerts.size(), 1u);
   EXPECT_NE(mAlerts[0].find(GetParam().text), std::string::npos) << mAlerts[0];
   EXPECT_EQ(Server(), mNested);
-  EXPECT_EQ(CPortInfo::GetSequence()->GetLastExpression(), mNested);
+  EXPECT_EQ(SequenceService::GetSequence()->GetLastExpression(), mNested);
   EXPECT_EQ(mGrid->CellText(2, mGrid->LaneField(1)), QStringLiteral("4"));
   EXPECT_EQ(mGrid->CellText(1, mGrid->PortField(1)), QStringLiteral("PAUSE"));
   EXPECT_FALSE(mGrid->Steps()->CanUndo());
@@ -340,7 +340,7 @@ TEST_F(LoopGridTest, EventWindowEditsReachTheInstrument) {
   QCoreApplication::processEvents();
   ASSERT_EQ(mAlerts.size(), 1u);
   EXPECT_EQ(events->Table()->item(0, 2)->text(), QStringLiteral("5"));
-  EXPECT_EQ(LoopGridManager::MarksOf(*CPortInfo::GetSequence(), 2), QStringLiteral("R1"));
+  EXPECT_EQ(LoopGridManager::MarksOf(*SequenceService::GetSequence(), 2), QStringLiteral("R1"));
   ASSERT_EQ(events->SetSync(true), 0);
   EXPECT_NE(Server().find(",SYNC,"), std::string::npos);
   EXPECT_EQ(events->Table()->rowCount(), 0);
@@ -438,7 +438,7 @@ TEST_F(LoopGridTest, TiledWithOtherWindowsTheGridScrollsAndKeepsEveryPortColumn)
   ASSERT_NE(sub, nullptr);
   sub->resize(sub->minimumSizeHint());
   QCoreApplication::processEvents();
-  const unsigned long ports = CPortInfo::GetSequence()->GetNumPorts();
+  const unsigned long ports = SequenceService::GetSequence()->GetNumPorts();
   ASSERT_GE(ports, 2u);
   ASSERT_LT(mGrid->width(), static_cast<int>(ports) * LoopGridManager::kPortCells * mGrid->GetDX());
   QScrollBar* across = nullptr;

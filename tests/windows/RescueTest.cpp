@@ -15,8 +15,8 @@
 #include "instrument/QenStatus.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/ui/SegmentGridManager.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
+#include "sequences/SequenceService.h"
 #include "support/QenEnvironment.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 
@@ -94,7 +94,7 @@ class RescueTest : public GuiSimFixture {
   }
   // The sequence as this client last read it, after it set the first block's length.
   Dstring EditSequence() {
-    CSequence* sequence = CPortInfo::GetSequence();
+    CSequence* sequence = SequenceService::GetSequence();
     EXPECT_EQ(sequence->ReadSequence(mList, 1), 0) << mList.ToText();
     EXPECT_EQ(sequence->SetBlockLength(1, 777, mList), 0) << mList.ToText();
     return sequence->GetLastExpression();

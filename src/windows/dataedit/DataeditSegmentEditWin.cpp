@@ -30,9 +30,9 @@
 #include "segments/SegmentCatalogFollower.h"
 #include "segments/SegmentTextFile.h"
 #include "segments/ui/SegmentGridManager.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SequenceSegmentUse.h"
+#include "sequences/SequenceService.h"
 #include "support/ConditionListLoader.h"
 #include "support/FWBlocker.h"
 #include "toolkit/Toolkit.h"
@@ -333,7 +333,7 @@ int DataeditSegmentEditWin::CreateSegment(const SegmentProperties& properties, C
 }
 
 Dstring DataeditSegmentEditWin::DeleteQuestion(const Dstring& name) {
-  CSequence* sequence = CPortInfo::GetSequence();
+  CSequence* sequence = SequenceService::GetSequence();
   std::vector<unsigned long> blocks;
   if (sequence != nullptr) {
     // The sequence as the instrument holds it now; under a lock, as last read.

@@ -10,9 +10,9 @@
 #include "core/uiapp.h"
 #include "params/ui/BoundControl.h"
 #include "segments/SegmentCatalogFollower.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SequenceLoopRules.h"
+#include "sequences/SequenceService.h"
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/WaitCursor.h"
@@ -29,7 +29,7 @@ LoopGridEditWin::LoopGridEditWin(QWidget* parent)
 LoopGridEditWin::~LoopGridEditWin() = default;
 
 CSequence* LoopGridEditWin::GetSequence() {
-  return CPortInfo::GetSequence();
+  return SequenceService::GetSequence();
 }
 
 int LoopGridEditWin::Load(ConditionList& list) {

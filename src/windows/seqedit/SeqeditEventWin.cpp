@@ -9,8 +9,8 @@
 #include <QTableWidget>
 
 #include "params/ui/BoundControl.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
+#include "sequences/SequenceService.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
 
@@ -37,7 +37,7 @@ int SeqeditEventWin::Load(ConditionList& list) {
   mTable = findChild<QTableWidget*>(QStringLiteral("TableReactions"));
   mNew = findChild<QPushButton*>(QStringLiteral("PButNew"));
   mDelete = findChild<QPushButton*>(QStringLiteral("PButDelete"));
-  CSequence* sequence = CPortInfo::GetSequence();
+  CSequence* sequence = SequenceService::GetSequence();
   if (mBlockLabel == nullptr || mState == nullptr || mSync == nullptr || mMeasure == nullptr ||
       mTrigger == nullptr || mTable == nullptr || mNew == nullptr || mDelete == nullptr ||
       sequence == nullptr) {
@@ -87,7 +87,7 @@ void SeqeditEventWin::ShowBlock(unsigned long block) {
 
 void SeqeditEventWin::Fill() {
   mFollower->Refreshed();
-  const CSequence* sequence = CPortInfo::GetSequence();
+  const CSequence* sequence = SequenceService::GetSequence();
   if (sequence == nullptr || mTable == nullptr) return;
   mFilling = true;
   const bool exists = mBlock >= 1 && mBlock <= sequence->GetNumBlocks();
@@ -135,7 +135,7 @@ void SeqeditEventWin::Fill() {
 }
 
 int SeqeditEventWin::Run(const std::function<int(CSequence&, ConditionList&)>& edit) {
-  CSequence* sequence = CPortInfo::GetSequence();
+  CSequence* sequence = SequenceService::GetSequence();
   if (sequence == nullptr) return 0;
   ConditionList list;
   const int status = edit(*sequence, list);

@@ -9,6 +9,7 @@
 #include "params/ui/BoundControl.h"
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
+#include "sequences/SequenceService.h"
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
@@ -32,7 +33,7 @@ int SeqeditSeqEdWin::Load(ConditionList& list) {
   auto* events = findChild<QPushButton*>(QStringLiteral("PButEvents"));
   auto* grid = findChild<QPushButton*>(QStringLiteral("PButLoopGrid"));
   auto* simple = findChild<QPushButton*>(QStringLiteral("PButSimple"));
-  CSequence* sequence = CPortInfo::GetSequence();
+  CSequence* sequence = SequenceService::GetSequence();
   if (mSummary == nullptr || mTable == nullptr || mEventsLabel == nullptr || mEvents == nullptr ||
       events == nullptr || grid == nullptr || simple == nullptr || sequence == nullptr) {
     list.Add(1,
@@ -69,7 +70,7 @@ unsigned long SeqeditSeqEdWin::CurrentBlock() const {
 }
 
 QString SeqeditSeqEdWin::LoopsOf(unsigned long block) {
-  const CSequence* sequence = CPortInfo::GetSequence();
+  const CSequence* sequence = SequenceService::GetSequence();
   QStringList loops;
   for (unsigned long level = CSequence::GetNumLoopLevels(); sequence != nullptr && level >= 1; --level) {
     if (sequence->GetLoopStatus(block, level) == CSequence::LOOP_NONE) continue;
@@ -85,7 +86,7 @@ QString SeqeditSeqEdWin::LoopsOf(unsigned long block) {
 
 void SeqeditSeqEdWin::Fill() {
   mFollower->Refreshed();
-  const CSequence* sequence = CPortInfo::GetSequence();
+  const CSequence* sequence = SequenceService::GetSequence();
   if (sequence == nullptr || mTable == nullptr) return;
   const unsigned long blocks = sequence->GetNumBlocks();
   const int current = mTable->currentRow();
@@ -126,7 +127,7 @@ void SeqeditSeqEdWin::Fill() {
 
 // The ten events belong to a central module; without one the sequencer has none.
 void SeqeditSeqEdWin::FillEvents() {
-  const CSequence* sequence = CPortInfo::GetSequence();
+  const CSequence* sequence = SequenceService::GetSequence();
   const bool central = CPortInfo::HasCentral();
   mEventsLabel->setText(
       central
@@ -162,7 +163,7 @@ void SeqeditSeqEdWin::FillEvents() {
 }
 
 int SeqeditSeqEdWin::SetEventField(int index, int column, const QString& text) {
-  CSequence* sequence = CPortInfo::GetSequence();
+  CSequence* sequence = SequenceService::GetSequence();
   if (sequence == nullptr || index < 0 || index >= static_cast<int>(CSequenceEvents::kNumEvents)) return 0;
   CSequenceEvents::Event event = sequence->GetEvents().GetEvent(static_cast<std::size_t>(index));
   ConditionList list;

@@ -2,11 +2,11 @@
 
 #include "params/ui/BoundControl.h"
 #include "segments/QenSegmentPool.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/SegmentPortInstanceInfo.h"
 #include "sequences/SequenceBlockInstanceInfo.h"
 #include "sequences/SequenceInstanceInfo.h"
+#include "sequences/SequenceService.h"
 #include "support/ConditionListLoader.h"
 #include "windows/InstanceWindows.h"
 #include "windows/MainWin.h"
@@ -60,7 +60,7 @@ QWidget* SequenceWindows::OpenEvents(QWidget* from, unsigned long block) {
 }
 
 QWidget* SequenceWindows::OpenSegment(QWidget* from, unsigned long block, unsigned long port) {
-  const CSequence* sequence = CPortInfo::GetSequence();
+  const CSequence* sequence = SequenceService::GetSequence();
   if (sequence == nullptr || sequence->GetType(block, port) != CSequence::SEG_NAMED) return nullptr;
   const Dstring name = sequence->GetSegment(block, port);
   // A name the instrument does not have opens no window: it would make a new, empty segment.

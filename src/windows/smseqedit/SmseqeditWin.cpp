@@ -9,10 +9,10 @@
 
 #include "params/ui/BoundControl.h"
 #include "segments/SegmentCatalogFollower.h"
-#include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
 #include "sequences/SequenceCellEdit.h"
+#include "sequences/SequenceService.h"
 #include "sequences/SequenceUndo.h"
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
@@ -28,7 +28,7 @@ SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::ma
 
 SmseqeditWin::~SmseqeditWin() = default;
 
-CSequence* SmseqeditWin::GetSequence() { return CPortInfo::GetSequence(); }
+CSequence* SmseqeditWin::GetSequence() { return SequenceService::GetSequence(); }
 
 int SmseqeditWin::Load(ConditionList& list) {
   if (int status = ResourceLibrary::LoadInto("smseqedit.Win", this, list)) return status;
