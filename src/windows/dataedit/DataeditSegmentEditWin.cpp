@@ -37,8 +37,8 @@
 #include "support/FWBlocker.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/FormDialog.h"
-#include "windows/ServerWorkProgress.h"
+#include "windows/common/FormDialog.h"
+#include "windows/common/ServerWorkProgress.h"
 
 // A menu entry: its text and key, what it does, and when it is offered.
 struct DataeditSegmentEditWin::Command {

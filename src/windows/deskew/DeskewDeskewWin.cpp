@@ -6,8 +6,8 @@
 #include "sequences/CPortInfo.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "ui_deskew.DeskewWin.h"
-#include "windows/PlaceName.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/PlaceName.h"
+#include "windows/common/TaskFollower.h"
 
 DeskewDeskewWin::DeskewDeskewWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::DeskewWin>()) {
   setObjectName(QStringLiteral("DeskewDeskewWin"));

@@ -9,7 +9,7 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/BerAtStop.h"
+#include "windows/common/BerAtStop.h"
 #include "windows/errstate/ErrStateGridManager.h"
 
 class ErrstateErrStateWin::View : public QenDsView {

@@ -17,8 +17,8 @@
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/WaitCursor.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/PortHeader.h"
-#include "windows/seqedit/SequenceFileMenu.h"
+#include "windows/common/PortHeader.h"
+#include "windows/common/SequenceFileMenu.h"
 #include "windows/seqedit/SequenceWindows.h"
 
 LoopGridEditWin::LoopGridEditWin(QWidget* parent)

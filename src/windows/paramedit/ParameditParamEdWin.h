@@ -6,7 +6,7 @@
 
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
-#include "windows/LockAware.h"
+#include "windows/common/LockAware.h"
 
 class QLabel;
 class QStackedWidget;

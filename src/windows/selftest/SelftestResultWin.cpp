@@ -12,8 +12,8 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/PlaceName.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/PlaceName.h"
+#include "windows/common/TaskFollower.h"
 
 // Told when the instrument starts or stops, for the start button.
 class SelftestResultWin::RunView : public QenDsView {

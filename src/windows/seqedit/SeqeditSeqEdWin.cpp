@@ -13,7 +13,7 @@
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/MainWin.h"
-#include "windows/seqedit/SequenceFileMenu.h"
+#include "windows/common/SequenceFileMenu.h"
 #include "windows/seqedit/SequenceWindows.h"
 
 SeqeditSeqEdWin::SeqeditSeqEdWin(QWidget* parent)

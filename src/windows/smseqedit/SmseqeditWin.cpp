@@ -18,9 +18,9 @@
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/MainWin.h"
-#include "windows/PortHeader.h"
+#include "windows/common/PortHeader.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
-#include "windows/seqedit/SequenceFileMenu.h"
+#include "windows/common/SequenceFileMenu.h"
 
 SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })) {
   setObjectName(QStringLiteral("SmseqeditWin"));

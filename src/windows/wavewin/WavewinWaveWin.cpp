@@ -21,8 +21,8 @@
 #include "support/ConditionListLoader.h"
 #include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/PlaceName.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/PlaceName.h"
+#include "windows/common/TaskFollower.h"
 
 namespace {
 
