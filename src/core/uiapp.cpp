@@ -82,12 +82,27 @@ void ForEachStateView(F f, RunStopDs* r, SystemStateDs* s, PLLStateDs* p, DataPo
 
 }  // namespace
 
-const std::vector<Dstring>& uiapp::WindowResources() {
-  static const std::vector<Dstring> resources = {
-      "paramedit.ParamEd", "bconnect.ConnectWin", "dataedit.SegmentEditWin", "errstate.ErrStateWin",
-      "seqedit.SeqEdWin",  "deskew.DeskewWin",    "ber.BerWin",              "measconf.MeasMode",
-      "dtecmd.CmdWin",     "error.ErrorWin",      "wavewin.WaveWin",         "LoopGridEdit.Win",
-      "smseqedit.Win"};
+const std::vector<WindowResource>& uiapp::WindowResources() {
+  // Editors first, then the tools used all day: the first nine on the menu have Ctrl+1 … Ctrl+9.
+  static const std::vector<WindowResource> resources = {
+      {"paramedit.ParamEd", "Parameter Editor", true, true, true},
+      {"dataedit.SegmentEditWin", "Segment Editor", true, true, true},
+      {"smseqedit.Win", "Simple Sequence", true, true, true},
+      {"LoopGridEdit.Win", "Loop Grid", true, true, true},
+      {"seqedit.SeqEdWin", "Sequence", true, true, true},
+      {"bconnect.ConnectWin", "System Scheme", true, true, false},
+      {"dtecmd.CmdWin", "Command Window", true, true, false},
+      {"error.ErrorWin", "Error List", true, true, false},
+      {"ber.BerWin", "Bit Error Rate", true, true, false},
+      {"errstate.ErrStateWin", "Error State", true, true, false},
+      {"wavewin.WaveWin", "Waveform", true, true, false},
+      {"measconf.MeasMode", "Measurement Mode", true, true, true},
+      {"deskew.DeskewWin", "Deskew", true, true, false},
+      // The self test's window: on the menu, and opened by DoSelfTest.
+      {"selftest.Result", "Self Test", false, true, false},
+      // A block's events: opened from the sequence windows, one per block.
+      {"seqedit.EventWin", "Events", false, false, false},
+  };
   return resources;
 }
 
@@ -180,11 +195,15 @@ void uiapp::RegisterEvents() { Toolkit::Get().RegisterScriptItems("events", mEve
 void uiapp::RegisterVerbs() { Toolkit::Get().RegisterScriptItems("verbs", mVerbs, 1); }
 
 void uiapp::RegisterWindows() {
-  for (const auto& resource : WindowResources()) Toolkit::Get().RegisterWindow(resource);
+  for (const WindowResource& window : WindowResources()) {
+    if (window.bound) Toolkit::Get().RegisterWindow(window.resource);
+  }
 }
 
 void uiapp::UnregisterWindows() {
-  for (const auto& resource : WindowResources()) Toolkit::Get().UnregisterWindow(resource);
+  for (const WindowResource& window : WindowResources()) {
+    if (window.bound) Toolkit::Get().UnregisterWindow(window.resource);
+  }
 }
 
 int uiapp::RegistrationFinished(StartUse use) {

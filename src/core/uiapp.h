@@ -2,6 +2,7 @@
 
 #include <vector>
 
+#include "core/WindowResource.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
 #include "settings/SettingMRU.h"
@@ -51,8 +52,10 @@ class uiapp {
   // The start-up configuration and the first setting; then the setting is followed. 0, or
   // SettingsStatus::kStartCancelled when the user cancelled the start-up dialog: the start ends.
   static int RegistrationFinished(StartUse use = StartUse::kConfigured);
-  // The window resources bound by RegisterWindows, in order.
-  static const std::vector<Dstring>& WindowResources();
+  // Every window of the library, in the order of the Windows menu: RegisterWindows binds those
+  // marked bound, the main window's menu shows those on the menu, and the window factory builds
+  // any of them.
+  static const std::vector<WindowResource>& WindowResources();
 
   static int CreateAppHandle(Dstring& handle, const Dstring& resource, ConditionList& list);
   static int DestroyAppHandle(const Dstring& handle, ConditionList& list);

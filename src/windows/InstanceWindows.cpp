@@ -7,6 +7,7 @@
 #include "sequences/InstanceInfo.h"
 #include "toolkit/WaitCursor.h"
 #include "windows/MainWin.h"
+#include "windows/WindowFactory.h"
 
 namespace {
 
@@ -43,7 +44,7 @@ const InstanceInfo* InstanceWindows::GetInstanceInfo(const QWidget* window) {
   return holder == nullptr ? nullptr : &holder->Info();
 }
 
-QWidget* InstanceWindows::Open(MainWin& main, const WindowFactory::Entry& entry, const InstanceInfo& info,
+QWidget* InstanceWindows::Open(MainWin& main, const Dstring& resource, const InstanceInfo& info,
                                const QString& title, ConditionList& list) {
   if (QWidget* open = Find(main, info)) {
     auto* sub = qobject_cast<QMdiSubWindow*>(open->parentWidget());
@@ -55,10 +56,10 @@ QWidget* InstanceWindows::Open(MainWin& main, const WindowFactory::Entry& entry,
   QWidget* window = nullptr;
   {
     WaitCursor wait;
-    window = entry.make(nullptr, list);
+    window = WindowFactory::Make(resource, nullptr, list);
   }
   if (window == nullptr) return nullptr;
-  QMdiSubWindow* sub = main.Adopt(window, QString::fromStdString(entry.resource), title);
+  QMdiSubWindow* sub = main.Adopt(window, QString::fromStdString(resource), title);
   new Holder(info, sub);
   return window;
 }

@@ -3,7 +3,7 @@
 #include <QString>
 
 #include "support/ConditionList.h"
-#include "windows/WindowFactory.h"
+#include "support/Dstring.h"
 
 class InstanceInfo;
 class MainWin;
@@ -14,10 +14,10 @@ class QWidget;
 // opening another; each window keeps a copy of its record for as long as it is open.
 class InstanceWindows {
  public:
-  // The window of `entry` for the record, raised or built and shown in the main window's area
-  // under `title`; null when it cannot be built (the condition is in the list).
-  static QWidget* Open(MainWin& main, const WindowFactory::Entry& entry, const InstanceInfo& info,
-                       const QString& title, ConditionList& list);
+  // The window of `resource` for the record, raised or built and shown in the main window's
+  // area under `title`; null when it cannot be built (the condition is in the list).
+  static QWidget* Open(MainWin& main, const Dstring& resource, const InstanceInfo& info, const QString& title,
+                       ConditionList& list);
   // The open window of a record equal to `info`; null when there is none.
   static QWidget* Find(const MainWin& main, const InstanceInfo& info);
   // The record a window was opened for; null for a window opened without one.

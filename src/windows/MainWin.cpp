@@ -31,10 +31,11 @@
 #include "toolkit/Toolkit.h"
 #include "toolkit/WaitCursor.h"
 #include "toolkit/qt/StatusNotice.h"
-#include "windows/FileChoice.h"
+#include "windows/common/FileChoice.h"
 #include "windows/InstrumentWaitView.h"
-#include "windows/LockAware.h"
+#include "windows/common/LockAware.h"
 #include "windows/RefusalText.h"
+#include "windows/SequenceWindows.h"
 #include "windows/StateStatusBar.h"
 #include "windows/WindowFactory.h"
 #include "windows/selftest/SelftestResultWin.h"
@@ -215,7 +216,8 @@ void MainWin::BuildInstrumentMenu() {
 void MainWin::BuildWindowsMenu() {
   QMenu* menu = menuBar()->addMenu(QStringLiteral("&Windows"));
   int index = 1;
-  for (const WindowFactory::Entry& entry : WindowFactory::Entries()) {
+  for (const WindowResource& entry : uiapp::WindowResources()) {
+    if (!entry.onMenu) continue;
     const QString resource = QString::fromStdString(entry.resource);
     QAction* action = menu->addAction(QString::fromStdString(entry.title), this, [this, resource] { OpenWindow(resource); });
     if (index <= 9) action->setShortcut(QKeySequence(Qt::CTRL | (Qt::Key_0 + index)));
@@ -278,14 +280,12 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
     open->setFocus();
     return open;
   }
-  const WindowFactory::Entry* entry = WindowFactory::Find(resource.toStdString());
+  const WindowResource* entry = WindowFactory::Find(resource.toStdString());
   ConditionList list;
   QWidget* window = nullptr;
-  if (entry == nullptr) {
-    list.Add(1, "There is no window \"" + resource.toStdString() + "\" in this program.");
-  } else {
+  {
     WaitCursor wait;
-    window = entry->make(nullptr, list);
+    window = WindowFactory::Make(resource.toStdString(), nullptr, list);
   }
   if (window == nullptr) {
     // Refused by the lock, a window's reads add no condition: say why it did not open.
@@ -299,6 +299,16 @@ QWidget* MainWin::OpenWindow(const QString& resource) {
   Show(list);
   return window;
 }
+
+QWidget* MainWin::OpenSequence() { return SequenceWindows::OpenSequence(*this); }
+
+QWidget* MainWin::OpenEvents(unsigned long block) { return SequenceWindows::OpenEvents(*this, block); }
+
+QWidget* MainWin::OpenSegment(unsigned long block, unsigned long port) {
+  return SequenceWindows::OpenSegment(*this, block, port);
+}
+
+QWidget* MainWin::ShowSegment(const Dstring& name) { return SequenceWindows::ShowSegment(*this, name); }
 
 QMdiSubWindow* MainWin::Adopt(QWidget* window, const QString& resource, const QString& title) {
   window->setAttribute(Qt::WA_DeleteOnClose);

@@ -5,6 +5,8 @@
 #include <QPair>
 #include <memory>
 
+#include "windows/common/WindowOpener.h"
+
 class QAction;
 class QLabel;
 class QenDs;
@@ -24,8 +26,8 @@ class Dstring;
 // It all comes back by itself when the lock goes. The self test is also off while the
 // instrument runs, as the instrument refuses it then. The title names the setting the
 // instrument holds, with " *" while it is modified; New, Open and Quit ask to save a modified
-// setting first.
-class MainWin : public QMainWindow {
+// setting first. It is the opener every window asks for another window.
+class MainWin : public QMainWindow, public WindowOpener {
   Q_OBJECT
 
  public:
@@ -36,7 +38,11 @@ class MainWin : public QMainWindow {
   void Attach();
   // Opens the window of a resource, or raises it when it is open; null when it cannot be built
   // (the condition has been shown).
-  QWidget* OpenWindow(const QString& resource);
+  QWidget* OpenWindow(const QString& resource) override;
+  QWidget* OpenSequence() override;
+  QWidget* OpenEvents(unsigned long block) override;
+  QWidget* OpenSegment(unsigned long block, unsigned long port) override;
+  QWidget* ShowSegment(const Dstring& name) override;
   QWidget* FindWindow(const QString& resource) const;
   // Shows a built window in the area as a window of the resource, under the title.
   QMdiSubWindow* Adopt(QWidget* window, const QString& resource, const QString& title);

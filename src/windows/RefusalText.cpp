@@ -20,7 +20,7 @@
 #include "params/ui/BoundControl.h"
 #include "support/FWBlocker.h"
 #include "support/ParserExpression.h"
-#include "windows/PlaceName.h"
+#include "windows/common/PlaceName.h"
 
 namespace {
 

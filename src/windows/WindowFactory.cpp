@@ -1,5 +1,9 @@
 #include "windows/WindowFactory.h"
 
+#include <functional>
+#include <map>
+
+#include "core/uiapp.h"
 #include "windows/bconnect/BconnectConnectWin.h"
 #include "windows/ber/BerBerWin.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
@@ -11,14 +15,17 @@
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
+#include "windows/seqedit/SeqeditEventWin.h"
 #include "windows/seqedit/SeqeditSeqEdWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 #include "windows/wavewin/WavewinWaveWin.h"
 
 namespace {
 
+using Maker = std::function<QWidget*(QWidget* parent, ConditionList& list)>;
+
 template <class T>
-WindowFactory::Make Maker() {
+Maker Of() {
   return [](QWidget* parent, ConditionList& list) -> QWidget* {
     auto* window = new T(parent);
     if (window->Load(list) == 0) return window;
@@ -27,32 +34,42 @@ WindowFactory::Make Maker() {
   };
 }
 
-}  // namespace
-
-const std::vector<WindowFactory::Entry>& WindowFactory::Entries() {
-  // Editors first, then the tools used all day: the first nine have Ctrl+1 … Ctrl+9.
-  static const std::vector<Entry> kEntries = {
-      {"paramedit.ParamEd", "Parameter Editor", Maker<ParameditParamEdWin>(), true},
-      {"dataedit.SegmentEditWin", "Segment Editor", Maker<DataeditSegmentEditWin>(), true},
-      {"smseqedit.Win", "Simple Sequence", Maker<SmseqeditWin>(), true},
-      {"LoopGridEdit.Win", "Loop Grid", Maker<LoopGridEditWin>(), true},
-      {"seqedit.SeqEdWin", "Sequence", Maker<SeqeditSeqEdWin>(), true},
-      {"bconnect.ConnectWin", "System Scheme", Maker<BconnectConnectWin>()},
-      {"dtecmd.CmdWin", "Command Window", Maker<DtecmdCmdWin>()},
-      {"error.ErrorWin", "Error List", Maker<ErrorErrorWin>()},
-      {"ber.BerWin", "Bit Error Rate", Maker<BerBerWin>()},
-      {"errstate.ErrStateWin", "Error State", Maker<ErrstateErrStateWin>()},
-      {"wavewin.WaveWin", "Waveform", Maker<WavewinWaveWin>()},
-      {"measconf.MeasMode", "Measurement Mode", Maker<MeasconfMeasModeDlg>(), true},
-      {"deskew.DeskewWin", "Deskew", Maker<DeskewDeskewWin>()},
-      {"selftest.Result", "Self Test", Maker<SelftestResultWin>()},
+// The class of each resource; the order and everything else is the table's.
+const std::map<Dstring, Maker>& Makers() {
+  static const std::map<Dstring, Maker> makers = {
+      {"paramedit.ParamEd", Of<ParameditParamEdWin>()},
+      {"dataedit.SegmentEditWin", Of<DataeditSegmentEditWin>()},
+      {"smseqedit.Win", Of<SmseqeditWin>()},
+      {"LoopGridEdit.Win", Of<LoopGridEditWin>()},
+      {"seqedit.SeqEdWin", Of<SeqeditSeqEdWin>()},
+      {"bconnect.ConnectWin", Of<BconnectConnectWin>()},
+      {"dtecmd.CmdWin", Of<DtecmdCmdWin>()},
+      {"error.ErrorWin", Of<ErrorErrorWin>()},
+      {"ber.BerWin", Of<BerBerWin>()},
+      {"errstate.ErrStateWin", Of<ErrstateErrStateWin>()},
+      {"wavewin.WaveWin", Of<WavewinWaveWin>()},
+      {"measconf.MeasMode", Of<MeasconfMeasModeDlg>()},
+      {"deskew.DeskewWin", Of<DeskewDeskewWin>()},
+      {"selftest.Result", Of<SelftestResultWin>()},
+      {"seqedit.EventWin", Of<SeqeditEventWin>()},
   };
-  return kEntries;
+  return makers;
 }
 
-const WindowFactory::Entry* WindowFactory::Find(const Dstring& resource) {
-  for (const Entry& e : Entries()) {
-    if (e.resource == resource) return &e;
+}  // namespace
+
+const WindowResource* WindowFactory::Find(const Dstring& resource) {
+  for (const WindowResource& window : uiapp::WindowResources()) {
+    if (window.resource == resource) return &window;
   }
   return nullptr;
+}
+
+QWidget* WindowFactory::Make(const Dstring& resource, QWidget* parent, ConditionList& list) {
+  const auto maker = Makers().find(resource);
+  if (Find(resource) == nullptr || maker == Makers().end()) {
+    list.Add(1, "There is no window \"" + resource + "\" in this program.");
+    return nullptr;
+  }
+  return maker->second(parent, list);
 }

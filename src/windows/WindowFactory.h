@@ -1,27 +1,17 @@
 #pragma once
 
-#include <functional>
-#include <vector>
-
+#include "core/WindowResource.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
 
 class QWidget;
 
-// The windows that are built, by their resource name ("paramedit.ParamEd"), with the title the
-// Windows menu shows. A window that cannot be built returns null with a condition.
+// Builds the windows of the window table (uiapp::WindowResources) by their resource names.
 class WindowFactory {
  public:
-  using Make = std::function<QWidget*(QWidget* parent, ConditionList& list)>;
-  struct Entry {
-    Dstring resource;
-    Dstring title;
-    Make make;
-    // The window reads the instrument to open, so it cannot open while another client holds it.
-    bool needsInstrument = false;
-  };
-
-  // The built windows, in menu order.
-  static const std::vector<Entry>& Entries();
-  static const Entry* Find(const Dstring& resource);
+  // The table's entry of a resource; null for a name not in it.
+  static const WindowResource* Find(const Dstring& resource);
+  // A new, loaded window of the resource under `parent`; null with a condition when the name is
+  // not in the table or the window cannot be built.
+  static QWidget* Make(const Dstring& resource, QWidget* parent, ConditionList& list);
 };

@@ -7,7 +7,7 @@
 #include "common/gui/GuiSimFixture.h"
 #include "params/ui/ParSpinBox.h"
 #include "params/ui/QenParEd.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/TaskFollower.h"
 #include "windows/deskew/DeskewDeskewWin.h"
 
 namespace {

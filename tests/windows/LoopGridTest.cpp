@@ -29,7 +29,6 @@
 #include "windows/loopgridedit/LoopGridEditWin.h"
 #include "windows/seqedit/SeqeditEventWin.h"
 #include "windows/seqedit/SeqeditSeqEdWin.h"
-#include "windows/seqedit/SequenceWindows.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
@@ -294,17 +293,17 @@ TEST_F(LoopGridTest, SegmentsAreTypedPickedAndDropped) {
 TEST_F(LoopGridTest, ASecondOpenOfTheSameRecordRaisesTheOneWindow) {
   Key(Qt::Key_Insert);
   const int before = static_cast<int>(mMain->Area()->subWindowList().size());
-  QWidget* events = SequenceWindows::OpenEvents(mWin, 2);
+  QWidget* events = mMain->OpenEvents(2);
   ASSERT_NE(events, nullptr);
-  QWidget* sequence = SequenceWindows::OpenSequence(mWin);
+  QWidget* sequence = mMain->OpenSequence();
   ASSERT_NE(sequence, nullptr);
   mMain->Area()->setActiveSubWindow(mMain->Area()->subWindowList().front());
-  EXPECT_EQ(SequenceWindows::OpenEvents(mWin, 2), events);
+  EXPECT_EQ(mMain->OpenEvents(2), events);
   EXPECT_EQ(mMain->Area()->activeSubWindow()->widget(), events);
-  EXPECT_EQ(SequenceWindows::OpenSequence(mWin), sequence);
+  EXPECT_EQ(mMain->OpenSequence(), sequence);
   EXPECT_EQ(mMain->OpenWindow(QStringLiteral("seqedit.SeqEdWin")), sequence);
   EXPECT_EQ(mMain->Area()->subWindowList().size(), before + 2);
-  QWidget* other = SequenceWindows::OpenEvents(mWin, 1);
+  QWidget* other = mMain->OpenEvents(1);
   EXPECT_NE(other, events);
   EXPECT_EQ(mMain->Area()->subWindowList().size(), before + 3);
   const auto* record =
@@ -314,10 +313,10 @@ TEST_F(LoopGridTest, ASecondOpenOfTheSameRecordRaisesTheOneWindow) {
 
   MakeSegment("Grid/Open", 256, 1);
   ASSERT_EQ(mGrid->SetCellText(1, mGrid->PortField(1), QStringLiteral("Grid/Open")), 0);
-  QWidget* segment = SequenceWindows::OpenSegment(mWin, 1, 1);
+  QWidget* segment = mMain->OpenSegment(1, 1);
   ASSERT_NE(segment, nullptr);
-  EXPECT_EQ(SequenceWindows::OpenSegment(mWin, 1, 1), segment);
-  EXPECT_EQ(SequenceWindows::OpenSegment(mWin, 1, 2), nullptr) << "a kind word is no segment to open";
+  EXPECT_EQ(mMain->OpenSegment(1, 1), segment);
+  EXPECT_EQ(mMain->OpenSegment(1, 2), nullptr) << "a kind word is no segment to open";
   EXPECT_EQ(mMain->Area()->subWindowList().size(), before + 4);
   mMain->Area()->closeAllSubWindows();
   QenSegmentPool::Delete("Grid/Open", mList);
@@ -326,7 +325,7 @@ TEST_F(LoopGridTest, ASecondOpenOfTheSameRecordRaisesTheOneWindow) {
 // A block's reactions edited in its event window reach the instrument.
 TEST_F(LoopGridTest, EventWindowEditsReachTheInstrument) {
   Key(Qt::Key_Insert);
-  auto* events = qobject_cast<SeqeditEventWin*>(SequenceWindows::OpenEvents(mWin, 2));
+  auto* events = qobject_cast<SeqeditEventWin*>(mMain->OpenEvents(2));
   ASSERT_NE(events, nullptr);
   ASSERT_EQ(events->NewReaction(), 0);
   ASSERT_EQ(events->Table()->rowCount(), 1);
@@ -375,7 +374,7 @@ TEST_F(LoopGridTest, BlocksMoveWithTheirKeysAndTheSequenceEditorFollows) {
   EXPECT_EQ(Server(), "(3.0,\"\",(SEQ," + b + ",\"\",(LOOP2,0,3,\"\",(SEQ,(LOOP1,0,4,\"\",(SEQ," + b +
                           ",\"\"," + b + ")),\"\"," + b + ")),\"\"," + copied + "))");
 
-  auto* sequence = qobject_cast<SeqeditSeqEdWin*>(SequenceWindows::OpenSequence(mWin));
+  auto* sequence = qobject_cast<SeqeditSeqEdWin*>(mMain->OpenSequence());
   ASSERT_NE(sequence, nullptr);
   ASSERT_EQ(sequence->Table()->rowCount(), 5);
   EXPECT_EQ(SeqeditSeqEdWin::LoopsOf(3), QStringLiteral("L2 \u00D73 2\u20134   L1 \u00D74 2\u20133"));
@@ -526,7 +525,7 @@ TEST_F(LoopGridTest, ASegmentInUseIsDeletedOnlyWithAWarningAndRunIsRefusedWithou
 
   // The stale name opens nothing, and makes nothing.
   mAlerts.clear();
-  EXPECT_EQ(SequenceWindows::OpenSegment(mWin, 1, 1), nullptr);
+  EXPECT_EQ(mMain->OpenSegment(1, 1), nullptr);
   QCoreApplication::processEvents();
   ASSERT_EQ(mAlerts.size(), 1u);
   EXPECT_NE(mAlerts[0].find("The instrument has no segment \"walkB8\""), std::string::npos) << mAlerts[0];

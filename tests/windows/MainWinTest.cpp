@@ -3,6 +3,7 @@
 #include <QApplication>
 #include <QLabel>
 #include <QLineEdit>
+#include <QMenuBar>
 #include <QMdiArea>
 #include <QMdiSubWindow>
 #include <QPushButton>
@@ -76,6 +77,37 @@ TEST_F(MainWinTest, AWindowOpensOnceAndIsRaisedWhenAskedAgain) {
   QCoreApplication::processEvents();
   ASSERT_EQ(mAlerts.size(), 1u);
   EXPECT_NE(mAlerts[0].find("nosuch.Win"), Dstring::npos);
+}
+
+// The Windows menu is the window table's: its entries in the table's order, Ctrl+1 … Ctrl+9 on
+// the first nine and none after, and each opens the table's window under the table's title.
+TEST_F(MainWinTest, TheWindowsMenuOpensEachWindowOfTheTableUnderItsTitle) {
+  QMenu* menu = nullptr;
+  for (QAction* top : mWin->menuBar()->actions()) {
+    if (top->text() == QStringLiteral("&Windows")) menu = top->menu();
+  }
+  ASSERT_NE(menu, nullptr);
+  QList<QAction*> entries;
+  for (QAction* action : menu->actions()) {
+    if (action->isSeparator()) break;
+    entries << action;
+  }
+  std::vector<const WindowResource*> onMenu;
+  for (const WindowResource& window : uiapp::WindowResources()) {
+    if (window.onMenu) onMenu.push_back(&window);
+  }
+  ASSERT_EQ(static_cast<std::size_t>(entries.size()), onMenu.size());
+  ASSERT_GT(onMenu.size(), 9u);
+  for (std::size_t i = 0; i < onMenu.size(); ++i) {
+    SCOPED_TRACE(onMenu[i]->resource);
+    QAction* entry = entries[static_cast<int>(i)];
+    EXPECT_EQ(entry->text().toStdString(), onMenu[i]->title);
+    EXPECT_EQ(entry->shortcut(), i < 9 ? QKeySequence(Qt::CTRL | (Qt::Key_1 + static_cast<int>(i))) : QKeySequence());
+    entry->trigger();
+    QWidget* window = mWin->FindWindow(QString::fromStdString(onMenu[i]->resource));
+    ASSERT_NE(window, nullptr) << (mAlerts.empty() ? "" : mAlerts.back());
+    EXPECT_EQ(window->parentWidget()->windowTitle().toStdString(), onMenu[i]->title);
+  }
 }
 
 TEST_F(MainWinTest, ParameterEditorWritesAndFollowsASecondClient) {

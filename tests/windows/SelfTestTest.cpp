@@ -10,7 +10,7 @@
 #include "core/SelfTest.h"
 #include "core/uiapp.h"
 #include "windows/MainWin.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/TaskFollower.h"
 #include "windows/selftest/SelftestResultWin.h"
 
 namespace {

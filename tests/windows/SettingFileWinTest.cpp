@@ -18,7 +18,7 @@
 #include <unistd.h>
 
 #include "common/gui/GuiSimFixture.h"
-#include "windows/FileChoice.h"
+#include "windows/common/FileChoice.h"
 #include "windows/MainWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 

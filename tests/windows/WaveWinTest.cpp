@@ -16,7 +16,7 @@
 #include "common/SigrokCli.h"
 #include "common/gui/GuiSimFixture.h"
 #include "instrument/QenGuiInst.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/TaskFollower.h"
 #include "windows/wavewin/WavewinWaveWin.h"
 
 namespace {

@@ -17,6 +17,7 @@
 #include "sequences/ui/SchemeView.h"
 #include "support/FWBlocker.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_bconnect.ConnectWin.h"
 
 namespace {
 
@@ -49,7 +50,7 @@ class BconnectConnectWin::LockView : public QenDsView {
 };
 
 BconnectConnectWin::BconnectConnectWin(QWidget* parent)
-    : QWidget(parent), mLockView(std::make_unique<LockView>(*this)) {
+    : QWidget(parent), mLockView(std::make_unique<LockView>(*this)), mUi(std::make_unique<Ui::BconnectConnectWin>()) {
   setObjectName(QStringLiteral("BconnectConnectWin"));
 }
 
@@ -63,27 +64,22 @@ BconnectConnectWin::~BconnectConnectWin() {
 }
 
 int BconnectConnectWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("bconnect.ConnectWin", this, list)) return status;
-  auto* area = findChild<QWidget*>(QStringLiteral("SchemeArea"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  mSummary = findChild<QLabel*>(QStringLiteral("LabelSummary"));
-  if (area == nullptr || area->layout() == nullptr || mState == nullptr || mSummary == nullptr) {
-    list.Add(1, "The window resource \"bconnect.ConnectWin\" lacks its scheme area or state lines.");
-    return 1;
-  }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  auto* area = mUi->SchemeArea;
+  mState = mUi->LabelState;
+  mSummary = mUi->LabelSummary;
   mView = new SchemeView(area);
   area->layout()->addWidget(mView);
   setFocusProxy(mView);
-  const std::pair<const char*, std::function<void()>> buttons[] = {
-      {"PButZoomIn", [this] { mView->ZoomBy(1.25); }},
-      {"PButZoomOut", [this] { mView->ZoomBy(1 / 1.25); }},
-      {"PButFit", [this] { mView->Fit(); }},
-      {"PButExportPng", [this] { HitPButExport(false); }},
-      {"PButExportSvg", [this] { HitPButExport(true); }},
+  const std::pair<QPushButton*, std::function<void()>> buttons[] = {
+      {mUi->PButZoomIn, [this] { mView->ZoomBy(1.25); }},
+      {mUi->PButZoomOut, [this] { mView->ZoomBy(1 / 1.25); }},
+      {mUi->PButFit, [this] { mView->Fit(); }},
+      {mUi->PButExportPng, [this] { HitPButExport(false); }},
+      {mUi->PButExportSvg, [this] { HitPButExport(true); }},
   };
-  for (const auto& [name, hit] : buttons) {
-    if (auto* b = findChild<QPushButton*>(QLatin1String(name))) connect(b, &QPushButton::clicked, this, hit);
-  }
+  for (const auto& [button, hit] : buttons) connect(button, &QPushButton::clicked, this, hit);
   connect(mView, &SchemeView::ConnectRequested, this,
           [this](const QString& generator, const QString& analyser) {
             ConditionList l;

@@ -10,6 +10,10 @@ class QLabel;
 class QenDs;
 class SchemeView;
 
+namespace Ui {
+class BconnectConnectWin;
+}
+
 // The system scheme window ("bconnect.ConnectWin"): the rack from the port and front-end
 // information with the connections the instrument holds, which the user draws and removes in
 // the scheme. Every change is sent at once and the scheme then shows what the server holds, so a
@@ -57,4 +61,5 @@ class BconnectConnectWin : public QWidget {
   CPortConnections mConnections;
   bool mRegistered = false;
   std::unique_ptr<LockView> mLockView;
+  std::unique_ptr<Ui::BconnectConnectWin> mUi;
 };

@@ -20,8 +20,8 @@
 #include "support/ExportFile.h"
 #include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/BerAtStop.h"
-#include "windows/PlaceName.h"
+#include "windows/common/BerAtStop.h"
+#include "windows/common/PlaceName.h"
 
 namespace {
 

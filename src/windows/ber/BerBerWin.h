@@ -7,7 +7,7 @@
 
 #include "data/BerHistory.h"
 #include "support/ConditionList.h"
-#include "windows/LockAware.h"
+#include "windows/common/LockAware.h"
 
 class QLabel;
 class QPushButton;

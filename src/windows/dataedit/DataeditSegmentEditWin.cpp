@@ -37,8 +37,9 @@
 #include "support/FWBlocker.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/FormDialog.h"
-#include "windows/ServerWorkProgress.h"
+#include "windows/common/FormDialog.h"
+#include "windows/common/ServerWorkProgress.h"
+#include "ui_dataedit.SegmentEditWin.h"
 
 // A menu entry: its text and key, what it does, and when it is offered.
 struct DataeditSegmentEditWin::Command {
@@ -50,7 +51,7 @@ struct DataeditSegmentEditWin::Command {
   std::function<bool(SegmentGridManager&)> possible;
 };
 
-DataeditSegmentEditWin::DataeditSegmentEditWin(QWidget* parent) : QWidget(parent) {
+DataeditSegmentEditWin::DataeditSegmentEditWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::SegmentEditWin>()) {
   setObjectName(QStringLiteral("DataeditSegmentEditWin"));
 }
 
@@ -61,21 +62,16 @@ DataeditSegmentEditWin::~DataeditSegmentEditWin() {
 }
 
 int DataeditSegmentEditWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("dataedit.SegmentEditWin", this, list)) return status;
-  mGrid = findChild<SegmentGridManager*>(QStringLiteral("GridSegment"));
-  mSegments = findChild<QListWidget*>(QStringLiteral("ListSegments"));
-  mFormat = findChild<QComboBox*>(QStringLiteral("CBoxFormat"));
-  mAddr = findChild<QComboBox*>(QStringLiteral("CBoxAddr"));
-  mFind = findChild<QLineEdit*>(QStringLiteral("EditFind"));
-  mGoto = findChild<QLineEdit*>(QStringLiteral("EditGoto"));
-  mCursor = findChild<QLabel*>(QStringLiteral("LabelCursor"));
-  mMessage = findChild<QLabel*>(QStringLiteral("LabelMessage"));
-  if (mGrid == nullptr || mSegments == nullptr || mFormat == nullptr || mAddr == nullptr || mFind == nullptr ||
-      mGoto == nullptr || mCursor == nullptr || mMessage == nullptr) {
-    list.Add(1, "The window resource \"dataedit.SegmentEditWin\" lacks its grid, segment list or tools.");
-    return 1;
-  }
-  layout()->setContentsMargins(8, 6, 8, 6);
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mGrid = mUi->GridSegment;
+  mSegments = mUi->ListSegments;
+  mFormat = mUi->CBoxFormat;
+  mAddr = mUi->CBoxAddr;
+  mFind = mUi->EditFind;
+  mGoto = mUi->EditGoto;
+  mCursor = mUi->LabelCursor;
+  mMessage = mUi->LabelMessage;
   mMessage->setStyleSheet(QStringLiteral("color: #b3261e"));
   BuildMenus();
   connect(mGrid, &GridManager::StateChanged, this, &DataeditSegmentEditWin::ShowState);
@@ -86,8 +82,8 @@ int DataeditSegmentEditWin::Load(ConditionList& list) {
   connect(mSegments, &QListWidget::itemActivated, this, &DataeditSegmentEditWin::HitSegmentChosen);
   // Arrow keys in the list open what they land on, as a click does.
   connect(mSegments, &QListWidget::currentItemChanged, this, &DataeditSegmentEditWin::HitSegmentChosen);
-  connect(findChild<QPushButton*>(QStringLiteral("PButNew")), &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButNew);
-  connect(findChild<QPushButton*>(QStringLiteral("PButDelete")), &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButDelete);
+  connect(mUi->PButNew, &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButNew);
+  connect(mUi->PButDelete, &QPushButton::clicked, this, &DataeditSegmentEditWin::HitPButDelete);
   connect(mFormat, &QComboBox::currentIndexChanged, this, [this](int index) {
     Run([this, index](ConditionList& l) { return mGrid->SetDataFormat(0, static_cast<DataFormat>(index), l); });
   });
@@ -99,8 +95,8 @@ int DataeditSegmentEditWin::Load(ConditionList& list) {
     ShowState();
   });
   connect(mFind, &QLineEdit::returnPressed, Action(QStringLiteral("FindNext")), &QAction::trigger);
-  connect(findChild<QPushButton*>(QStringLiteral("PButFindNext")), &QPushButton::clicked, Action(QStringLiteral("FindNext")), &QAction::trigger);
-  connect(findChild<QPushButton*>(QStringLiteral("PButFindPrev")), &QPushButton::clicked, Action(QStringLiteral("FindPrevious")), &QAction::trigger);
+  connect(mUi->PButFindNext, &QPushButton::clicked, Action(QStringLiteral("FindNext")), &QAction::trigger);
+  connect(mUi->PButFindPrev, &QPushButton::clicked, Action(QStringLiteral("FindPrevious")), &QAction::trigger);
   connect(mGoto, &QLineEdit::returnPressed, this, &DataeditSegmentEditWin::HitGoto);
   setFocusProxy(mGrid);
   mCatalog = std::make_unique<SegmentCatalogFollower>([this] { FillList(); });

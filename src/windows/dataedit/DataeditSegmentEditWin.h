@@ -16,6 +16,10 @@ class QListWidget;
 class SegmentCatalogFollower;
 class SegmentGridManager;
 
+namespace Ui {
+class SegmentEditWin;
+}
+
 // The segment editor ("dataedit.SegmentEditWin"): the saved segments of the instrument on the
 // left (open one by choosing it, make a new one, delete one), and the segment grid of the open
 // one with its menus: the editing commands, each offered only while the grid says it is
@@ -105,4 +109,5 @@ class DataeditSegmentEditWin : public QWidget {
   QLabel* mMessage = nullptr;
   std::vector<std::pair<QAction*, std::function<bool()>>> mOffered;
   std::unique_ptr<SegmentCatalogFollower> mCatalog;
+  std::unique_ptr<Ui::SegmentEditWin> mUi;
 };

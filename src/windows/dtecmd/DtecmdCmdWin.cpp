@@ -21,35 +21,28 @@
 #include "support/ParserExpression.h"
 #include "toolkit/WaitCursor.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_dtecmd.CmdWin.h"
 
-DtecmdCmdWin::DtecmdCmdWin(QWidget* parent) : QWidget(parent) { setObjectName(QStringLiteral("DtecmdCmdWin")); }
+DtecmdCmdWin::DtecmdCmdWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::CmdWin>()) { setObjectName(QStringLiteral("DtecmdCmdWin")); }
 
 DtecmdCmdWin::~DtecmdCmdWin() {
   ConditionList ignored;
   mHistory.Write(ignored);
 }
 
-int DtecmdCmdWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("dtecmd.CmdWin", this, list)) return status;
-  mTranscript = findChild<QPlainTextEdit*>(QStringLiteral("TextTranscript"));
-  mInput = findChild<QLineEdit*>(QStringLiteral("EditCommand"));
-  if (mTranscript == nullptr || mInput == nullptr) {
-    list.Add(1, "The window resource \"dtecmd.CmdWin\" lacks its transcript or its command field.");
-    return 1;
-  }
+int DtecmdCmdWin::Load(ConditionList&) {
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTranscript = mUi->TextTranscript;
+  mInput = mUi->EditCommand;
   mTranscript->setFont(QFontDatabase::systemFont(QFontDatabase::FixedFont));
   mInput->setFont(QFontDatabase::systemFont(QFontDatabase::FixedFont));
   mInput->installEventFilter(this);
   connect(mInput, &QLineEdit::returnPressed, this, &DtecmdCmdWin::HitPButSend);
-  auto button = [this](const char* name, void (DtecmdCmdWin::*hit)()) {
-    if (auto* b = findChild<QPushButton*>(QString::fromLatin1(name))) connect(b, &QPushButton::clicked, this, hit);
-  };
-  button("PButSend", &DtecmdCmdWin::HitPButSend);
-  button("PButScript", &DtecmdCmdWin::HitPButScript);
-  button("PButSaveTranscript", &DtecmdCmdWin::HitPButSaveTranscript);
-  if (auto* clear = findChild<QPushButton*>(QStringLiteral("PButClear"))) {
-    connect(clear, &QPushButton::clicked, mTranscript, &QPlainTextEdit::clear);
-  }
+  connect(mUi->PButSend, &QPushButton::clicked, this, &DtecmdCmdWin::HitPButSend);
+  connect(mUi->PButScript, &QPushButton::clicked, this, &DtecmdCmdWin::HitPButScript);
+  connect(mUi->PButSaveTranscript, &QPushButton::clicked, this, &DtecmdCmdWin::HitPButSaveTranscript);
+  connect(mUi->PButClear, &QPushButton::clicked, mTranscript, &QPlainTextEdit::clear);
   ConditionList ignored;
   mHistory.Read(ignored);
   LoadCompletion();

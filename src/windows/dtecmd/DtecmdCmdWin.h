@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 
 #include "settings/CommandHistory.h"
 #include "support/ConditionList.h"
@@ -8,6 +9,10 @@
 class QCompleter;
 class QLineEdit;
 class QPlainTextEdit;
+
+namespace Ui {
+class CmdWin;
+}
 
 // The command window ("dtecmd.CmdWin"): commands of the instrument's language typed by hand,
 // "::" filled in with the application handle as in the console; each command's reply and the
@@ -45,4 +50,5 @@ class DtecmdCmdWin : public QWidget {
   QLineEdit* mInput = nullptr;
   QCompleter* mCompleter = nullptr;
   CommandHistory mHistory;
+  std::unique_ptr<Ui::CmdWin> mUi;
 };

@@ -3,7 +3,7 @@
 #include <QWidget>
 
 #include "support/ConditionList.h"
-#include "windows/LockAware.h"
+#include "windows/common/LockAware.h"
 
 class QLabel;
 class QTreeWidget;

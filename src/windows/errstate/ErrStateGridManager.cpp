@@ -7,7 +7,7 @@
 #include "segments/ui/GridDisp.h"
 #include "support/NumberText.h"
 #include "toolkit/qt/WidgetClassTable.h"
-#include "windows/PlaceName.h"
+#include "windows/common/PlaceName.h"
 
 ErrStateGridManager::ErrStateGridManager(QWidget* parent) : GridManager(parent) {
   setObjectName(QString::fromLatin1(Class()));

@@ -9,8 +9,9 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/BerAtStop.h"
+#include "windows/common/BerAtStop.h"
 #include "windows/errstate/ErrStateGridManager.h"
+#include "ui_errstate.ErrStateWin.h"
 
 class ErrstateErrStateWin::View : public QenDsView {
  public:
@@ -25,7 +26,7 @@ class ErrstateErrStateWin::View : public QenDsView {
   ErrstateErrStateWin& mWin;
 };
 
-ErrstateErrStateWin::ErrstateErrStateWin(QWidget* parent) : QWidget(parent), mView(std::make_unique<View>(*this)) {
+ErrstateErrStateWin::ErrstateErrStateWin(QWidget* parent) : QWidget(parent), mView(std::make_unique<View>(*this)), mUi(std::make_unique<Ui::ErrStateWin>()) {
   setObjectName(QStringLiteral("ErrstateErrStateWin"));
 }
 
@@ -39,20 +40,15 @@ ErrstateErrStateWin::~ErrstateErrStateWin() {
 }
 
 int ErrstateErrStateWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("errstate.ErrStateWin", this, list)) return status;
-  mGrid = findChild<ErrStateGridManager*>(QStringLiteral("GridErrState"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  mCursor = findChild<QLabel*>(QStringLiteral("LabelCursor"));
-  if (mGrid == nullptr || mState == nullptr || mCursor == nullptr) {
-    list.Add(1, "The window resource \"errstate.ErrStateWin\" lacks its grid or state lines.");
-    return 1;
-  }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mGrid = mUi->GridErrState;
+  mState = mUi->LabelState;
+  mCursor = mUi->LabelCursor;
   // The keys move the grid's cursor as soon as the window is active.
   setFocusProxy(mGrid);
   connect(mGrid, &GridManager::StateChanged, this, &ErrstateErrStateWin::ShowCursor);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButReset"))) {
-    connect(b, &QPushButton::clicked, this, &ErrstateErrStateWin::HitPButReset);
-  }
+  connect(mUi->PButReset, &QPushButton::clicked, this, &ErrstateErrStateWin::HitPButReset);
   if (BerSvr* svr = uiapp::GetBerSvr()) {
     // The service is set up by the first window that shows it; one read shows the counts the
     // instrument holds now, running or not.

@@ -8,6 +8,10 @@
 class QLabel;
 class ErrStateGridManager;
 
+namespace Ui {
+class ErrStateWin;
+}
+
 // The error state window ("errstate.ErrStateWin"): the error state grid of every analyser port
 // and channel, the state of the run, what the cursor is on, and a reset of the counts. It is a
 // view of the application's BerSvr and asks it for the channels while it is open, so the poll
@@ -35,4 +39,5 @@ class ErrstateErrStateWin : public QWidget {
   QLabel* mCursor = nullptr;
   bool mWantsChannels = false;
   std::unique_ptr<View> mView;
+  std::unique_ptr<Ui::ErrStateWin> mUi;
 };

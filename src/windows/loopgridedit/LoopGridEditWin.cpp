@@ -17,12 +17,13 @@
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/WaitCursor.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/PortHeader.h"
-#include "windows/seqedit/SequenceFileMenu.h"
-#include "windows/seqedit/SequenceWindows.h"
+#include "windows/common/PortHeader.h"
+#include "windows/common/SequenceFileMenu.h"
+#include "windows/common/WindowOpener.h"
+#include "ui_LoopGridEdit.Win.h"
 
 LoopGridEditWin::LoopGridEditWin(QWidget* parent)
-    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { ShowState(); })) {
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { ShowState(); })), mUi(std::make_unique<Ui::LoopGridEditWin>()) {
   setObjectName(QStringLiteral("LoopGridEditWin"));
 }
 
@@ -33,35 +34,35 @@ CSequence* LoopGridEditWin::GetSequence() {
 }
 
 int LoopGridEditWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("LoopGridEdit.Win", this, list)) return status;
-  mGrid = findChild<LoopGridManager*>(QStringLiteral("GridLoops"));
-  mSegments = findChild<QListWidget*>(QStringLiteral("ListSegments"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mGrid = mUi->GridLoops;
+  mSegments = mUi->ListSegments;
+  mState = mUi->LabelState;
   CSequence* sequence = GetSequence();
-  if (mGrid == nullptr || mSegments == nullptr || mState == nullptr || sequence == nullptr) {
-    list.Add(1,
-             "The window resource \"LoopGridEdit.Win\" lacks its grid, list or state line, or there is no "
-             "sequence.");
+  if (sequence == nullptr) {
+    list.Add(1, "There is no sequence to edit.");
     return 1;
   }
-  layout()->setContentsMargins(8, 6, 8, 6);
-  if (auto* split = findChild<QSplitter*>(QStringLiteral("Split"))) split->setStretchFactor(1, 1);
+  mUi->Split->setStretchFactor(1, 1);
   setFocusProxy(mGrid);
   struct Button {
-    const char* name;
+    QPushButton* button;
     std::function<void()> run;
   };
   const Button buttons[] = {
-      {"PButAddLoop", [this] { mGrid->AddLoop(); }},
-      {"PButRemoveLoop", [this] { mGrid->RemoveLoop(); }},
-      {"PButOpenSegment",
+      {mUi->PButAddLoop, [this] { mGrid->AddLoop(); }},
+      {mUi->PButRemoveLoop, [this] { mGrid->RemoveLoop(); }},
+      {mUi->PButOpenSegment,
        [this] { HitPButOpenSegment(mGrid->CursorBlock(), mGrid->PortOf(mGrid->CursorField())); }},
-      {"PButEvents", [this] { HitPButEvents(mGrid->CursorBlock()); }},
-      {"PButSequence", [this] { SequenceWindows::OpenSequence(this); }},
-      {"PButRun", [this] { RunAction(&uiapp::Run); }},
-      {"PButStop", [this] { RunAction(&uiapp::Stop); }},
-      {"PButForce", [this] { RunAction(&uiapp::SequenceForce); }},
-      {"PButRefresh",
+      {mUi->PButEvents, [this] { HitPButEvents(mGrid->CursorBlock()); }},
+      {mUi->PButSequence, [this] {
+         if (WindowOpener* opener = WindowOpener::Of(this)) opener->OpenSequence();
+       }},
+      {mUi->PButRun, [this] { RunAction(&uiapp::Run); }},
+      {mUi->PButStop, [this] { RunAction(&uiapp::Stop); }},
+      {mUi->PButForce, [this] { RunAction(&uiapp::SequenceForce); }},
+      {mUi->PButRefresh,
        [this] {
          ConditionList l;
          FillSegments(l);
@@ -69,8 +70,7 @@ int LoopGridEditWin::Load(ConditionList& list) {
        }},
   };
   for (const Button& b : buttons) {
-    auto* button = findChild<QPushButton*>(QLatin1String(b.name));
-    if (button == nullptr) continue;
+    QPushButton* button = b.button;
     // The keys belong to the grid: a button leaves the focus where it was.
     button->setFocusPolicy(Qt::NoFocus);
     connect(button, &QPushButton::clicked, this, [this, run = b.run] {
@@ -78,10 +78,8 @@ int LoopGridEditWin::Load(ConditionList& list) {
       mGrid->setFocus();
     });
   }
-  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) {
-    file->setFocusPolicy(Qt::NoFocus);
-    SequenceFileMenu::Attach(file, this);
-  }
+  mUi->PButSequenceFile->setFocusPolicy(Qt::NoFocus);
+  SequenceFileMenu::Attach(mUi->PButSequenceFile, this);
   connect(mGrid, &LoopGridManager::OpenSegmentRequested, this, &LoopGridEditWin::HitPButOpenSegment);
   connect(mGrid, &LoopGridManager::OpenEventsRequested, this, &LoopGridEditWin::HitPButEvents);
   connect(mGrid, &GridManager::StateChanged, this, &LoopGridEditWin::ShowState);
@@ -146,7 +144,7 @@ void LoopGridEditWin::ShowState() {
   const bool named =
       mGrid->PortOf(mGrid->CursorField()) != 0 &&
       sequence->GetType(mGrid->CursorBlock(), mGrid->PortOf(mGrid->CursorField())) == CSequence::SEG_NAMED;
-  if (auto* open = findChild<QPushButton*>(QStringLiteral("PButOpenSegment"))) open->setEnabled(named);
+  mUi->PButOpenSegment->setEnabled(named);
 }
 
 void LoopGridEditWin::RunAction(int (*action)(ConditionList&)) {
@@ -159,11 +157,13 @@ void LoopGridEditWin::RunAction(int (*action)(ConditionList&)) {
 }
 
 void LoopGridEditWin::HitPButOpenSegment(unsigned long block, unsigned long port) {
-  if (block != 0 && port != 0) SequenceWindows::OpenSegment(this, block, port);
+  WindowOpener* opener = WindowOpener::Of(this);
+  if (opener != nullptr && block != 0 && port != 0) opener->OpenSegment(block, port);
 }
 
 void LoopGridEditWin::HitPButEvents(unsigned long block) {
-  if (block != 0) SequenceWindows::OpenEvents(this, block);
+  WindowOpener* opener = WindowOpener::Of(this);
+  if (opener != nullptr && block != 0) opener->OpenEvents(block);
 }
 
 // The segment goes into the cell under the cursor, as a drop there would put it.

@@ -12,6 +12,10 @@ class QListWidget;
 class SegmentCatalogFollower;
 class SequenceFollower;
 
+namespace Ui {
+class LoopGridEditWin;
+}
+
 // The loop grid editor ("LoopGridEdit.Win"): the loop grid of the one sequence, the list of the
 // instrument's segments to drag onto a port's cell, and the run controls the Instrument menu
 // has. The state line says how many blocks and loop levels there are and what the marks mean.
@@ -46,4 +50,5 @@ class LoopGridEditWin : public QWidget {
   QLabel* mState = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
   std::unique_ptr<SegmentCatalogFollower> mCatalog;
+  std::unique_ptr<Ui::LoopGridEditWin> mUi;
 };

@@ -15,6 +15,7 @@
 #include "support/ParserExpression.h"
 #include "toolkit/WaitCursor.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_paramedit.ParamEd.h"
 
 namespace {
 
@@ -44,34 +45,31 @@ const char* PortKind(const CPortInfo::Port& port) {
 
 }  // namespace
 
-ParameditParamEdWin::ParameditParamEdWin(QWidget* parent) : QWidget(parent) {
+ParameditParamEdWin::ParameditParamEdWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::ParamEd>()) {
   setObjectName(QStringLiteral("ParameditParamEdWin"));
 }
+
+ParameditParamEdWin::~ParameditParamEdWin() = default;
 
 void ParameditParamEdWin::FormatMemory(unsigned long bits, Dstring& number, Dstring& unit) {
   MemorySize::Format(bits, number, unit);
 }
 
 int ParameditParamEdWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("paramedit.ParamEd", this, list)) return status;
-  mTree = findChild<QTreeWidget*>(QStringLiteral("TreeInstrument"));
-  mStack = findChild<QStackedWidget*>(QStringLiteral("StackPanels"));
-  mTitle = findChild<QLabel*>(QStringLiteral("LabelPanelTitle"));
-  if (mTree == nullptr || mStack == nullptr || mTitle == nullptr) {
-    list.Add(1, "The window resource \"paramedit.ParamEd\" lacks its tree, panel stack or title.");
-    return 1;
-  }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTree = mUi->TreeInstrument;
+  mStack = mUi->StackPanels;
+  mTitle = mUi->LabelPanelTitle;
   connect(mTree, &QTreeWidget::itemSelectionChanged, this, &ParameditParamEdWin::NfySelectionChanged);
   mUnread = new QLabel(mStack);
   mUnread->setObjectName(QStringLiteral("LabelUnread"));
   mUnread->setAlignment(Qt::AlignCenter);
   mUnread->setWordWrap(true);
   mStack->addWidget(mUnread);
-  if (auto* splitter = findChild<QSplitter*>(QStringLiteral("Splitter"))) {
-    splitter->setStretchFactor(0, 0);
-    splitter->setStretchFactor(1, 1);
-    splitter->setSizes({260, 520});
-  }
+  mUi->Splitter->setStretchFactor(0, 0);
+  mUi->Splitter->setStretchFactor(1, 1);
+  mUi->Splitter->setSizes({260, 520});
   if (int status = Rebuild(list)) return status;
   // The first port is where most work starts.
   if (!CPortInfo::GetPorts().empty()) SelectPath(CPortInfo::GetPorts().front().path);

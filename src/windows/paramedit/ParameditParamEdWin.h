@@ -1,17 +1,22 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 #include <map>
 #include <set>
 
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
-#include "windows/LockAware.h"
+#include "windows/common/LockAware.h"
 
 class QLabel;
 class QStackedWidget;
 class QTreeWidget;
 class QTreeWidgetItem;
+
+namespace Ui {
+class ParamEd;
+}
 
 // The parameter editor ("paramedit.ParamEd"): the instrument as a tree of clock groups,
 // modules and ports, and beside it the panel of the selected item. There is one panel per kind
@@ -19,12 +24,15 @@ class QTreeWidgetItem;
 // item's parameters (their base name), reading every value first in joined queries, and hides
 // the rows of parameters that the item does not have. While another client holds the
 // instrument the tree still moves, but the panel is read-only, and an item whose values were
-// not read yet shows a line saying that they are read once the instrument is free.
+// not read yet shows a line saying that they are read once the instrument is free. The panels
+// stay loaded by name at run time: the tree item names its panel's resource, and the panel is
+// built on first use into the stack, so the tree and the panels meet only through that name.
 class ParameditParamEdWin : public QWidget, public LockAware {
   Q_OBJECT
 
  public:
   explicit ParameditParamEdWin(QWidget* parent = nullptr);
+  ~ParameditParamEdWin() override;
 
   int Load(ConditionList& list);
   // Builds the tree anew from the port information.
@@ -55,4 +63,5 @@ class ParameditParamEdWin : public QWidget, public LockAware {
   bool mLocked = false;
   std::map<Dstring, QWidget*> mPanels;
   QWidget* mBound = nullptr;
+  std::unique_ptr<Ui::ParamEd> mUi;
 };

@@ -12,8 +12,9 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/PlaceName.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/PlaceName.h"
+#include "windows/common/TaskFollower.h"
+#include "ui_selftest.Result.h"
 
 // Told when the instrument starts or stops, for the start button.
 class SelftestResultWin::RunView : public QenDsView {
@@ -28,7 +29,7 @@ class SelftestResultWin::RunView : public QenDsView {
   TaskFollower& mFollower;
 };
 
-SelftestResultWin::SelftestResultWin(QWidget* parent) : QWidget(parent) {
+SelftestResultWin::SelftestResultWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::SelfTestResult>()) {
   setObjectName(QStringLiteral("SelftestResultWin"));
 }
 
@@ -38,16 +39,13 @@ SelftestResultWin::~SelftestResultWin() {
 }
 
 int SelftestResultWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("selftest.Result", this, list)) return status;
-  mTable = findChild<QTableWidget*>(QStringLiteral("TableResults"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  auto* bar = findChild<QProgressBar*>(QStringLiteral("BarProgress"));
-  auto* start = findChild<QPushButton*>(QStringLiteral("PButStart"));
-  auto* cancel = findChild<QPushButton*>(QStringLiteral("PButCancel"));
-  if (mTable == nullptr || bar == nullptr || mState == nullptr || start == nullptr || cancel == nullptr) {
-    list.Add(1, "The window resource \"selftest.Result\" lacks its table, progress bar or buttons.");
-    return 1;
-  }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTable = mUi->TableResults;
+  mState = mUi->LabelState;
+  auto* bar = mUi->BarProgress;
+  auto* start = mUi->PButStart;
+  auto* cancel = mUi->PButCancel;
   mTable->verticalHeader()->setVisible(false);
   mTable->horizontalHeader()->setSectionResizeMode(3, QHeaderView::Stretch);
   for (int c = 0; c < 3; ++c) mTable->horizontalHeader()->setSectionResizeMode(c, QHeaderView::ResizeToContents);

@@ -10,6 +10,10 @@ class QLabel;
 class QTableWidget;
 class TaskFollower;
 
+namespace Ui {
+class SelfTestResult;
+}
+
 // The self test window ("selftest.Result"): starts the instrument's self test, shows its
 // progress module by module with a cancel button, and then the outcome of every module, a
 // failed one in red with what it reported. The instrument refuses the test while it runs, so
@@ -36,4 +40,5 @@ class SelftestResultWin : public QWidget {
   QLabel* mState = nullptr;
   TaskFollower* mFollower = nullptr;
   std::unique_ptr<RunView> mRunView;
+  std::unique_ptr<Ui::SelfTestResult> mUi;
 };

@@ -13,34 +13,32 @@
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/MainWin.h"
-#include "windows/seqedit/SequenceFileMenu.h"
-#include "windows/seqedit/SequenceWindows.h"
+#include "windows/common/SequenceFileMenu.h"
+#include "windows/common/WindowOpener.h"
+#include "ui_seqedit.SeqEdWin.h"
 
 SeqeditSeqEdWin::SeqeditSeqEdWin(QWidget* parent)
-    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Fill(); })) {
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Fill(); })), mUi(std::make_unique<Ui::SeqeditSeqEdWin>()) {
   setObjectName(QStringLiteral("SeqeditSeqEdWin"));
 }
 
 SeqeditSeqEdWin::~SeqeditSeqEdWin() = default;
 
 int SeqeditSeqEdWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("seqedit.SeqEdWin", this, list)) return status;
-  mSummary = findChild<QLabel*>(QStringLiteral("LabelSummary"));
-  mTable = findChild<QTableWidget*>(QStringLiteral("TableBlocks"));
-  mEventsLabel = findChild<QLabel*>(QStringLiteral("LabelEvents"));
-  mEvents = findChild<QTableWidget*>(QStringLiteral("TableEvents"));
-  auto* events = findChild<QPushButton*>(QStringLiteral("PButEvents"));
-  auto* grid = findChild<QPushButton*>(QStringLiteral("PButLoopGrid"));
-  auto* simple = findChild<QPushButton*>(QStringLiteral("PButSimple"));
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mSummary = mUi->LabelSummary;
+  mTable = mUi->TableBlocks;
+  mEventsLabel = mUi->LabelEvents;
+  mEvents = mUi->TableEvents;
+  auto* events = mUi->PButEvents;
+  auto* grid = mUi->PButLoopGrid;
+  auto* simple = mUi->PButSimple;
   CSequence* sequence = SequenceService::GetSequence();
-  if (mSummary == nullptr || mTable == nullptr || mEventsLabel == nullptr || mEvents == nullptr ||
-      events == nullptr || grid == nullptr || simple == nullptr || sequence == nullptr) {
-    list.Add(1,
-             "The window resource \"seqedit.SeqEdWin\" lacks its table or buttons, or there is no sequence.");
+  if (sequence == nullptr) {
+    list.Add(1, "There is no sequence to edit.");
     return 1;
   }
-  layout()->setContentsMargins(8, 6, 8, 6);
   mTable->horizontalHeader()->setStretchLastSection(true);
   mEvents->horizontalHeader()->setStretchLastSection(true);
   mEvents->setColumnWidth(0, 160);
@@ -49,16 +47,17 @@ int SeqeditSeqEdWin::Load(ConditionList& list) {
   });
   setFocusProxy(mTable);
   auto openEvents = [this] {
-    if (CurrentBlock() != 0) SequenceWindows::OpenEvents(this, CurrentBlock());
+    WindowOpener* opener = WindowOpener::Of(this);
+    if (opener != nullptr && CurrentBlock() != 0) opener->OpenEvents(CurrentBlock());
   };
   connect(events, &QPushButton::clicked, this, openEvents);
   connect(mTable, &QTableWidget::cellActivated, this, openEvents);
   auto open = [this](const char* resource) {
-    if (auto* main = qobject_cast<MainWin*>(window())) main->OpenWindow(QLatin1String(resource));
+    if (WindowOpener* opener = WindowOpener::Of(this)) opener->OpenWindow(QLatin1String(resource));
   };
   connect(grid, &QPushButton::clicked, this, [open] { open("LoopGridEdit.Win"); });
   connect(simple, &QPushButton::clicked, this, [open] { open("smseqedit.Win"); });
-  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) SequenceFileMenu::Attach(file, this);
+  SequenceFileMenu::Attach(mUi->PButSequenceFile, this);
   mFollower->Follow(sequence);
   const int status = sequence->ReadSequence(list, 0);
   Fill();

@@ -9,6 +9,10 @@ class QLabel;
 class SequenceFollower;
 class QTableWidget;
 
+namespace Ui {
+class SeqeditSeqEdWin;
+}
+
 // The sequence editor ("seqedit.SeqEdWin"): the sequence as a whole, a line per block with its
 // label, length, the loops it is in, its marks and its reactions, and the table of sequence
 // events of a central module, whose names and numbers are edited here. From here the loop grid, the simple
@@ -42,4 +46,5 @@ class SeqeditSeqEdWin : public QWidget {
   QTableWidget* mEvents = nullptr;
   bool mFillingEvents = false;
   std::unique_ptr<SequenceFollower> mFollower;
+  std::unique_ptr<Ui::SeqeditSeqEdWin> mUi;
 };

@@ -17,10 +17,9 @@
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/MainWin.h"
-#include "windows/PortHeader.h"
-#include "windows/dataedit/DataeditSegmentEditWin.h"
-#include "windows/seqedit/SequenceFileMenu.h"
+#include "windows/common/PortHeader.h"
+#include "windows/common/SequenceFileMenu.h"
+#include "windows/common/WindowOpener.h"
 
 SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })) {
   setObjectName(QStringLiteral("SmseqeditWin"));
@@ -226,13 +225,8 @@ Dstring SmseqeditWin::CurrentSegment() const {
 // The segment editor of the main window shows the segment; asking again raises the same window.
 void SmseqeditWin::HitPButOpenSegment() {
   const Dstring name = CurrentSegment();
-  auto* main = qobject_cast<MainWin*>(window());
-  if (name.empty() || main == nullptr) return;
-  auto* editor = qobject_cast<DataeditSegmentEditWin*>(main->OpenWindow(QStringLiteral("dataedit.SegmentEditWin")));
-  if (editor == nullptr) return;
-  ConditionList list;
-  editor->ShowSegment(name, list);
-  BoundControl::Report(list);
+  WindowOpener* opener = WindowOpener::Of(this);
+  if (!name.empty() && opener != nullptr) opener->ShowSegment(name);
 }
 
 int SmseqeditWin::AddBlock(ConditionList& list) {

@@ -21,8 +21,9 @@
 #include "support/ConditionListLoader.h"
 #include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
-#include "windows/PlaceName.h"
-#include "windows/TaskFollower.h"
+#include "windows/common/PlaceName.h"
+#include "windows/common/TaskFollower.h"
+#include "ui_wavewin.WaveWin.h"
 
 namespace {
 
@@ -42,32 +43,27 @@ QString TimeText(double seconds) {
 
 }  // namespace
 
-WavewinWaveWin::WavewinWaveWin(QWidget* parent) : QWidget(parent) { setObjectName(QStringLiteral("WavewinWaveWin")); }
+WavewinWaveWin::WavewinWaveWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::WaveWin>()) { setObjectName(QStringLiteral("WavewinWaveWin")); }
 
 WavewinWaveWin::~WavewinWaveWin() {
   // The view draws the capture this window holds: it goes first.
   delete mView;
 }
 
-int WavewinWaveWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("wavewin.WaveWin", this, list)) return status;
-  auto* area = findChild<QWidget*>(QStringLiteral("WaveArea"));
-  auto* bar = findChild<QProgressBar*>(QStringLiteral("BarProgress"));
-  auto* capture = findChild<QPushButton*>(QStringLiteral("PButCapture"));
-  auto* cancel = findChild<QPushButton*>(QStringLiteral("PButCancel"));
-  mPort = findChild<QComboBox*>(QStringLiteral("CBoxPort"));
-  mRadix = findChild<QComboBox*>(QStringLiteral("CBoxRadix"));
-  mBusLow = findChild<QSpinBox*>(QStringLiteral("SpinBusLow"));
-  mBusHigh = findChild<QSpinBox*>(QStringLiteral("SpinBusHigh"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  mCursors = findChild<QLabel*>(QStringLiteral("LabelCursors"));
-  mSummary = findChild<QLabel*>(QStringLiteral("LabelSummary"));
-  if (area == nullptr || area->layout() == nullptr || bar == nullptr || capture == nullptr || cancel == nullptr ||
-      mPort == nullptr || mRadix == nullptr || mBusLow == nullptr || mBusHigh == nullptr || mState == nullptr ||
-      mCursors == nullptr || mSummary == nullptr) {
-    list.Add(1, "The window resource \"wavewin.WaveWin\" lacks its wave area, port chooser, bus fields or buttons.");
-    return 1;
-  }
+int WavewinWaveWin::Load(ConditionList&) {
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  auto* area = mUi->WaveArea;
+  auto* bar = mUi->BarProgress;
+  auto* capture = mUi->PButCapture;
+  auto* cancel = mUi->PButCancel;
+  mPort = mUi->CBoxPort;
+  mRadix = mUi->CBoxRadix;
+  mBusLow = mUi->SpinBusLow;
+  mBusHigh = mUi->SpinBusHigh;
+  mState = mUi->LabelState;
+  mCursors = mUi->LabelCursors;
+  mSummary = mUi->LabelSummary;
   mView = new WaveView(area);
   mScroll = new QScrollBar(Qt::Horizontal, area);
   mScroll->setObjectName(QStringLiteral("ScrollWave"));
@@ -81,10 +77,10 @@ int WavewinWaveWin::Load(ConditionList& list) {
   connect(mBusLow, &QSpinBox::valueChanged, this, &WavewinWaveWin::ApplyBus);
   connect(mBusHigh, &QSpinBox::valueChanged, this, &WavewinWaveWin::ApplyBus);
   connect(mRadix, &QComboBox::currentIndexChanged, this, &WavewinWaveWin::ApplyBus);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExport"))) connect(b, &QPushButton::clicked, this, &WavewinWaveWin::HitPButExport);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButNextError"))) connect(b, &QPushButton::clicked, this, [this] { HitPButError(true); });
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButPreviousError"))) connect(b, &QPushButton::clicked, this, [this] { HitPButError(false); });
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButFit"))) connect(b, &QPushButton::clicked, mView, &WaveView::Fit);
+  connect(mUi->PButExport, &QPushButton::clicked, this, &WavewinWaveWin::HitPButExport);
+  connect(mUi->PButNextError, &QPushButton::clicked, this, [this] { HitPButError(true); });
+  connect(mUi->PButPreviousError, &QPushButton::clicked, this, [this] { HitPButError(false); });
+  connect(mUi->PButFit, &QPushButton::clicked, mView, &WaveView::Fit);
 
   TaskFollower::Hooks hooks;
   hooks.before = [this](ConditionList& l) {

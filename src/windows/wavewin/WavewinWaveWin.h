@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 
 #include "capture/CaptureData.h"
 #include "support/ConditionList.h"
@@ -12,6 +13,10 @@ class QScrollBar;
 class QSpinBox;
 class TaskFollower;
 class WaveView;
+
+namespace Ui {
+class WaveWin;
+}
 
 // The waveform window ("wavewin.WaveWin"): what an analyser port captured, as bit traces, a bus
 // and the error vectors, with two cursors and their distance in vectors and in time. A capture
@@ -59,4 +64,5 @@ class WavewinWaveWin : public QWidget {
   QLabel* mCursors = nullptr;
   QLabel* mSummary = nullptr;
   TaskFollower* mFollower = nullptr;
+  std::unique_ptr<Ui::WaveWin> mUi;
 };

@@ -4,7 +4,7 @@
 #include <utility>
 
 #include "sequences/CPortInfo.h"
-#include "windows/PlaceName.h"
+#include "windows/common/PlaceName.h"
 
 // The heading of sequence port `port` (a data port, from 1): its place on two lines and whether
 // it generates or analyses ("Group 1 › Module 2\nPort 1\ngenerator"); the tool tip adds the

@@ -1,4 +1,4 @@
-#include "windows/FileChoice.h"
+#include "windows/common/FileChoice.h"
 
 #include <QFileDialog>
 

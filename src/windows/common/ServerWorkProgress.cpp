@@ -1,4 +1,4 @@
-#include "windows/ServerWorkProgress.h"
+#include "windows/common/ServerWorkProgress.h"
 
 #include <QCoreApplication>
 #include <QProgressDialog>

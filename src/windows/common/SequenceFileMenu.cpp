@@ -1,4 +1,4 @@
-#include "windows/seqedit/SequenceFileMenu.h"
+#include "windows/common/SequenceFileMenu.h"
 
 #include <QMainWindow>
 #include <QMenu>
@@ -8,7 +8,7 @@
 #include "params/ui/BoundControl.h"
 #include "sequences/SequenceTransfer.h"
 #include "toolkit/WaitCursor.h"
-#include "windows/FileChoice.h"
+#include "windows/common/FileChoice.h"
 
 namespace {
 

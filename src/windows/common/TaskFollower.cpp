@@ -1,4 +1,4 @@
-#include "windows/TaskFollower.h"
+#include "windows/common/TaskFollower.h"
 
 #include <QProgressBar>
 #include <QPushButton>
