@@ -12,6 +12,7 @@
 #include "settings/QENRegistryProfile.h"
 #include "settings/RegistryStore.h"
 #include "toolkit/WaitCursor.h"
+#include "toolkit/qt/HelpKey.h"
 
 namespace {
 
@@ -36,6 +37,7 @@ bool SplitAddress(const QString& text, Dstring& host, unsigned short& port) {
 
 ConnectDialog::ConnectDialog(QWidget* parent) : QDialog(parent), mList(new QListWidget), mAddress(new QLineEdit) {
   setObjectName(QStringLiteral("ConnectDialog"));
+  HelpKey::SetPage(this, "ConnectDialog");
   setWindowTitle(QStringLiteral("Connect to an Instrument"));
   auto* layout = new QVBoxLayout(this);
   layout->addWidget(new QLabel(QStringLiteral("Instrument servers found:")));

@@ -30,6 +30,8 @@
 #include "support/ConditionList.h"
 #include "toolkit/Toolkit.h"
 #include "toolkit/WaitCursor.h"
+#include "toolkit/qt/HelpKey.h"
+#include "toolkit/qt/HelpWindow.h"
 #include "toolkit/qt/StatusNotice.h"
 #include "windows/common/FileChoice.h"
 #include "windows/InstrumentWaitView.h"
@@ -170,7 +172,11 @@ void MainWin::BuildMenus() {
   BuildInstrumentMenu();
   BuildWindowsMenu();
   QMenu* help = menuBar()->addMenu(QStringLiteral("&Help"));
+  help->addAction(QStringLiteral("&User Guide"), this, [this] { HelpWindow::Show("index", this); });
+  help->addAction(QStringLiteral("&Keyboard Shortcuts"), this, [this] { HelpWindow::Show("keyboard", this); });
+  help->addSeparator();
   help->addAction(QStringLiteral("&About qengui"), this, &MainWin::HitAbout);
+  HelpKey::Install();
 }
 
 void MainWin::BuildFileMenu() {

@@ -10,6 +10,7 @@
 #include <QVBoxLayout>
 
 #include "settings/StartUpConfig.h"
+#include "toolkit/qt/HelpKey.h"
 
 SettingStartUpDialog::SettingStartUpDialog(QWidget* parent)
     : QDialog(parent),
@@ -21,6 +22,7 @@ SettingStartUpDialog::SettingStartUpDialog(QWidget* parent)
       mShowDialog(new QCheckBox(QStringLiteral("&Ask at every start"))),
       mProblem(new QLabel) {
   setObjectName(QStringLiteral("SettingStartUpDialog"));
+  HelpKey::SetPage(this, "SettingStartUpDialog");
   setWindowTitle(QStringLiteral("Start"));
   auto* layout = new QVBoxLayout(this);
   layout->addWidget(new QLabel(QStringLiteral("What should the instrument hold when the interface starts?")));

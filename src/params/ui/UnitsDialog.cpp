@@ -5,10 +5,14 @@
 #include <QRadioButton>
 
 #include "params/UnitsDialogTable.h"
-#include "toolkit/Toolkit.h"
+#include "toolkit/qt/HelpKey.h"
+#include "toolkit/qt/HelpWindow.h"
 #include "toolkit/qt/ResourceLibrary.h"
 
 namespace {
+
+// Both names of the dialog show the one page of the guide.
+constexpr const char* kHelpPage = "unitsdlg.UnitsDialog";
 
 template <class T>
 T* Child(const QWidget* dialog, const char* name) {
@@ -18,6 +22,7 @@ T* Child(const QWidget* dialog, const char* name) {
 }  // namespace
 
 UnitsDialog::UnitsDialog(const char* library, QWidget* parent) : QDialog(parent) {
+  HelpKey::SetPage(this, kHelpPage);
   mLoaded = ResourceLibrary::LoadInto(Dstring(library) + ".UnitsDialog", this, mLoadErrors) == 0;
   if (!mLoaded) return;
   if (auto* ok = Child<QPushButton>(this, "PButOK")) {
@@ -70,8 +75,5 @@ void UnitsDialog::TakeChoice(UnitsRecord& units) const {
 }
 
 void UnitsDialog::HitPButHelp() {
-  Toolkit::Get().Alert(
-      "The prefix scales the value shown in the field (the instrument always works in the base unit). "
-      "The step is what the arrows, the Up and Down keys and the wheel add or take away, in the unit shown.",
-      ToolkitPort::Icon::Information);
+  HelpWindow::Show(kHelpPage, this);
 }

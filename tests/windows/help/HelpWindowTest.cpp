@@ -16,7 +16,7 @@
 
 #include "common/gui/GuiSimFixture.h"
 #include "core/uiapp.h"
-#include "windows/help/HelpWindow.h"
+#include "toolkit/qt/HelpWindow.h"
 
 namespace {
 
@@ -134,9 +134,9 @@ TEST_F(HelpWindowTest, ContentsHoldEveryPageInTheIndexOrder) {
 }
 
 TEST_F(HelpWindowTest, EveryWindowResourceHasItsPage) {
-  for (const Dstring& resource : uiapp::WindowResources()) {
-    HelpWindow* window = HelpWindow::Show(resource, nullptr);
-    EXPECT_EQ(PageOf(window->Browser()).toStdString(), resource + ".md");
+  for (const WindowResource& entry : uiapp::WindowResources()) {
+    HelpWindow* window = HelpWindow::Show(entry.resource, nullptr);
+    EXPECT_EQ(PageOf(window->Browser()).toStdString(), entry.resource + ".md");
     EXPECT_TRUE(window->isVisible());
   }
   for (const char* page : {"SettingStartUpDialog", "ConnectDialog.md", "unitsdlg.UnitsDialog", "keyboard"}) {

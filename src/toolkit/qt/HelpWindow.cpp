@@ -1,8 +1,9 @@
-#include "windows/help/HelpWindow.h"
+#include "toolkit/qt/HelpWindow.h"
 
 #include <algorithm>
 
 #include <QAction>
+#include <QApplication>
 #include <QColor>
 #include <QFile>
 #include <QHBoxLayout>
@@ -136,6 +137,9 @@ HelpWindow::HelpWindow(QWidget* parent)
 HelpWindow* HelpWindow::Show(const Dstring& pageOrResource, QWidget* parent) {
   static QPointer<HelpWindow> window;
   if (window == nullptr) window = new HelpWindow(parent);
+  // A modal dialog takes the input from every window but its own: the guide moves under it.
+  QWidget* modal = QApplication::activeModalWidget();
+  if (modal != nullptr && modal != window && !modal->isAncestorOf(window)) window->setParent(modal, Qt::Window);
   const QUrl page = PageUrl(QString::fromStdString(pageOrResource));
   window->ShowPage(page.isEmpty() ? IndexUrl() : page);
   window->show();

@@ -1,0 +1,45 @@
+#include "toolkit/qt/HelpKey.h"
+
+#include <QApplication>
+#include <QKeyEvent>
+#include <QWidget>
+
+#include "toolkit/qt/HelpWindow.h"
+
+namespace {
+
+constexpr const char* kPageProperty = "qenHelpPage";
+// The main window marks each of its windows with the resource it was made from.
+constexpr const char* kResourceProperty = "qenResource";
+
+}  // namespace
+
+void HelpKey::Install() {
+  static HelpKey* key = nullptr;
+  if (key != nullptr) return;
+  key = new HelpKey;
+  key->setParent(qApp);
+  qApp->installEventFilter(key);
+}
+
+void HelpKey::SetPage(QWidget* widget, const char* page) { widget->setProperty(kPageProperty, QString::fromLatin1(page)); }
+
+QString HelpKey::PageFor(const QWidget* widget) {
+  for (const QWidget* w = widget; w != nullptr; w = w->parentWidget()) {
+    for (const char* name : {kPageProperty, kResourceProperty}) {
+      const QString page = w->property(name).toString();
+      if (!page.isEmpty()) return page;
+    }
+  }
+  return QStringLiteral("index");
+}
+
+bool HelpKey::eventFilter(QObject* watched, QEvent* event) {
+  if (event->type() != QEvent::KeyPress || static_cast<QKeyEvent*>(event)->key() != Qt::Key_F1) return false;
+  // Every widget up the chain sees the same key; answer it once, for the one with the focus.
+  QWidget* focus = QApplication::focusWidget();
+  if (focus == nullptr) focus = qobject_cast<QWidget*>(watched);
+  if (focus == nullptr || watched != focus) return false;
+  HelpWindow::Show(PageFor(focus).toStdString(), focus->window());
+  return true;
+}
