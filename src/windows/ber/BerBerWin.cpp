@@ -7,7 +7,7 @@
 #include <QLineSeries>
 #include <QLogValueAxis>
 #include <QPushButton>
-#include <QTableWidget>
+#include <QTableView>
 #include <QValueAxis>
 #include <QVBoxLayout>
 #include <algorithm>
@@ -18,21 +18,15 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "support/ExportFile.h"
-#include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
 #include "windows/BerAtStop.h"
 #include "windows/PlaceName.h"
+#include "windows/ber/BerTableModel.h"
 
 namespace {
 
 // A ratio of 0 has no place on a logarithmic axis: it is drawn at the axis floor.
 constexpr double kFloor = 1e-15;
-
-QTableWidgetItem* Cell(const QString& text, bool number) {
-  auto* item = new QTableWidgetItem(text);
-  if (number) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
-  return item;
-}
 
 }  // namespace
 
@@ -66,13 +60,15 @@ BerBerWin::~BerBerWin() {
 
 int BerBerWin::Load(ConditionList& list) {
   if (int status = ResourceLibrary::LoadInto("ber.BerWin", this, list)) return status;
-  mTable = findChild<QTableWidget*>(QStringLiteral("TableBer"));
+  mTable = findChild<QTableView*>(QStringLiteral("TableBer"));
   mState = findChild<QLabel*>(QStringLiteral("LabelState"));
   auto* area = findChild<QWidget*>(QStringLiteral("ChartArea"));
   if (mTable == nullptr || mState == nullptr || area == nullptr || area->layout() == nullptr) {
     list.Add(1, "The window resource \"ber.BerWin\" lacks its table, chart area or state line.");
     return 1;
   }
+  mModel = new BerTableModel(this);
+  mTable->setModel(mModel);
   mTable->verticalHeader()->setVisible(false);
   mTable->horizontalHeader()->setSectionResizeMode(0, QHeaderView::Stretch);
   for (int c = 1; c < 4; ++c) mTable->horizontalHeader()->setSectionResizeMode(c, QHeaderView::ResizeToContents);
@@ -132,16 +128,8 @@ void BerBerWin::ShowResults() {
     mState->setText(running ? QStringLiteral("Running: the instrument's counts since the run started or was reset.")
                             : QStringLiteral("Stopped: the counts of the last run; they change only while the instrument runs."));
   }
-  if (results == mShown && mTable->rowCount() == static_cast<int>(results.size())) return;
-  mTable->setRowCount(static_cast<int>(results.size()));
-  for (int row = 0; row < static_cast<int>(results.size()); ++row) {
-    const BerSvr::PortResult& r = results[static_cast<std::size_t>(row)];
-    mTable->setItem(row, 0, Cell(PlaceName(r.port), false));
-    mTable->setItem(row, 1, Cell(QString::fromStdString(NumberText::Grouped(r.compared)), true));
-    mTable->setItem(row, 2, Cell(QString::fromStdString(NumberText::Grouped(r.errors)), true));
-    mTable->setItem(row, 3, Cell(QString::fromStdString(NumberText::Ratio(r.errors, r.compared)), true));
-    mTable->item(row, 2)->setForeground(r.errors > 0 ? QColor(0xb3, 0x26, 0x1e) : palette().color(QPalette::Text));
-  }
+  mModel->SetResults(results);
+  if (results == mShown) return;
   mShown = results;
   if (!results.empty()) {
     if (mHistory.Samples().empty()) mSince = QTime::currentTime();

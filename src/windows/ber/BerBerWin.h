@@ -11,7 +11,8 @@
 
 class QLabel;
 class QPushButton;
-class QTableWidget;
+class BerTableModel;
+class QTableView;
 class QChart;
 class QLogValueAxis;
 class QValueAxis;
@@ -33,7 +34,8 @@ class BerBerWin : public QWidget, public LockAware {
   int Load(ConditionList& list);
   int ExportTable(const Dstring& path, ConditionList& list) const;
   int ExportHistory(const Dstring& path, ConditionList& list) const;
-  QTableWidget* Table() const { return mTable; }
+  QTableView* Table() const { return mTable; }
+  BerTableModel* Model() const { return mModel; }
   QChart* Chart() const { return mChart; }
   const BerHistory& History() const { return mHistory; }
   // Shows the service's counts and adds them to the history when they changed.
@@ -57,7 +59,8 @@ class BerBerWin : public QWidget, public LockAware {
   // Asks for the file and writes it with `write`.
   void ExportTo(const QString& title, const QString& name, Export write);
 
-  QTableWidget* mTable = nullptr;
+  QTableView* mTable = nullptr;
+  BerTableModel* mModel = nullptr;
   QLabel* mState = nullptr;
   QPushButton* mReset = nullptr;
   QChart* mChart = nullptr;
