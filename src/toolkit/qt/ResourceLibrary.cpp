@@ -42,13 +42,6 @@ bool IsForm(const QByteArray& bytes, QString& error) {
   return !xml.hasError();
 }
 
-void InitAll(QWidget* root) {
-  if (auto* self = dynamic_cast<ResourceWidget*>(root)) self->NfyInit();
-  for (QWidget* child : root->findChildren<QWidget*>()) {
-    if (auto* widget = dynamic_cast<ResourceWidget*>(child)) widget->NfyInit();
-  }
-}
-
 }  // namespace
 
 int ResourceLibrary::Check(const Dstring& name, ConditionList& list) {
@@ -64,7 +57,8 @@ int ResourceLibrary::Check(const Dstring& name, ConditionList& list) {
     QFile file(dir.filePath(form));
     QString error;
     if (!file.open(QIODevice::ReadOnly) || !IsForm(file.readAll(), error)) {
-      ConditionListLoader::ConditionToken(list, "GUI_RESOURCE_BROKEN", {form.chopped(3).toStdString(), error.toStdString()}, 1);
+      ConditionListLoader::ConditionToken(list, "GUI_RESOURCE_BROKEN",
+                                          {form.chopped(3).toStdString(), error.toStdString()}, 1);
       status = 1;
     }
   }
@@ -90,10 +84,11 @@ QWidget* ResourceLibrary::Load(const Dstring& resource, QWidget* parent, Conditi
   ResourceLoader loader;
   QWidget* widget = loader.load(&buffer, parent);
   if (widget == nullptr) {
-    ConditionListLoader::ConditionToken(list, "GUI_RESOURCE_BROKEN", {resource, loader.errorString().toStdString()}, 1);
+    ConditionListLoader::ConditionToken(list, "GUI_RESOURCE_BROKEN",
+                                        {resource, loader.errorString().toStdString()}, 1);
     return nullptr;
   }
-  InitAll(widget);
+  InitWidgets(widget);
   return widget;
 }
 
@@ -106,4 +101,11 @@ int ResourceLibrary::LoadInto(const Dstring& resource, QWidget* target, Conditio
   if (!form->windowTitle().isEmpty()) target->setWindowTitle(form->windowTitle());
   target->resize(form->size());
   return 0;
+}
+
+void ResourceLibrary::InitWidgets(QWidget* root) {
+  if (auto* self = dynamic_cast<ResourceWidget*>(root)) self->NfyInit();
+  for (QWidget* child : root->findChildren<QWidget*>()) {
+    if (auto* widget = dynamic_cast<ResourceWidget*>(child)) widget->NfyInit();
+  }
 }

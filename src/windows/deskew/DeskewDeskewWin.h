@@ -1,11 +1,15 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 
 #include "support/ConditionList.h"
 
-class QLabel;
 class TaskFollower;
+
+namespace Ui {
+class DeskewWin;
+}
 
 // The deskew tool ("deskew.DeskewWin"): the delay of every data port as a bound parameter
 // field with its unit, and the automatic deskew (":SYST:DESK", an InstrumentTask), which the
@@ -23,8 +27,8 @@ class DeskewDeskewWin : public QWidget {
   QString StateText() const;
 
  private:
-  int AddPortFields(QWidget* area, ConditionList& list);
+  int AddPortFields(ConditionList& list);
 
-  QLabel* mState = nullptr;
+  std::unique_ptr<Ui::DeskewWin> mUi;
   TaskFollower* mFollower = nullptr;
 };

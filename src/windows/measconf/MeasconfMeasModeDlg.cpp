@@ -1,15 +1,15 @@
 #include "windows/measconf/MeasconfMeasModeDlg.h"
 
 #include <QApplication>
-#include <QComboBox>
-#include <QGroupBox>
 
 #include "instrument/QenGuiInst.h"
 #include "params/ui/BoundControl.h"
 #include "params/ui/QenParField.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_measconf.MeasMode.h"
 
-MeasconfMeasModeDlg::MeasconfMeasModeDlg(QWidget* parent) : QWidget(parent) {
+MeasconfMeasModeDlg::MeasconfMeasModeDlg(QWidget* parent)
+    : QWidget(parent), mUi(std::make_unique<Ui::MeasMode>()) {
   setObjectName(QStringLiteral("MeasconfMeasModeDlg"));
 }
 
@@ -20,15 +20,10 @@ MeasconfMeasModeDlg::~MeasconfMeasModeDlg() {
 }
 
 int MeasconfMeasModeDlg::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("measconf.MeasMode", this, list)) return status;
-  mMode = findChild<QComboBox*>(QStringLiteral("BoxMode"));
-  mGate = findChild<QGroupBox*>(QStringLiteral("GroupGate"));
-  mCapture = findChild<QGroupBox*>(QStringLiteral("GroupCapture"));
-  if (mMode == nullptr || mGate == nullptr || mCapture == nullptr) {
-    list.Add(1, "The window resource \"measconf.MeasMode\" lacks its mode, gate or capture group.");
-    return 1;
-  }
-  connect(mMode, &QComboBox::currentIndexChanged, this, &MeasconfMeasModeDlg::ShowModeGroups);
+  mUi->setupUi(this);
+  // The bound controls register with the engine once the form has set their attributes.
+  ResourceLibrary::InitWidgets(this);
+  connect(mUi->BoxMode, &QComboBox::currentIndexChanged, this, &MeasconfMeasModeDlg::ShowModeGroups);
   const int status = BoundControl::SetDsBaseNameAll(this, ":" + QenGuiInst::GetAppHandle(), list);
   ShowModeGroups();
   MeasconfMeasMode::SetEditor(this);
@@ -37,8 +32,8 @@ int MeasconfMeasModeDlg::Load(ConditionList& list) {
 
 // The items are in the order of the mode's words: PATT, CAPT, BER.
 void MeasconfMeasModeDlg::ShowModeGroups() {
-  mCapture->setEnabled(mMode->currentIndex() == 1);
-  mGate->setEnabled(mMode->currentIndex() == 2);
+  mUi->GroupCapture->setEnabled(mUi->BoxMode->currentIndex() == 1);
+  mUi->GroupGate->setEnabled(mUi->BoxMode->currentIndex() == 2);
 }
 
 int MeasconfMeasModeDlg::CommitPendingEdit(ConditionList& list) {

@@ -1,11 +1,14 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 
 #include "core/MeasconfMeasMode.h"
 #include "support/ConditionList.h"
 
-class QComboBox;
+namespace Ui {
+class MeasMode;
+}
 
 // The measurement mode dialog ("measconf.MeasMode"): the mode, the gate of an error count and
 // the capture settings as bound controls of the instrument-wide ":MEAS" parameters. The
@@ -25,7 +28,5 @@ class MeasconfMeasModeDlg : public QWidget, public MeasconfMeasMode::Editor {
  private:
   void ShowModeGroups();
 
-  QComboBox* mMode = nullptr;
-  QWidget* mGate = nullptr;
-  QWidget* mCapture = nullptr;
+  std::unique_ptr<Ui::MeasMode> mUi;
 };
