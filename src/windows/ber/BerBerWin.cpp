@@ -19,6 +19,7 @@
 #include "params/ui/BoundControl.h"
 #include "support/ExportFile.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_ber.BerWin.h"
 #include "windows/BerAtStop.h"
 #include "windows/PlaceName.h"
 #include "windows/ber/BerTableModel.h"
@@ -47,7 +48,8 @@ class BerBerWin::View : public QenDsView {
   BerBerWin& mWin;
 };
 
-BerBerWin::BerBerWin(QWidget* parent) : QWidget(parent), mView(std::make_unique<View>(*this)) {
+BerBerWin::BerBerWin(QWidget* parent)
+    : QWidget(parent), mUi(std::make_unique<Ui::BerWin>()), mView(std::make_unique<View>(*this)) {
   setObjectName(QStringLiteral("BerBerWin"));
   mClock.start();
 }
@@ -59,14 +61,10 @@ BerBerWin::~BerBerWin() {
 }
 
 int BerBerWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("ber.BerWin", this, list)) return status;
-  mTable = findChild<QTableView*>(QStringLiteral("TableBer"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  auto* area = findChild<QWidget*>(QStringLiteral("ChartArea"));
-  if (mTable == nullptr || mState == nullptr || area == nullptr || area->layout() == nullptr) {
-    list.Add(1, "The window resource \"ber.BerWin\" lacks its table, chart area or state line.");
-    return 1;
-  }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTable = mUi->TableBer;
+  mState = mUi->LabelState;
   mModel = new BerTableModel(this);
   mTable->setModel(mModel);
   mTable->verticalHeader()->setVisible(false);
@@ -85,15 +83,15 @@ int BerBerWin::Load(ConditionList& list) {
   mRatioAxis->setRange(1e-12, 1e-3);
   mChart->addAxis(mTimeAxis, Qt::AlignBottom);
   mChart->addAxis(mRatioAxis, Qt::AlignLeft);
-  auto* view = new QChartView(mChart, area);
+  auto* view = new QChartView(mChart, mUi->ChartArea);
   view->setObjectName(QStringLiteral("ChartBer"));
   view->setRenderHint(QPainter::Antialiasing);
-  area->layout()->addWidget(view);
+  mUi->ChartLayout->addWidget(view);
 
-  mReset = findChild<QPushButton*>(QStringLiteral("PButReset"));
-  if (mReset != nullptr) connect(mReset, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportTable"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportTable);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportHistory"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportHistory);
+  mReset = mUi->PButReset;
+  connect(mReset, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
+  connect(mUi->PButExportTable, &QPushButton::clicked, this, &BerBerWin::HitPButExportTable);
+  connect(mUi->PButExportHistory, &QPushButton::clicked, this, &BerBerWin::HitPButExportHistory);
   if (BerSvr* svr = uiapp::GetBerSvr()) {
     // The service is set up by the first window that shows it; a failure shows as an empty table.
     if (!svr->IsInitialized()) svr->Init(list);

@@ -17,6 +17,10 @@ class QChart;
 class QLogValueAxis;
 class QValueAxis;
 
+namespace Ui {
+class BerWin;
+}
+
 // The bit error rate window ("ber.BerWin"): every analyser port with its compared bits, errors
 // and ratio, a chart of each port's ratio over time on a logarithmic axis, reset of the counts
 // and CSV export of the table and of the history. It is a view of the application's BerSvr,
@@ -59,6 +63,7 @@ class BerBerWin : public QWidget, public LockAware {
   // Asks for the file and writes it with `write`.
   void ExportTo(const QString& title, const QString& name, Export write);
 
+  std::unique_ptr<Ui::BerWin> mUi;
   QTableView* mTable = nullptr;
   BerTableModel* mModel = nullptr;
   QLabel* mState = nullptr;

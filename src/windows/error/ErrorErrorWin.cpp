@@ -10,20 +10,20 @@
 
 #include "core/ErrorJournal.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_error.ErrorWin.h"
 #include "windows/error/ErrorJournalModel.h"
 
-ErrorErrorWin::ErrorErrorWin(QWidget* parent) : QWidget(parent) { setObjectName(QStringLiteral("ErrorErrorWin")); }
+ErrorErrorWin::ErrorErrorWin(QWidget* parent) : QWidget(parent), mUi(std::make_unique<Ui::ErrorWin>()) {
+  setObjectName(QStringLiteral("ErrorErrorWin"));
+}
 
 ErrorErrorWin::~ErrorErrorWin() = default;
 
-int ErrorErrorWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("error.ErrorWin", this, list)) return status;
-  mTable = findChild<QTableView*>(QStringLiteral("TableErrors"));
-  mCount = findChild<QLabel*>(QStringLiteral("LabelCount"));
-  if (mTable == nullptr || mCount == nullptr) {
-    list.Add(1, "The window resource \"error.ErrorWin\" lacks its list.");
-    return 1;
-  }
+int ErrorErrorWin::Load(ConditionList&) {
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTable = mUi->TableErrors;
+  mCount = mUi->LabelCount;
   mModel = new ErrorJournalModel(this);
   mTable->setModel(mModel);
   mTable->verticalHeader()->setVisible(false);
@@ -31,8 +31,8 @@ int ErrorErrorWin::Load(ConditionList& list) {
   mTable->horizontalHeader()->setSectionResizeMode(ErrorJournalModel::kText, QHeaderView::Stretch);
   mTable->setColumnWidth(ErrorJournalModel::kTime, 70);
   mTable->setColumnWidth(ErrorJournalModel::kCode, 60);
-  if (auto* copy = findChild<QPushButton*>(QStringLiteral("PButCopy"))) connect(copy, &QPushButton::clicked, this, &ErrorErrorWin::HitPButCopy);
-  if (auto* clear = findChild<QPushButton*>(QStringLiteral("PButClear"))) connect(clear, &QPushButton::clicked, this, &ErrorErrorWin::HitPButClear);
+  connect(mUi->PButCopy, &QPushButton::clicked, this, &ErrorErrorWin::HitPButCopy);
+  connect(mUi->PButClear, &QPushButton::clicked, this, &ErrorErrorWin::HitPButClear);
   connect(mModel, &QAbstractItemModel::rowsInserted, this, [this] {
     ShowCount();
     Raise();

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 
 #include "support/ConditionList.h"
 #include "windows/LockAware.h"
@@ -8,6 +9,10 @@
 class ErrorJournalModel;
 class QLabel;
 class QTableView;
+
+namespace Ui {
+class ErrorWin;
+}
 
 // The error list ("error.ErrorWin"): every condition of this session, newest first, with its
 // time, code, text and the command that caused it; copy (the selected rows, or all) and clear.
@@ -33,6 +38,7 @@ class ErrorErrorWin : public QWidget, public LockAware {
   void HitPButCopy();
   void HitPButClear();
 
+  std::unique_ptr<Ui::ErrorWin> mUi;
   QTableView* mTable = nullptr;
   QLabel* mCount = nullptr;
   ErrorJournalModel* mModel = nullptr;

@@ -13,33 +13,32 @@
 #include "sequences/CSequence.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_seqedit.EventWin.h"
 #include "windows/seqedit/BlockReactionModel.h"
 
 SeqeditEventWin::SeqeditEventWin(QWidget* parent)
-    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Fill(); })) {
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Fill(); })), mUi(std::make_unique<Ui::SeqeditEventWin>()) {
   setObjectName(QStringLiteral("SeqeditEventWin"));
 }
 
 SeqeditEventWin::~SeqeditEventWin() = default;
 
 int SeqeditEventWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("seqedit.EventWin", this, list)) return status;
-  mBlockLabel = findChild<QLabel*>(QStringLiteral("LabelBlock"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  mSync = findChild<QCheckBox*>(QStringLiteral("CheckSync"));
-  mMeasure = findChild<QCheckBox*>(QStringLiteral("CheckMeasure"));
-  mTrigger = findChild<QSpinBox*>(QStringLiteral("SpinTrigger"));
-  mTable = findChild<QTableView*>(QStringLiteral("TableReactions"));
-  mNew = findChild<QPushButton*>(QStringLiteral("PButNew"));
-  mDelete = findChild<QPushButton*>(QStringLiteral("PButDelete"));
   CSequence* sequence = CPortInfo::GetSequence();
-  if (mBlockLabel == nullptr || mState == nullptr || mSync == nullptr || mMeasure == nullptr ||
-      mTrigger == nullptr || mTable == nullptr || mNew == nullptr || mDelete == nullptr ||
-      sequence == nullptr) {
-    list.Add(
-        1, "The window resource \"seqedit.EventWin\" lacks its table or controls, or there is no sequence.");
+  if (sequence == nullptr) {
+    list.Add(1, "The event window has no sequence to show.");
     return 1;
   }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mBlockLabel = mUi->LabelBlock;
+  mState = mUi->LabelState;
+  mSync = mUi->CheckSync;
+  mMeasure = mUi->CheckMeasure;
+  mTrigger = mUi->SpinTrigger;
+  mTable = mUi->TableReactions;
+  mNew = mUi->PButNew;
+  mDelete = mUi->PButDelete;
   layout()->setContentsMargins(8, 6, 8, 6);
   mModel = new BlockReactionModel(*sequence, mBlock, this);
   mModel->SetRunner([this](const std::function<int(ConditionList&)>& edit) {

@@ -13,6 +13,10 @@ class SequenceFollower;
 class QPushButton;
 class QSpinBox;
 class QTableView;
+
+namespace Ui {
+class SeqeditEventWin;
+}
 class BlockReactionModel;
 
 // The event window of one block ("seqedit.EventWin"): the block's reactions (if, go to label,
@@ -54,6 +58,7 @@ class SeqeditEventWin : public QWidget {
   QPushButton* mNew = nullptr;
   QPushButton* mDelete = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
+  std::unique_ptr<Ui::SeqeditEventWin> mUi;
   unsigned long mBlock = 1;
   bool mFilling = false;
   // The current cell last seen, restored when the model is reset.

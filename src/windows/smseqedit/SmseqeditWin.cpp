@@ -16,12 +16,14 @@
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_smseqedit.Win.h"
 #include "windows/MainWin.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/seqedit/SequenceFileMenu.h"
 #include "windows/smseqedit/SequenceBlockModel.h"
 
-SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })) {
+SmseqeditWin::SmseqeditWin(QWidget* parent)
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })), mUi(std::make_unique<Ui::SmseqeditWin>()) {
   setObjectName(QStringLiteral("SmseqeditWin"));
 }
 
@@ -30,23 +32,19 @@ SmseqeditWin::~SmseqeditWin() = default;
 CSequence* SmseqeditWin::GetSequence() { return CPortInfo::GetSequence(); }
 
 int SmseqeditWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("smseqedit.Win", this, list)) return status;
-  mTable = findChild<QTableView*>(QStringLiteral("TableBlocks"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  auto* add = findChild<QPushButton*>(QStringLiteral("PButAdd"));
-  auto* remove = findChild<QPushButton*>(QStringLiteral("PButDelete"));
-  auto* up = findChild<QPushButton*>(QStringLiteral("PButUp"));
-  auto* down = findChild<QPushButton*>(QStringLiteral("PButDown"));
-  mOpenSegment = findChild<QPushButton*>(QStringLiteral("PButOpenSegment"));
-  if (mTable == nullptr || mState == nullptr || add == nullptr || remove == nullptr || up == nullptr || down == nullptr ||
-      mOpenSegment == nullptr || GetSequence() == nullptr) {
-    list.Add(1, "The window resource \"smseqedit.Win\" lacks its table or buttons, or there is no sequence.");
+  if (GetSequence() == nullptr) {
+    list.Add(1, "The simple sequence editor has no sequence to show.");
     return 1;
   }
-  connect(add, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return AddBlock(l); }); });
-  connect(remove, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return DeleteBlock(l); }); });
-  connect(up, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(-1, l); }); });
-  connect(down, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(1, l); }); });
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTable = mUi->TableBlocks;
+  mState = mUi->LabelState;
+  mOpenSegment = mUi->PButOpenSegment;
+  connect(mUi->PButAdd, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return AddBlock(l); }); });
+  connect(mUi->PButDelete, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return DeleteBlock(l); }); });
+  connect(mUi->PButUp, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(-1, l); }); });
+  connect(mUi->PButDown, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(1, l); }); });
   layout()->setContentsMargins(8, 6, 8, 6);
   setFocusProxy(mTable);
   mUndo = std::make_unique<SequenceUndo>(*GetSequence());
@@ -66,7 +64,7 @@ int SmseqeditWin::Load(ConditionList& list) {
   // A whole new sequence (other ports) keeps the current line where it was.
   connect(mModel, &QAbstractItemModel::modelReset, this, &SmseqeditWin::Rebuild);
   connect(mOpenSegment, &QPushButton::clicked, this, &SmseqeditWin::HitPButOpenSegment);
-  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) SequenceFileMenu::Attach(file, this);
+  SequenceFileMenu::Attach(mUi->PButSequenceFile, this);
   AddBlockActions();
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   mFollower->Follow(GetSequence());
@@ -97,9 +95,7 @@ void SmseqeditWin::Rebuild() {
                                  .arg(rows == 1 ? QStringLiteral("block") : QStringLiteral("blocks"))
                            : QStringLiteral("This sequence has loops: it is shown here, but this editor changes only "
                                             "sequences without loops."));
-  for (const char* name : {"PButAdd", "PButDelete", "PButUp", "PButDown"}) {
-    if (auto* button = findChild<QPushButton*>(QLatin1String(name))) button->setEnabled(editable);
-  }
+  for (QPushButton* button : {mUi->PButAdd, mUi->PButDelete, mUi->PButUp, mUi->PButDown}) button->setEnabled(editable);
   mOpenSegment->setEnabled(!CurrentSegment().empty());
 }
 

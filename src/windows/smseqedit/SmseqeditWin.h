@@ -15,6 +15,10 @@ class SequenceUndo;
 class QLabel;
 class QPushButton;
 class QTableView;
+
+namespace Ui {
+class SmseqeditWin;
+}
 class SequenceBlockModel;
 
 // The simple sequence editor ("smseqedit.Win"): the sequence as one list of blocks, a line each
@@ -66,6 +70,7 @@ class SmseqeditWin : public QWidget {
   QLabel* mState = nullptr;
   QPushButton* mOpenSegment = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
+  std::unique_ptr<Ui::SmseqeditWin> mUi;
   std::unique_ptr<SequenceUndo> mUndo;
   std::unique_ptr<SegmentCatalogFollower> mCatalog;
   // The current cell last seen, restored when the model is reset.
