@@ -184,15 +184,3 @@ TEST_F(SmseqeditTest, AnEditUnderALockLeavesTheSequence) {
   EXPECT_EQ(Other(":SGEN:GLOB:SEQ?"), before);
   EXPECT_FALSE(mWin->CanUndo());
 }
-
-// Another client's change reaches the table within the poll.
-TEST_F(SmseqeditTest, AnotherClientsChangeIsShown) {
-  Dstring text = Other(":SGEN:GLOB:SEQ?");
-  const std::string length = "," + Cell(0, 1).toStdString() + ",";
-  const std::size_t at = text.find(length);
-  ASSERT_NE(at, std::string::npos) << text;
-  text.replace(at, length.size(), ",4096,");
-  Other(":SGEN:GLOB:SEQ " + text);
-  for (int i = 0; i < 20 && Cell(0, 1) != QStringLiteral("4096"); ++i) PollAndShow();
-  EXPECT_EQ(Cell(0, 1), QStringLiteral("4096"));
-}
