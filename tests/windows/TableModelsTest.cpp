@@ -5,9 +5,11 @@
 
 #include <QAbstractItemModelTester>
 #include <QColor>
+#include <QPushButton>
 #include <QCoreApplication>
 #include <QSignalSpy>
 #include <QTableView>
+#include <map>
 #include <memory>
 
 #include "common/gui/GuiSimFixture.h"
@@ -15,7 +17,9 @@
 #include "sequences/CPortInfo.h"
 #include "sequences/CSequence.h"
 #include "support/NumberText.h"
+#include "windows/MainWin.h"
 #include "windows/ber/BerTableModel.h"
+#include "windows/seqedit/SequenceWindows.h"
 #include "windows/error/ErrorJournalModel.h"
 #include "windows/seqedit/BlockReactionModel.h"
 #include "windows/smseqedit/SequenceBlockModel.h"
@@ -201,6 +205,44 @@ TEST_F(SequenceModelTest, TheReactionsOfABlockFollowTheSequence) {
   EXPECT_EQ(model.rowCount(), 0) << "a synchronisation block has no reactions";
   model.SetBlock(7);
   EXPECT_EQ(model.rowCount(), 0);
+}
+
+struct Button {
+  const char* window;
+  const char* name;  // empty: the window itself
+  bool locked;       // enabled while another client holds the instrument
+};
+
+// What stays on in the lock: the error list whole, the error rate window but its reset; the
+// sequence windows are off whole. All of it is on again when the lock goes.
+TEST_F(SequenceModelTest, TheWindowsButtonsFollowTheLock) {
+  std::unique_ptr<MainWin> main = ShowMainWin();
+  const Button buttons[] = {
+      {"smseqedit.Win", "", false},         {"smseqedit.Win", "PButAdd", false},
+      {"seqedit.EventWin", "", false},      {"seqedit.EventWin", "PButNew", false},
+      {"error.ErrorWin", "", true},         {"error.ErrorWin", "PButCopy", true},
+      {"error.ErrorWin", "PButClear", true}, {"ber.BerWin", "", true},
+      {"ber.BerWin", "PButReset", false},   {"ber.BerWin", "PButExportTable", true},
+      {"ber.BerWin", "PButExportHistory", true},
+  };
+  std::map<std::string, QWidget*> windows;
+  for (const char* resource : {"smseqedit.Win", "error.ErrorWin", "ber.BerWin"})
+    windows[resource] = main->OpenWindow(QString::fromLatin1(resource));
+  windows["seqedit.EventWin"] = SequenceWindows::OpenEvents(windows["smseqedit.Win"], 1);
+  const auto enabled = [&](const Button& b) {
+    QWidget* w = windows[b.window];
+    if (*b.name != 0) w = w->findChild<QPushButton*>(QString::fromLatin1(b.name));
+    return w != nullptr && w->isEnabled();
+  };
+  for (const Button& b : buttons) EXPECT_TRUE(enabled(b)) << b.window << " " << b.name;
+  Control(":TEST:LOCK ON");
+  Poll();
+  Poll();
+  for (const Button& b : buttons) EXPECT_EQ(enabled(b), b.locked) << b.window << " " << b.name << " in the lock";
+  Control(":TEST:LOCK OFF");
+  Poll();
+  Poll();
+  for (const Button& b : buttons) EXPECT_TRUE(enabled(b)) << b.window << " " << b.name << " after the lock";
 }
 
 }  // namespace
