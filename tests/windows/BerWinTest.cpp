@@ -5,7 +5,7 @@
 #include <QPushButton>
 #include <QRegularExpression>
 #include <QValueAxis>
-#include <QTableWidget>
+#include <QTableView>
 #include <QTest>
 #include <cstdio>
 #include <fstream>
@@ -19,6 +19,7 @@
 #include "support/NumberText.h"
 #include "windows/StateStatusBar.h"
 #include "windows/ber/BerBerWin.h"
+#include "windows/ber/BerTableModel.h"
 
 namespace {
 
@@ -47,7 +48,7 @@ class BerWinTest : public GuiSimFixture {
     ASSERT_GT(ErrorsOfFirst(), 0u);
   }
   unsigned long long ErrorsOfFirst() const { return uiapp::GetBerSvr()->GetResults()[0].errors; }
-  std::string Cell(int row, int column) const { return mWin->Table()->item(row, column)->text().toStdString(); }
+  std::string Cell(int row, int column) const { return mWin->Model()->index(row, column).data().toString().toStdString(); }
   static std::string FileText(const std::string& path) {
     std::ifstream in(path);
     std::stringstream text;
@@ -63,7 +64,7 @@ class BerWinTest : public GuiSimFixture {
 
 TEST_F(BerWinTest, TableAndChartFollowTheRunAndResetStartsAfresh) {
   const int ports = static_cast<int>(uiapp::GetBerSvr()->GetResults().size());
-  EXPECT_EQ(mWin->Table()->rowCount(), ports);
+  EXPECT_EQ(mWin->Model()->rowCount(), ports);
   EXPECT_EQ(Cell(0, 3), "–");  // nothing compared yet
   Other(mPort + ":INJ 1E-2");
   Other(":SGEN:GLOB:INIT:CONT ON");
@@ -185,7 +186,7 @@ TEST_F(BerWinTest, TheChartSaysFromWhenItCounts) {
   BerBerWin late;
   ASSERT_EQ(late.Load(mList), 0) << mList.ToText();
   EXPECT_EQ(since(late, "when this window opened"), "ok");
-  EXPECT_EQ(late.Table()->item(0, 2)->text(), mWin->Table()->item(0, 2)->text());
+  EXPECT_EQ(late.Model()->index(0, 2).data(), mWin->Model()->index(0, 2).data());
   EXPECT_EQ(late.History().Samples().size(), 1u);
 
   QTest::mouseClick(mWin->findChild<QPushButton*>(QStringLiteral("PButReset")), Qt::LeftButton);

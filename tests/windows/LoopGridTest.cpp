@@ -27,8 +27,10 @@
 #include "windows/MainWin.h"
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/loopgridedit/LoopGridEditWin.h"
+#include "windows/seqedit/BlockReactionModel.h"
 #include "windows/seqedit/SeqeditEventWin.h"
 #include "windows/seqedit/SeqeditSeqEdWin.h"
+#include "windows/smseqedit/SequenceBlockModel.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
@@ -328,21 +330,18 @@ TEST_F(LoopGridTest, EventWindowEditsReachTheInstrument) {
   auto* events = qobject_cast<SeqeditEventWin*>(mMain->OpenEvents(2));
   ASSERT_NE(events, nullptr);
   ASSERT_EQ(events->NewReaction(), 0);
-  ASSERT_EQ(events->Table()->rowCount(), 1);
-  events->Table()->item(0, 0)->setText(QStringLiteral("ERR"));
-  events->Table()->item(0, 1)->setText(QStringLiteral("start"));
-  events->Table()->item(0, 2)->setText(QStringLiteral("5"));
+  BlockReactionModel* reactions = events->Model();
+  ASSERT_EQ(reactions->rowCount(), 1);
+  const char* typed[] = {"ERR", "start", "5"};
+  for (int c = 0; c < 3; ++c) reactions->setData(reactions->index(0, c), QString::fromLatin1(typed[c]));
   QCoreApplication::processEvents();
   EXPECT_TRUE(mAlerts.empty()) << mAlerts.front();
   EXPECT_NE(Server().find(",((\"ERR\",\"start\",5,\"\")),"), std::string::npos) << Server();
-  events->Table()->item(0, 2)->setText(QStringLiteral("five"));
-  QCoreApplication::processEvents();
-  ASSERT_EQ(mAlerts.size(), 1u);
-  EXPECT_EQ(events->Table()->item(0, 2)->text(), QStringLiteral("5"));
   EXPECT_EQ(LoopGridManager::MarksOf(*SequenceService::GetSequence(), 2), QStringLiteral("R1"));
   ASSERT_EQ(events->SetSync(true), 0);
   EXPECT_NE(Server().find(",SYNC,"), std::string::npos);
-  EXPECT_EQ(events->Table()->rowCount(), 0);
+  EXPECT_EQ(reactions->rowCount(), 0);
+  EXPECT_FALSE(events->Table()->isEnabled());
 }
 
 // Blocks are inserted, moved, copied, pasted and deleted on the grid's keys, loops keeping their
@@ -483,8 +482,8 @@ TEST_F(LoopGridTest, ASegmentInUseIsDeletedOnlyWithAWarningAndRunIsRefusedWithou
     return !list->findItems(QString::fromLatin1(name), Qt::MatchExactly).isEmpty();
   };
   const auto red = [&](unsigned long block) {
-    const QTableWidgetItem* cell = simple->Table()->item(static_cast<int>(block) - 1, 2);
-    return cell->foreground().color() == QColor(Qt::red);
+    const QVariant brush = simple->Model()->index(static_cast<int>(block) - 1, 2).data(Qt::ForegroundRole);
+    return brush.isValid() && brush.value<QBrush>().color() == QColor(Qt::red);
   };
   const auto marked = [&](unsigned long block) {
     for (GridDisp* disp : mGrid->Disps()) {

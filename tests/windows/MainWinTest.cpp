@@ -7,7 +7,7 @@
 #include <QMdiArea>
 #include <QMdiSubWindow>
 #include <QPushButton>
-#include <QTableWidget>
+#include <QTableView>
 #include <QTest>
 #include <QToolBar>
 #include <QTreeWidget>
@@ -32,6 +32,7 @@
 #include "windows/dataedit/DataeditSegmentEditWin.h"
 #include "windows/dtecmd/DtecmdCmdWin.h"
 #include "windows/error/ErrorErrorWin.h"
+#include "windows/error/ErrorJournalModel.h"
 #include "windows/paramedit/ParameditParamEdWin.h"
 #include "windows/selftest/SelftestResultWin.h"
 #include "windows/smseqedit/SmseqeditWin.h"
@@ -393,9 +394,10 @@ TEST_F(MainWinTest, CommandWindowShowsRepliesAndTheErrorListTheErrors) {
   QTest::keyClicks(cmd->Input(), "::NO:SUCH:HEADER 1");
   QTest::keyClick(cmd->Input(), Qt::Key_Return);
   EXPECT_TRUE(cmd->Transcript().contains("error -113")) << cmd->Transcript().toStdString();
-  ASSERT_EQ(errors->Tree()->topLevelItemCount(), 1);
-  EXPECT_EQ(errors->Tree()->topLevelItem(0)->text(1), "-113");
-  EXPECT_EQ(errors->Tree()->topLevelItem(0)->text(3).toStdString(), ":" + mHandle + ":NO:SUCH:HEADER 1");
+  ASSERT_EQ(errors->Model()->rowCount(), 1);
+  EXPECT_EQ(errors->Model()->index(0, ErrorJournalModel::kCode).data().toString(), "-113");
+  EXPECT_EQ(errors->Model()->index(0, ErrorJournalModel::kCommand).data().toString().toStdString(),
+            ":" + mHandle + ":NO:SUCH:HEADER 1");
   EXPECT_EQ(mWin->Area()->subWindowList(QMdiArea::StackingOrder).last()->widget(), errors)
       << "a new error raises the open list";
   EXPECT_EQ(mWin->Area()->activeSubWindow()->widget(), cmd) << "without taking the focus from the typing";
@@ -432,11 +434,12 @@ TEST_F(MainWinTest, TheSequenceOpensItsSegmentsInTheSegmentEditor) {
   auto* sequence = Open<SmseqeditWin>("smseqedit.Win");
   ASSERT_NE(sequence, nullptr);
   auto* button = sequence->findChild<QPushButton*>(QStringLiteral("PButOpenSegment"));
-  sequence->Table()->setCurrentCell(0, 2);
+  QAbstractItemModel* blocks = sequence->Table()->model();
+  sequence->Table()->setCurrentIndex(blocks->index(0, 2));
   EXPECT_FALSE(button->isEnabled());  // a word, PAUSE
-  sequence->Table()->item(0, 2)->setText(QStringLiteral("Seq/Shown"));
-  sequence->Table()->setCurrentCell(0, 3);
-  sequence->Table()->setCurrentCell(0, 2);
+  blocks->setData(blocks->index(0, 2), QStringLiteral("Seq/Shown"));
+  sequence->Table()->setCurrentIndex(blocks->index(0, 3));
+  sequence->Table()->setCurrentIndex(blocks->index(0, 2));
   ASSERT_TRUE(button->isEnabled());
   const qsizetype windows = mWin->Area()->subWindowList().size();
   QTest::mouseClick(button, Qt::LeftButton);

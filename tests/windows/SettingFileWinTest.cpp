@@ -20,6 +20,7 @@
 #include "common/gui/GuiSimFixture.h"
 #include "windows/common/FileChoice.h"
 #include "windows/MainWin.h"
+#include "windows/smseqedit/SequenceBlockModel.h"
 #include "windows/smseqedit/SmseqeditWin.h"
 
 namespace {
@@ -179,7 +180,7 @@ TEST_P(SequenceFileWin, ExportsAndImportsTheSequence) {
   EXPECT_TRUE(mAlerts.empty()) << Alerts();
   EXPECT_EQ(Other(":SGEN:GLOB:SEQ?"), two);
   if (auto* simple = qobject_cast<SmseqeditWin*>(editor)) {
-    EXPECT_EQ(simple->Table()->rowCount(), 2) << "the editor shows what was imported";
+    EXPECT_EQ(simple->Model()->rowCount(), 2) << "the editor shows what was imported";
   }
 
   std::ofstream(mPath) << "qen sequence 1\nsequence (3.0,,)\nevents (3.0)\nend\n";

@@ -7,7 +7,7 @@
 #include <QLineSeries>
 #include <QLogValueAxis>
 #include <QPushButton>
-#include <QTableWidget>
+#include <QTableView>
 #include <QValueAxis>
 #include <QVBoxLayout>
 #include <algorithm>
@@ -18,21 +18,16 @@
 #include "data/RunStopDs.h"
 #include "params/ui/BoundControl.h"
 #include "support/ExportFile.h"
-#include "support/NumberText.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_ber.BerWin.h"
 #include "windows/common/BerAtStop.h"
 #include "windows/common/PlaceName.h"
+#include "windows/ber/BerTableModel.h"
 
 namespace {
 
 // A ratio of 0 has no place on a logarithmic axis: it is drawn at the axis floor.
 constexpr double kFloor = 1e-15;
-
-QTableWidgetItem* Cell(const QString& text, bool number) {
-  auto* item = new QTableWidgetItem(text);
-  if (number) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
-  return item;
-}
 
 }  // namespace
 
@@ -53,7 +48,8 @@ class BerBerWin::View : public QenDsView {
   BerBerWin& mWin;
 };
 
-BerBerWin::BerBerWin(QWidget* parent) : QWidget(parent), mView(std::make_unique<View>(*this)) {
+BerBerWin::BerBerWin(QWidget* parent)
+    : QWidget(parent), mUi(std::make_unique<Ui::BerWin>()), mView(std::make_unique<View>(*this)) {
   setObjectName(QStringLiteral("BerBerWin"));
   mClock.start();
 }
@@ -65,14 +61,12 @@ BerBerWin::~BerBerWin() {
 }
 
 int BerBerWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("ber.BerWin", this, list)) return status;
-  mTable = findChild<QTableWidget*>(QStringLiteral("TableBer"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  auto* area = findChild<QWidget*>(QStringLiteral("ChartArea"));
-  if (mTable == nullptr || mState == nullptr || area == nullptr || area->layout() == nullptr) {
-    list.Add(1, "The window resource \"ber.BerWin\" lacks its table, chart area or state line.");
-    return 1;
-  }
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTable = mUi->TableBer;
+  mState = mUi->LabelState;
+  mModel = new BerTableModel(this);
+  mTable->setModel(mModel);
   mTable->verticalHeader()->setVisible(false);
   mTable->horizontalHeader()->setSectionResizeMode(0, QHeaderView::Stretch);
   for (int c = 1; c < 4; ++c) mTable->horizontalHeader()->setSectionResizeMode(c, QHeaderView::ResizeToContents);
@@ -89,15 +83,15 @@ int BerBerWin::Load(ConditionList& list) {
   mRatioAxis->setRange(1e-12, 1e-3);
   mChart->addAxis(mTimeAxis, Qt::AlignBottom);
   mChart->addAxis(mRatioAxis, Qt::AlignLeft);
-  auto* view = new QChartView(mChart, area);
+  auto* view = new QChartView(mChart, mUi->ChartArea);
   view->setObjectName(QStringLiteral("ChartBer"));
   view->setRenderHint(QPainter::Antialiasing);
-  area->layout()->addWidget(view);
+  mUi->ChartLayout->addWidget(view);
 
-  mReset = findChild<QPushButton*>(QStringLiteral("PButReset"));
-  if (mReset != nullptr) connect(mReset, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportTable"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportTable);
-  if (auto* b = findChild<QPushButton*>(QStringLiteral("PButExportHistory"))) connect(b, &QPushButton::clicked, this, &BerBerWin::HitPButExportHistory);
+  mReset = mUi->PButReset;
+  connect(mReset, &QPushButton::clicked, this, &BerBerWin::HitPButReset);
+  connect(mUi->PButExportTable, &QPushButton::clicked, this, &BerBerWin::HitPButExportTable);
+  connect(mUi->PButExportHistory, &QPushButton::clicked, this, &BerBerWin::HitPButExportHistory);
   if (BerSvr* svr = uiapp::GetBerSvr()) {
     // The service is set up by the first window that shows it; a failure shows as an empty table.
     if (!svr->IsInitialized()) svr->Init(list);
@@ -132,16 +126,8 @@ void BerBerWin::ShowResults() {
     mState->setText(running ? QStringLiteral("Running: the instrument's counts since the run started or was reset.")
                             : QStringLiteral("Stopped: the counts of the last run; they change only while the instrument runs."));
   }
-  if (results == mShown && mTable->rowCount() == static_cast<int>(results.size())) return;
-  mTable->setRowCount(static_cast<int>(results.size()));
-  for (int row = 0; row < static_cast<int>(results.size()); ++row) {
-    const BerSvr::PortResult& r = results[static_cast<std::size_t>(row)];
-    mTable->setItem(row, 0, Cell(PlaceName(r.port), false));
-    mTable->setItem(row, 1, Cell(QString::fromStdString(NumberText::Grouped(r.compared)), true));
-    mTable->setItem(row, 2, Cell(QString::fromStdString(NumberText::Grouped(r.errors)), true));
-    mTable->setItem(row, 3, Cell(QString::fromStdString(NumberText::Ratio(r.errors, r.compared)), true));
-    mTable->item(row, 2)->setForeground(r.errors > 0 ? QColor(0xb3, 0x26, 0x1e) : palette().color(QPalette::Text));
-  }
+  mModel->SetResults(results);
+  if (results == mShown) return;
   mShown = results;
   if (!results.empty()) {
     if (mHistory.Samples().empty()) mSince = QTime::currentTime();

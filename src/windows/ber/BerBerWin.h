@@ -11,10 +11,15 @@
 
 class QLabel;
 class QPushButton;
-class QTableWidget;
+class BerTableModel;
+class QTableView;
 class QChart;
 class QLogValueAxis;
 class QValueAxis;
+
+namespace Ui {
+class BerWin;
+}
 
 // The bit error rate window ("ber.BerWin"): every analyser port with its compared bits, errors
 // and ratio, a chart of each port's ratio over time on a logarithmic axis, reset of the counts
@@ -33,7 +38,8 @@ class BerBerWin : public QWidget, public LockAware {
   int Load(ConditionList& list);
   int ExportTable(const Dstring& path, ConditionList& list) const;
   int ExportHistory(const Dstring& path, ConditionList& list) const;
-  QTableWidget* Table() const { return mTable; }
+  QTableView* Table() const { return mTable; }
+  BerTableModel* Model() const { return mModel; }
   QChart* Chart() const { return mChart; }
   const BerHistory& History() const { return mHistory; }
   // Shows the service's counts and adds them to the history when they changed.
@@ -57,7 +63,9 @@ class BerBerWin : public QWidget, public LockAware {
   // Asks for the file and writes it with `write`.
   void ExportTo(const QString& title, const QString& name, Export write);
 
-  QTableWidget* mTable = nullptr;
+  std::unique_ptr<Ui::BerWin> mUi;
+  QTableView* mTable = nullptr;
+  BerTableModel* mModel = nullptr;
   QLabel* mState = nullptr;
   QPushButton* mReset = nullptr;
   QChart* mChart = nullptr;

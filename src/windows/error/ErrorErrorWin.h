@@ -1,12 +1,18 @@
 #pragma once
 
 #include <QWidget>
+#include <memory>
 
 #include "support/ConditionList.h"
 #include "windows/common/LockAware.h"
 
+class ErrorJournalModel;
 class QLabel;
-class QTreeWidget;
+class QTableView;
+
+namespace Ui {
+class ErrorWin;
+}
 
 // The error list ("error.ErrorWin"): every condition of this session, newest first, with its
 // time, code, text and the command that caused it; copy (the selected rows, or all) and clear.
@@ -21,16 +27,19 @@ class ErrorErrorWin : public QWidget, public LockAware {
   int Load(ConditionList& list);
   // The rows as tab-separated text: the selected ones, or all when none is selected.
   QString RowsAsText() const;
-  QTreeWidget* Tree() const { return mTree; }
+  QTableView* Table() const { return mTable; }
+  ErrorJournalModel* Model() const { return mModel; }
   // Nothing here asks the instrument: it all stays on while another client holds it.
   void ShowLock(bool) override {}
 
  private:
-  void ShowEntries();
+  void ShowCount();
+  void Raise();
   void HitPButCopy();
   void HitPButClear();
 
-  QTreeWidget* mTree = nullptr;
+  std::unique_ptr<Ui::ErrorWin> mUi;
+  QTableView* mTable = nullptr;
   QLabel* mCount = nullptr;
-  std::size_t mShown = 0;
+  ErrorJournalModel* mModel = nullptr;
 };

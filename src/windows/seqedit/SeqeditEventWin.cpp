@@ -3,60 +3,59 @@
 #include <QCheckBox>
 #include <QHeaderView>
 #include <QLabel>
-#include <QLayout>
 #include <QPushButton>
 #include <QSpinBox>
-#include <QTableWidget>
+#include <QTableView>
 
 #include "params/ui/BoundControl.h"
 #include "sequences/CSequence.h"
 #include "sequences/SequenceService.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
-
-namespace {
-
-enum Column { kIf = 0, kGoto = 1, kTrigger = 2, kVxi = 3 };
-
-}  // namespace
+#include "ui_seqedit.EventWin.h"
+#include "windows/seqedit/BlockReactionModel.h"
 
 SeqeditEventWin::SeqeditEventWin(QWidget* parent)
-    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Fill(); })) {
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Fill(); })), mUi(std::make_unique<Ui::SeqeditEventWin>()) {
   setObjectName(QStringLiteral("SeqeditEventWin"));
 }
 
 SeqeditEventWin::~SeqeditEventWin() = default;
 
 int SeqeditEventWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("seqedit.EventWin", this, list)) return status;
-  mBlockLabel = findChild<QLabel*>(QStringLiteral("LabelBlock"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  mSync = findChild<QCheckBox*>(QStringLiteral("CheckSync"));
-  mMeasure = findChild<QCheckBox*>(QStringLiteral("CheckMeasure"));
-  mTrigger = findChild<QSpinBox*>(QStringLiteral("SpinTrigger"));
-  mTable = findChild<QTableWidget*>(QStringLiteral("TableReactions"));
-  mNew = findChild<QPushButton*>(QStringLiteral("PButNew"));
-  mDelete = findChild<QPushButton*>(QStringLiteral("PButDelete"));
   CSequence* sequence = SequenceService::GetSequence();
-  if (mBlockLabel == nullptr || mState == nullptr || mSync == nullptr || mMeasure == nullptr ||
-      mTrigger == nullptr || mTable == nullptr || mNew == nullptr || mDelete == nullptr ||
-      sequence == nullptr) {
-    list.Add(
-        1, "The window resource \"seqedit.EventWin\" lacks its table or controls, or there is no sequence.");
+  if (sequence == nullptr) {
+    list.Add(1, "The event window has no sequence to show.");
     return 1;
   }
-  layout()->setContentsMargins(8, 6, 8, 6);
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mBlockLabel = mUi->LabelBlock;
+  mState = mUi->LabelState;
+  mSync = mUi->CheckSync;
+  mMeasure = mUi->CheckMeasure;
+  mTrigger = mUi->SpinTrigger;
+  mTable = mUi->TableReactions;
+  mNew = mUi->PButNew;
+  mDelete = mUi->PButDelete;
+  mModel = new BlockReactionModel(*sequence, mBlock, this);
+  mModel->SetRunner([this](const std::function<int(ConditionList&)>& edit) {
+    return Run([&edit](CSequence&, ConditionList& l) { return edit(l); });
+  });
+  mTable->setModel(mModel);
   mTable->horizontalHeader()->setStretchLastSection(true);
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
-  mTable->setColumnWidth(kIf, 160);
-  mTable->setColumnWidth(kGoto, 160);
-  mTable->setColumnWidth(kTrigger, 80);
-  connect(mTable, &QTableWidget::cellChanged, this, [this](int row, int column) {
-    if (!mFilling) SetReaction(static_cast<unsigned long>(row), column, mTable->item(row, column)->text());
+  mTable->setColumnWidth(BlockReactionTable::kIf, 160);
+  mTable->setColumnWidth(BlockReactionTable::kGoto, 160);
+  mTable->setColumnWidth(BlockReactionTable::kTrigger, 80);
+  // The current line is kept where it was when the reactions are taken afresh.
+  connect(mModel, &QAbstractItemModel::modelAboutToBeReset, this, [this] {
+    if (mTable->currentIndex().isValid()) mLastRow = mTable->currentIndex().row(), mLastColumn = mTable->currentIndex().column();
   });
+  connect(mModel, &QAbstractItemModel::modelReset, this, &SeqeditEventWin::Fill);
   connect(mNew, &QPushButton::clicked, this, [this] { NewReaction(); });
   connect(mDelete, &QPushButton::clicked, this, [this] {
-    if (mTable->currentRow() >= 0) DeleteReaction(static_cast<unsigned long>(mTable->currentRow()));
+    if (mTable->currentIndex().isValid()) DeleteReaction(static_cast<unsigned long>(mTable->currentIndex().row()));
   });
   connect(mSync, &QCheckBox::toggled, this, [this](bool on) {
     if (!mFilling) SetSync(on);
@@ -82,6 +81,7 @@ int SeqeditEventWin::Load(ConditionList& list) {
 
 void SeqeditEventWin::ShowBlock(unsigned long block) {
   mBlock = block;
+  if (mModel != nullptr) mModel->SetBlock(block);
   Fill();
 }
 
@@ -101,27 +101,10 @@ void SeqeditEventWin::Fill() {
   mSync->setChecked(sync);
   mMeasure->setChecked(exists && sequence->GetBlockMeasurementStart(mBlock) != 0);
   mTrigger->setValue(exists ? static_cast<int>(sequence->GetBlockTrigger(mBlock)) : 0);
-  const unsigned long count = exists ? sequence->GetBlockNumBranches(mBlock) : 0;
-  const int current = mTable->currentRow();
-  mTable->setRowCount(static_cast<int>(count));
-  for (unsigned long n = 0; n < count; ++n) {
-    const QString texts[] = {QString::fromStdString(sequence->GetReactIf(mBlock, n)),
-                             QString::fromStdString(sequence->GetReactGoto(mBlock, n)),
-                             QString::number(sequence->GetReactTrig(mBlock, n)),
-                             QString::fromStdString(sequence->GetReactVxi(mBlock, n))};
-    for (int c = 0; c < 4; ++c) {
-      QTableWidgetItem* item = mTable->item(static_cast<int>(n), c);
-      if (item == nullptr) {
-        item = new QTableWidgetItem;
-        if (c == kTrigger) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
-        mTable->setItem(static_cast<int>(n), c, item);
-      }
-      item->setText(texts[c]);
-    }
+  const unsigned long count = static_cast<unsigned long>(mModel->rowCount());
+  if (count > 0 && !mTable->currentIndex().isValid()) {
+    mTable->setCurrentIndex(mModel->index(std::clamp(mLastRow, 0, static_cast<int>(count) - 1), std::max(0, mLastColumn)));
   }
-  if (count > 0)
-    mTable->setCurrentCell(std::clamp(current, 0, static_cast<int>(count) - 1),
-                           std::max(0, mTable->currentColumn()));
   for (QWidget* w : std::initializer_list<QWidget*>{mSync, mMeasure, mTrigger}) w->setEnabled(exists);
   // A synchronisation block carries no reactions.
   mTable->setEnabled(exists && !sync);
@@ -156,26 +139,4 @@ int SeqeditEventWin::DeleteReaction(unsigned long n) {
 int SeqeditEventWin::SetSync(bool sync) {
   return Run(
       [this, sync](CSequence& s, ConditionList& l) { return s.SetBlockSync(mBlock, sync ? 1 : 0, l); });
-}
-
-int SeqeditEventWin::SetReaction(unsigned long n, int column, const QString& text) {
-  const Dstring value = text.trimmed().toStdString();
-  return Run([&](CSequence& s, ConditionList& l) -> int {
-    switch (column) {
-      case kIf:
-        return s.SetReactIf(mBlock, n, value, l);
-      case kGoto:
-        return s.SetReactGoto(mBlock, n, value, l);
-      case kVxi:
-        return s.SetReactVxi(mBlock, n, value, l);
-      default:
-        break;
-    }
-    unsigned long trigger = 0;
-    if (value.empty() || value.find_first_not_of("0123456789") != Dstring::npos || !value.ToULong(trigger)) {
-      l.Add(1, Dstring::Format("\"%s\" is no trigger: a whole number from 0.", value.c_str()));
-      return 1;
-    }
-    return s.SetReactTrig(mBlock, n, trigger, l);
-  });
 }

@@ -12,7 +12,12 @@ class QLabel;
 class SequenceFollower;
 class QPushButton;
 class QSpinBox;
-class QTableWidget;
+class QTableView;
+
+namespace Ui {
+class SeqeditEventWin;
+}
+class BlockReactionModel;
 
 // The event window of one block ("seqedit.EventWin"): the block's reactions (if, go to label,
 // trigger, VXI trigger: what the sequencer does when an event comes while the block plays), its
@@ -30,13 +35,14 @@ class SeqeditEventWin : public QWidget {
   // Shows block `block` (from 1).
   void ShowBlock(unsigned long block);
   unsigned long Block() const { return mBlock; }
-  QTableWidget* Table() const { return mTable; }
-  // Takes the model again.
+  QTableView* Table() const { return mTable; }
+  BlockReactionModel* Model() const { return mModel; }
+  // Shows the block's label, marks and state as the sequence now is; the table follows the
+  // model's reports itself.
   void Fill();
   // The edits the window's controls make, on its block.
   int NewReaction();
   int DeleteReaction(unsigned long n);
-  int SetReaction(unsigned long n, int column, const QString& text);
   int SetSync(bool sync);
 
  private:
@@ -47,10 +53,15 @@ class SeqeditEventWin : public QWidget {
   QCheckBox* mSync = nullptr;
   QCheckBox* mMeasure = nullptr;
   QSpinBox* mTrigger = nullptr;
-  QTableWidget* mTable = nullptr;
+  QTableView* mTable = nullptr;
+  BlockReactionModel* mModel = nullptr;
   QPushButton* mNew = nullptr;
   QPushButton* mDelete = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
+  std::unique_ptr<Ui::SeqeditEventWin> mUi;
   unsigned long mBlock = 1;
   bool mFilling = false;
+  // The current cell last seen, restored when the model is reset.
+  int mLastRow = 0;
+  int mLastColumn = 0;
 };

@@ -3,25 +3,26 @@
 #include <QAction>
 #include <QHeaderView>
 #include <QLabel>
-#include <QLayout>
 #include <QPushButton>
-#include <QTableWidget>
+#include <QTableView>
 
 #include "params/ui/BoundControl.h"
 #include "segments/SegmentCatalogFollower.h"
 #include "sequences/CSequence.h"
 #include "sequences/CSequenceBlock.h"
-#include "sequences/SequenceCellEdit.h"
 #include "sequences/SequenceService.h"
 #include "sequences/SequenceUndo.h"
 #include "sequences/ui/LoopGridManager.h"
 #include "sequences/ui/SequenceFollower.h"
 #include "toolkit/qt/ResourceLibrary.h"
+#include "ui_smseqedit.Win.h"
 #include "windows/common/PortHeader.h"
 #include "windows/common/SequenceFileMenu.h"
 #include "windows/common/WindowOpener.h"
+#include "windows/smseqedit/SequenceBlockModel.h"
 
-SmseqeditWin::SmseqeditWin(QWidget* parent) : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })) {
+SmseqeditWin::SmseqeditWin(QWidget* parent)
+    : QWidget(parent), mFollower(std::make_unique<SequenceFollower>(this, [this] { Rebuild(); })), mUi(std::make_unique<Ui::SmseqeditWin>()) {
   setObjectName(QStringLiteral("SmseqeditWin"));
 }
 
@@ -30,124 +31,78 @@ SmseqeditWin::~SmseqeditWin() = default;
 CSequence* SmseqeditWin::GetSequence() { return SequenceService::GetSequence(); }
 
 int SmseqeditWin::Load(ConditionList& list) {
-  if (int status = ResourceLibrary::LoadInto("smseqedit.Win", this, list)) return status;
-  mTable = findChild<QTableWidget*>(QStringLiteral("TableBlocks"));
-  mState = findChild<QLabel*>(QStringLiteral("LabelState"));
-  auto* add = findChild<QPushButton*>(QStringLiteral("PButAdd"));
-  auto* remove = findChild<QPushButton*>(QStringLiteral("PButDelete"));
-  auto* up = findChild<QPushButton*>(QStringLiteral("PButUp"));
-  auto* down = findChild<QPushButton*>(QStringLiteral("PButDown"));
-  mOpenSegment = findChild<QPushButton*>(QStringLiteral("PButOpenSegment"));
-  if (mTable == nullptr || mState == nullptr || add == nullptr || remove == nullptr || up == nullptr || down == nullptr ||
-      mOpenSegment == nullptr || GetSequence() == nullptr) {
-    list.Add(1, "The window resource \"smseqedit.Win\" lacks its table or buttons, or there is no sequence.");
+  if (GetSequence() == nullptr) {
+    list.Add(1, "The simple sequence editor has no sequence to show.");
     return 1;
   }
-  connect(add, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return AddBlock(l); }); });
-  connect(remove, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return DeleteBlock(l); }); });
-  connect(up, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(-1, l); }); });
-  connect(down, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(1, l); }); });
-  layout()->setContentsMargins(8, 6, 8, 6);
+  mUi->setupUi(this);
+  ResourceLibrary::InitWidgets(this);
+  mTable = mUi->TableBlocks;
+  mState = mUi->LabelState;
+  mOpenSegment = mUi->PButOpenSegment;
+  connect(mUi->PButAdd, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return AddBlock(l); }); });
+  connect(mUi->PButDelete, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return DeleteBlock(l); }); });
+  connect(mUi->PButUp, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(-1, l); }); });
+  connect(mUi->PButDown, &QPushButton::clicked, this, [this] { Run([this](ConditionList& l) { return MoveBlock(1, l); }); });
   setFocusProxy(mTable);
-  connect(mTable, &QTableWidget::cellChanged, this, &SmseqeditWin::HitCellChanged);
-  connect(mTable, &QTableWidget::currentCellChanged, this, [this] { mOpenSegment->setEnabled(!CurrentSegment().empty()); });
+  mUndo = std::make_unique<SequenceUndo>(*GetSequence());
+  mCatalog = std::make_unique<SegmentCatalogFollower>([this] {
+    if (mModel != nullptr) mModel->MissingChanged();
+  });
+  int status = GetSequence()->ReadSequence(list, 0);
+  if (int read = mCatalog->Read(list); status == 0) status = read;
+  mModel = new SequenceBlockModel(
+      *GetSequence(), [this](const Dstring& name) { return mCatalog->IsMissing(name); }, this);
+  mModel->SetRunner([this](const std::function<int(ConditionList&)>& edit) { return Run(edit); });
+  mTable->setModel(mModel);
+  connect(mTable->selectionModel(), &QItemSelectionModel::currentChanged, this, [this](const QModelIndex& current) {
+    if (current.isValid()) mLastRow = current.row(), mLastColumn = current.column();
+    mOpenSegment->setEnabled(!CurrentSegment().empty());
+  });
+  // A whole new sequence (other ports) keeps the current line where it was.
+  connect(mModel, &QAbstractItemModel::modelReset, this, &SmseqeditWin::Rebuild);
   connect(mOpenSegment, &QPushButton::clicked, this, &SmseqeditWin::HitPButOpenSegment);
-  if (auto* file = findChild<QPushButton*>(QStringLiteral("PButSequenceFile"))) SequenceFileMenu::Attach(file, this);
+  SequenceFileMenu::Attach(mUi->PButSequenceFile, this);
   AddBlockActions();
   mTable->horizontalHeader()->setSectionResizeMode(QHeaderView::Interactive);
   mFollower->Follow(GetSequence());
-  mUndo = std::make_unique<SequenceUndo>(*GetSequence());
-  mCatalog = std::make_unique<SegmentCatalogFollower>([this] { Rebuild(); });
-  int status = GetSequence()->ReadSequence(list, 0);
-  if (int read = mCatalog->Read(list); status == 0) status = read;
   Rebuild();
   return status;
 }
 
-bool SmseqeditWin::IsEditable() const { return GetSequence() != nullptr && GetSequence()->GetLoops().empty(); }
+bool SmseqeditWin::IsEditable() const { return GetSequence() != nullptr && mModel != nullptr && mModel->Table().IsEditable(false); }
 
 unsigned long SmseqeditWin::CurrentBlock() const {
-  return mTable->currentRow() < 0 ? 0 : static_cast<unsigned long>(mTable->currentRow()) + 1;
+  const QModelIndex current = mTable->currentIndex();
+  return current.isValid() ? static_cast<unsigned long>(current.row()) + 1 : 0;
 }
 
 void SmseqeditWin::Rebuild() {
-  const CSequence* sequence = GetSequence();
   mFollower->Refreshed();
-  if (sequence == nullptr || mTable == nullptr) return;
-  mFilling = true;
-  const int current = mTable->currentRow();
-  const int column = std::max(0, mTable->currentColumn());
-  const unsigned long ports = sequence->GetNumPorts();
-  mTable->setColumnCount(kFirstPortColumn + static_cast<int>(ports));
-  mTable->setHorizontalHeaderItem(0, new QTableWidgetItem(QStringLiteral("Label")));
-  mTable->setHorizontalHeaderItem(1, new QTableWidgetItem(QStringLiteral("Length")));
-  // The sequence's ports are the data ports in the order of the configuration: a column each.
-  for (unsigned long p = 1; p <= ports; ++p) {
-    QString tip;
-    auto* header = new QTableWidgetItem(PortHeader(p, &tip));
-    header->setToolTip(tip);
-    mTable->setHorizontalHeaderItem(kFirstPortColumn + static_cast<int>(p) - 1, header);
-  }
-  mTable->setRowCount(static_cast<int>(sequence->GetNumBlocks()));
-  const bool editable = IsEditable();
-  for (unsigned long b = 1; b <= sequence->GetNumBlocks(); ++b) {
-    const int row = static_cast<int>(b - 1);
-    QStringList texts = {QString::fromStdString(sequence->GetLabel(b)), QString::number(sequence->GetBlockLength(b))};
-    for (unsigned long p = 1; p <= ports; ++p) texts << QString::fromStdString(sequence->GetSegment(b, p));
-    // The cells are kept and their texts set: the table may be filled while a cell's edit is
-    // being told.
-    for (int c = 0; c < texts.size(); ++c) {
-      QTableWidgetItem* item = mTable->item(row, c);
-      if (item == nullptr) {
-        item = new QTableWidgetItem;
-        if (c == 1) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
-        mTable->setItem(row, c, item);
-      }
-      item->setText(texts[c]);
-      item->setFlags(editable ? item->flags() | Qt::ItemIsEditable : item->flags() & ~Qt::ItemIsEditable);
-      const bool missing =
-          c >= kFirstPortColumn && IsMissing(b, static_cast<unsigned long>(c - kFirstPortColumn + 1));
-      item->setForeground(missing ? QBrush(Qt::red) : QBrush());
-      item->setToolTip(missing ? QStringLiteral("The instrument has no segment of this name.") : QString());
-    }
-  }
-  if (mTable->rowCount() > 0) {
-    mTable->setCurrentCell(std::clamp(current, 0, mTable->rowCount() - 1), std::min(column, mTable->columnCount() - 1));
+  if (mModel == nullptr) return;
+  const int rows = mModel->rowCount();
+  if (rows > 0 && !mTable->currentIndex().isValid()) {
+    mTable->setCurrentIndex(mModel->index(std::clamp(mLastRow, 0, rows - 1), std::clamp(mLastColumn, 0, mModel->columnCount() - 1)));
   }
   mTable->resizeColumnsToContents();
   mTable->setColumnWidth(0, std::max(mTable->columnWidth(0), 120));
   mTable->setColumnWidth(1, std::max(mTable->columnWidth(1), 80));
+  const bool editable = IsEditable();
   mState->setText(editable ? QStringLiteral("%1 %2. A change goes to the instrument as it is made.")
-                                 .arg(mTable->rowCount())
-                                 .arg(mTable->rowCount() == 1 ? QStringLiteral("block") : QStringLiteral("blocks"))
+                                 .arg(rows)
+                                 .arg(rows == 1 ? QStringLiteral("block") : QStringLiteral("blocks"))
                            : QStringLiteral("This sequence has loops: it is shown here, but this editor changes only "
                                             "sequences without loops."));
-  for (const char* name : {"PButAdd", "PButDelete", "PButUp", "PButDown"}) {
-    if (auto* button = findChild<QPushButton*>(QLatin1String(name))) button->setEnabled(editable);
-  }
-  mFilling = false;
+  for (QPushButton* button : {mUi->PButAdd, mUi->PButDelete, mUi->PButUp, mUi->PButDown}) button->setEnabled(editable);
+  mOpenSegment->setEnabled(!CurrentSegment().empty());
 }
 
-void SmseqeditWin::HitCellChanged(int row, int column) {
-  if (mFilling || row < 0) return;
-  const QString text = mTable->item(row, column)->text().trimmed();
-  Run([this, row, column, &text](ConditionList& l) { return ApplyCell(static_cast<unsigned long>(row) + 1, column, text, l); });
-}
-
-int SmseqeditWin::ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list) {
-  CSequence* sequence = GetSequence();
-  if (column == 0) return sequence->SetLabel(block, text.toStdString(), list);
-  if (column == 1) return SequenceCellEdit::SetLength(*sequence, block, text.toStdString(), list);
-  return SequenceCellEdit::SetSegment(*sequence, block, static_cast<unsigned long>(column - kFirstPortColumn + 1),
-                                      text.toStdString(), list);
-}
-
-void SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
+int SmseqeditWin::Run(const std::function<int(ConditionList&)>& command) {
   ConditionList list;
   const int status = mUndo->Run(command, list);
-  // A refusal shows what the instrument holds; a step shows what it holds now.
-  if (status != 0 || mFollower->IsStale()) Rebuild();
+  if (mFollower->IsStale()) Rebuild();
   BoundControl::Report(list);
+  return status;
 }
 
 bool SmseqeditWin::CanUndo() const { return mUndo && mUndo->CanUndo(); }
@@ -209,17 +164,8 @@ void SmseqeditWin::AddBlockActions() {
   mTable->setContextMenuPolicy(Qt::ActionsContextMenu);
 }
 
-bool SmseqeditWin::IsMissing(unsigned long block, unsigned long port) const {
-  if (mCatalog == nullptr || GetSequence()->GetType(block, port) != CSequence::SEG_NAMED) return false;
-  return mCatalog->IsMissing(GetSequence()->GetSegment(block, port));
-}
-
 Dstring SmseqeditWin::CurrentSegment() const {
-  const int column = mTable->currentColumn();
-  const unsigned long block = CurrentBlock();
-  if (block == 0 || column < kFirstPortColumn) return {};
-  const auto port = static_cast<unsigned long>(column - kFirstPortColumn + 1);
-  return GetSequence()->GetType(block, port) == CSequence::SEG_NAMED ? GetSequence()->GetSegment(block, port) : Dstring();
+  return mModel == nullptr ? Dstring() : mModel->NamedSegment(mTable->currentIndex());
 }
 
 // The segment editor of the main window shows the segment; asking again raises the same window.
@@ -232,7 +178,7 @@ void SmseqeditWin::HitPButOpenSegment() {
 int SmseqeditWin::AddBlock(ConditionList& list) {
   const unsigned long after = CurrentBlock();
   if (int status = GetSequence()->AddBlockAfter(after, list)) return status;
-  mTable->setCurrentCell(static_cast<int>(after), std::max(0, mTable->currentColumn()));
+  SetCurrentRow(static_cast<int>(after));
   return 0;
 }
 
@@ -245,6 +191,10 @@ int SmseqeditWin::MoveBlock(long distance, ConditionList& list) {
   const unsigned long block = CurrentBlock();
   if (block == 0) return 0;
   if (int status = GetSequence()->MoveBlock(block, distance, list)) return status;
-  mTable->setCurrentCell(static_cast<int>(static_cast<long>(block) - 1 + distance), std::max(0, mTable->currentColumn()));
+  SetCurrentRow(static_cast<int>(static_cast<long>(block) - 1 + distance));
   return 0;
+}
+
+void SmseqeditWin::SetCurrentRow(int row) {
+  mTable->setCurrentIndex(mModel->index(row, std::max(0, mTable->currentIndex().column())));
 }

@@ -14,7 +14,12 @@ class SequenceFollower;
 class SequenceUndo;
 class QLabel;
 class QPushButton;
-class QTableWidget;
+class QTableView;
+
+namespace Ui {
+class SmseqeditWin;
+}
+class SequenceBlockModel;
 
 // The simple sequence editor ("smseqedit.Win"): the sequence as one list of blocks, a line each
 // with its label, its length and the segment of every port. Each change is an edit of the one
@@ -31,15 +36,15 @@ class SmseqeditWin : public QWidget {
 
   int Load(ConditionList& list);
   static CSequence* GetSequence();
-  QTableWidget* Table() const { return mTable; }
+  QTableView* Table() const { return mTable; }
+  SequenceBlockModel* Model() const { return mModel; }
   // The block of the current line, 1 the first; 0 with no line.
   unsigned long CurrentBlock() const;
   // The segment named in the current cell; empty for a word (PAUSE …) or another column.
   Dstring CurrentSegment() const;
-  // Fills the table from the model again.
+  // Shows the state, the buttons and the current cell as the sequence now is; the table
+  // follows the model's reports itself.
   void Rebuild();
-  // Whether the port of the block names a segment the instrument does not have.
-  bool IsMissing(unsigned long block, unsigned long port) const;
 
   // Takes back the last step of this window (Ctrl+Z), or does it again (Ctrl+Shift+Z). Steps
   // are forgotten when another client changes the sequence.
@@ -48,26 +53,27 @@ class SmseqeditWin : public QWidget {
   bool CanUndo() const;
 
  private:
-  static constexpr int kFirstPortColumn = 2;
-
-  // An edited cell goes to the model; a refusal is shown and the line put back.
-  void HitCellChanged(int row, int column);
-  int ApplyCell(unsigned long block, int column, const QString& text, ConditionList& list);
-  // Runs a button's command; a refusal is shown and the table filled from the model again.
-  void Run(const std::function<int(ConditionList&)>& command);
+  // Runs a command (a button's, a typed cell's) as one step of this window; a refusal is shown.
+  int Run(const std::function<int(ConditionList&)>& command);
   bool IsEditable() const;
   // The buttons' commands on the current block.
   int AddBlock(ConditionList& list);
   int DeleteBlock(ConditionList& list);
   int MoveBlock(long distance, ConditionList& list);
   void AddBlockActions();
+  // Makes `row` (from 0) the current line, in the current column.
+  void SetCurrentRow(int row);
   void HitPButOpenSegment();
 
-  QTableWidget* mTable = nullptr;
+  QTableView* mTable = nullptr;
+  SequenceBlockModel* mModel = nullptr;
   QLabel* mState = nullptr;
   QPushButton* mOpenSegment = nullptr;
   std::unique_ptr<SequenceFollower> mFollower;
-  bool mFilling = false;
+  std::unique_ptr<Ui::SmseqeditWin> mUi;
   std::unique_ptr<SequenceUndo> mUndo;
   std::unique_ptr<SegmentCatalogFollower> mCatalog;
+  // The current cell last seen, restored when the model is reset.
+  int mLastRow = 0;
+  int mLastColumn = 0;
 };
