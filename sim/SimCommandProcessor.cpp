@@ -130,7 +130,7 @@ const SimCommandProcessor::Entry SimCommandProcessor::kGlobalCommands[] = {
 
 SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl,
                                          Dstring dataDir)
-    : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
+    : mParams(std::move(params)), mInitialParams(mParams), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
   auto connections = std::make_shared<SimConnections>(mParams.GetRack());
   auto sequence = std::make_shared<SimSequence>(mParams);

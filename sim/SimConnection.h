@@ -1,8 +1,10 @@
 #pragma once
 
 #include <cstddef>
+#include <deque>
 #include <memory>
 #include <string>
+#include <utility>
 
 #include "SimScpiReader.h"
 #include "SimScpiSession.h"
@@ -24,6 +26,17 @@ class SimConnection {
   void SetScpi(std::unique_ptr<SimScpiSession> session) { mScpi = std::move(session); }
   SimScpiSession* Scpi() { return mScpi.get(); }
   SimScpiReader& ScpiReader() { return mScpiReader; }
+  // Messages cut while the session waits, in order, with what the reader said of each.
+  using Held = std::pair<SimScpiReader::Result, std::string>;
+  void Hold(SimScpiReader::Result result, std::string message);
+  bool TakeHeld(Held& held);
+  // A device clear: what was held is dropped.
+  void DropHeld();
+  std::size_t HeldBytes() const { return mHeldBytes; }
+  bool HasHeld() const { return !mHeld.empty(); }
+  // When bytes last came in, by the server's clock.
+  void NoteInput(long long ms) { mLastInputMs = ms; }
+  long long LastInputMs() const { return mLastInputMs; }
 
   // Reads what the socket has now into the decoder; false once the peer is gone.
   bool Receive();
@@ -46,6 +59,9 @@ class SimConnection {
   FrameDecoder mDecoder;
   SimScpiReader mScpiReader;
   std::unique_ptr<SimScpiSession> mScpi;
+  std::deque<Held> mHeld;
+  std::size_t mHeldBytes = 0;
+  long long mLastInputMs = 0;
   std::string mOut;
   std::size_t mSent = 0;
 };

@@ -43,6 +43,8 @@ class SimServer {
   void Serve(SimConnection& connection, short events);
   void HandleFrames(SimConnection& connection);
   void HandleScpi(SimConnection& connection);
+  void RunHeld(SimConnection& connection);
+  void TickScpi();
   void FireTimers();
   // Closes the connections that are done (also those whose client finished sending and has
   // all its answers) and forgets the closed ones.
