@@ -68,9 +68,15 @@ bool IsQueryUnit(std::string_view unit) {
   return header.ends_with('?') || (!header.starts_with('*') && Answers(SimScpiHeader::Canonical(header)));
 }
 
+// The text in upper case when it is short enough to be one of the words looked for; a block
+// of data is never worth the conversion.
+Dstring ShortUpper(std::string_view text) {
+  return text.size() <= 8 ? Dstring(text).ToUpper() : Dstring();
+}
+
 // *WAI and *OPC? (without arguments) wait for the operations in progress.
 bool Waits(const Dstring& unit) {
-  const Dstring upper = unit.ToUpper();
+  const Dstring upper = ShortUpper(unit);
   return upper == "*WAI" || upper == "*OPC?";
 }
 
@@ -171,7 +177,7 @@ void SimScpiSession::DeviceClear() {
 }
 
 bool SimScpiSession::IsDeviceClear(std::string_view message) {
-  const Dstring upper = Dstring(Trim(message)).ToUpper();
+  const Dstring upper = ShortUpper(Trim(message));
   return upper == "DCL" || upper == "SDC";
 }
 
@@ -225,7 +231,9 @@ void SimScpiSession::RunError(const Dstring& header, std::string_view args, Dstr
 void SimScpiSession::RunInstrument(const Dstring& header, std::string_view args, DstringList& replies) {
   if (!EnsureHandle()) return Queue(-200, "Execution error");
   const bool query = header.EndsWith("?");
-  Dstring value(args);
+  Dstring text = Addressed(header);
+  if (!args.empty()) text += " ";
+  Dstring value;
   std::size_t index = 0;
   std::size_t initial = 0;
   const Dstring bare = ":" + Dstring(header.substr(0, header.size() - (query ? 1 : 0)));
@@ -240,7 +248,9 @@ void SimScpiSession::RunInstrument(const Dstring& header, std::string_view args,
       if (int rc = SimScpiValue::Resolve(args, param, configured, value)) return Queue(rc, TextOf(rc));
     }
   }
-  const SimReply reply = mProcessor.Execute(mConnection, Addressed(header) + (value.empty() ? "" : " " + value));
+  // Data blocks are large: the arguments are copied once, straight into the command.
+  text.append(value.empty() ? args : std::string_view(value));
+  const SimReply reply = mProcessor.Execute(mConnection, text);
   if (reply.status == -19) return Queue(-203, "Command protected");
   // Handle-free commands leave their errors on the connection's queue, which the error query
   // of any name that is no handle reads; test control plants errors without failing.
