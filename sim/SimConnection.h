@@ -41,6 +41,14 @@ class SimConnection {
   // Reads what the socket has now into the decoder; false once the peer is gone.
   bool Receive();
   void Queue(const std::string& bytes) { mOut.append(bytes); }
+  // Takes the bytes over whole when nothing else waits to go out.
+  void Queue(std::string&& bytes) {
+    if (mOut.empty()) {
+      mOut = std::move(bytes);
+    } else {
+      mOut.append(bytes);
+    }
+  }
   std::size_t Pending() const { return mOut.size() - mSent; }
   // Writes what the socket takes now; false once the peer is gone.
   bool Flush();

@@ -75,7 +75,7 @@ Dstring ShortUpper(std::string_view text) {
 }
 
 // *WAI and *OPC? (without arguments) wait for the operations in progress.
-bool Waits(const Dstring& unit) {
+bool Waits(std::string_view unit) {
   const Dstring upper = ShortUpper(unit);
   return upper == "*WAI" || upper == "*OPC?";
 }
@@ -115,30 +115,29 @@ SimScpiSession::SimScpiSession(SimCommandProcessor& processor, int connection)
 // A message that asked anything is always answered, with what its queries produced, so a
 // client never waits out its time-out for a query that failed. A command error ends the
 // message there, as IEEE 488.2 has the parser skip to the terminator; other errors do not.
-SimScpiSession::Outcome SimScpiSession::Execute(std::string_view message, Dstring& reply) {
-  // An indefinite-length block runs to the message's end; the language takes it as a
-  // definite one of the same bytes.
-  std::string definite;
-  if (const std::size_t at = SimScpiReader::FindIndefiniteBlock(message); at != std::string_view::npos) {
-    const std::string length = std::to_string(message.size() - at - 2);
-    definite.append(message.substr(0, at)).append("#" + std::to_string(length.size()) + length).append(message.substr(at + 2));
-    message = definite;
-  }
-  std::vector<std::string_view> units;
-  ConditionList ignored;
+SimScpiSession::Outcome SimScpiSession::Execute(std::string message, Dstring& reply) {
   mUnits.clear();
   mNext = 0;
   mReplies.clear();
-  if (ParserExpression::SplitJoined(message, units, ignored) != 0) {
+  // The units stay views into the message the session keeps while it runs: a data block is
+  // never copied here. An indefinite-length block runs to the message's end; the language
+  // takes it as a definite one of the same bytes.
+  mMessage = std::move(message);
+  if (const std::size_t at = SimScpiReader::FindIndefiniteBlock(mMessage); at != std::string::npos) {
+    const std::string length = std::to_string(mMessage.size() - at - 2);
+    mMessage.replace(at, 2, "#" + std::to_string(length.size()) + length);
+  }
+  ConditionList ignored;
+  if (ParserExpression::SplitJoined(mMessage, mUnits, ignored) != 0) {
+    mUnits.clear();
     Queue(-100, "Command error");
     reply.clear();
-    return message.find('?') != std::string_view::npos ? Outcome::Answered : Outcome::Silent;
+    return mMessage.find('?') != std::string::npos ? Outcome::Answered : Outcome::Silent;
   }
   mAsked = false;
-  for (std::string_view unit : units) {
+  for (std::string_view& unit : mUnits) {
     unit = Trim(unit);
     mAsked = mAsked || IsQueryUnit(unit);
-    mUnits.emplace_back(unit);
   }
   mCommandError = false;
   return Continue(reply);
@@ -155,7 +154,7 @@ SimScpiSession::Outcome SimScpiSession::Tick(Dstring& reply) {
 
 SimScpiSession::Outcome SimScpiSession::Continue(Dstring& reply) {
   while (mNext < mUnits.size() && !mCommandError) {
-    const Dstring& unit = mUnits[mNext];
+    const std::string_view unit = mUnits[mNext];
     if (Waits(unit) && (Sample() & SimScpiStatus::kPendingOperations) != 0) return Outcome::Waiting;
     ++mNext;
     if (!unit.empty()) RunUnit(unit, mReplies);
@@ -164,7 +163,7 @@ SimScpiSession::Outcome SimScpiSession::Continue(Dstring& reply) {
   mNext = 0;
   Sample();
   if (!mAsked) return Outcome::Silent;
-  reply = mReplies.Join(";");
+  reply = mReplies.size() == 1 ? std::move(mReplies.front()) : mReplies.Join(";");
   mReplies.clear();
   return Outcome::Answered;
 }
@@ -250,14 +249,14 @@ void SimScpiSession::RunInstrument(const Dstring& header, std::string_view args,
   }
   // Data blocks are large: the arguments are copied once, straight into the command.
   text.append(value.empty() ? args : std::string_view(value));
-  const SimReply reply = mProcessor.Execute(mConnection, text);
+  SimReply reply = mProcessor.Execute(mConnection, text);
   if (reply.status == -19) return Queue(-203, "Command protected");
   // Handle-free commands leave their errors on the connection's queue, which the error query
   // of any name that is no handle reads; test control plants errors without failing.
   const Dstring first = FirstNode(header);
   if (first == "TEST" || first == "QEN") TakeErrors("TEST", kAll);
   if (reply.status > 0 || first == "TEST") TakeErrors(mHandle, kAll);
-  if (reply.status == 0 && Answers(header)) replies.push_back(reply.text);
+  if (reply.status == 0 && Answers(header)) replies.push_back(std::move(reply.text));
 }
 
 // The header with this connection's handle where the language wants it: first, or after a

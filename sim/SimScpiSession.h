@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -39,7 +40,7 @@ class SimScpiSession {
   // Runs one program message. Answered: it asked anything, and `reply` is its response
   // (without terminator), empty when its queries all failed. Waiting: it is parked at a *WAI
   // or *OPC?; no message may follow until Tick has finished it.
-  Outcome Execute(std::string_view message, Dstring& reply);
+  Outcome Execute(std::string message, Dstring& reply);
   // Looks at the instrument again: a pending *OPC sets its bit, a parked message goes on.
   Outcome Tick(Dstring& reply);
   bool IsWaiting() const { return mNext < mUnits.size(); }
@@ -112,7 +113,8 @@ class SimScpiSession {
   bool mOpcArmed = false;  // *OPC waits for the operations to end
 
   // The message being run: its units, the next to run, and what it has answered so far.
-  std::vector<Dstring> mUnits;
+  std::string mMessage;
+  std::vector<std::string_view> mUnits;
   std::size_t mNext = 0;
   DstringList mReplies;
   bool mAsked = false;

@@ -248,8 +248,9 @@ void SimServer::RunHeld(SimConnection& connection) {
       session.Overrun();
     } else if (held.first == SimScpiReader::Result::ShortBlock) {
       session.ShortBlock();
-    } else if (session.Execute(held.second, reply) == SimScpiSession::Outcome::Answered) {
-      connection.Queue(reply + "\n");
+    } else if (session.Execute(std::move(held.second), reply) == SimScpiSession::Outcome::Answered) {
+      connection.Queue(std::move(reply));
+      connection.Queue("\n");
     }
   }
 }
