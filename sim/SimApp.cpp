@@ -1,5 +1,7 @@
 #include "SimApp.h"
 
+#include <malloc.h>
+
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -41,6 +43,12 @@ Dstring DefaultDataDir() {
 }  // namespace
 
 int SimApp::Run(const SimOptions& options) {
+#ifdef M_MMAP_THRESHOLD
+  // A data block passes through buffers of up to 16 MiB each message: they are reused from
+  // the heap instead of being mapped, faulted in and unmapped every time.
+  mallopt(M_MMAP_THRESHOLD, 64 * 1024 * 1024);
+  mallopt(M_TRIM_THRESHOLD, 128 * 1024 * 1024);
+#endif
   Dstring config = kSimDefaultConfigText;
   if (!options.mConfigPath.empty() && !ReadFile(options.mConfigPath, config)) {
     return Fail("cannot read " + options.mConfigPath);

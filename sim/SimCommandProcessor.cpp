@@ -130,7 +130,7 @@ const SimCommandProcessor::Entry SimCommandProcessor::kGlobalCommands[] = {
 
 SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& clock, bool testControl,
                                          Dstring dataDir)
-    : mParams(std::move(params)), mClock(clock), mTestControl(testControl) {
+    : mParams(std::move(params)), mInitialParams(mParams), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
   auto connections = std::make_shared<SimConnections>(mParams.GetRack());
   auto sequence = std::make_shared<SimSequence>(mParams);
@@ -155,7 +155,8 @@ SimReply SimCommandProcessor::Execute(int connection, std::string_view text, Sim
   for (auto& module : mModules) module->Advance(*this);
   if (IsRefused(text)) return SimReply{"", -19, SimReplyAction::Send, 0};
   int delayMs = mSessions[connection].TakeDelay();
-  SimCommand first(text);
+  // Only the header decides the kind of request: a data block after it is not copied for that.
+  SimCommand first(text.substr(0, text.find_first_of(" \t", std::min(text.size(), text.find_first_not_of(" \t")))));
   const DstringList& path = first.GetPath();
   if (!path.empty() && (path[0] == "VC" || path[0] == "RC")) {
     // The batch starts at the colon after the prefix word.
@@ -202,7 +203,7 @@ void SimCommandProcessor::ResetFrame(int connection) {
 }
 
 SimReply SimCommandProcessor::FinishFrame(int delayMs) {
-  SimReply reply{mReplies.Join(";"), mErrors, mAction, delayMs};
+  SimReply reply{mReplies.size() == 1 ? std::move(mReplies.front()) : mReplies.Join(";"), mErrors, mAction, delayMs};
   SimSession& session = mSessions[mConnection];
   for (const Dstring& header : mBareHeaders) {
     if (session.TakeMalformed(header, reply.text)) break;

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include <memory>
+#include <utility>
 
 #include "SimClock.h"
 #include "SimCommand.h"
@@ -35,6 +36,10 @@ class SimCommandProcessor : public SimContext {
   // Frames of only queries from this connection run while another one holds the lock (a
   // script reads, and is told why its writes fail, instead of waiting).
   void LetQueriesPassLock(int connection) { mQueriesPassLock.insert(connection); }
+  // The parameters as the configuration made them: the values a new setting starts from.
+  const SimParamTable& GetInitialParams() const { return mInitialParams; }
+  // True once after the start: the first raw SCPI client sees the power-on event.
+  bool TakePowerOn() { return std::exchange(mPowerOnUnseen, false); }
 
   // SimContext, for the command modules.
   void Reply(const Dstring& text) override { mReplies.push_back(text); }
@@ -129,6 +134,7 @@ class SimCommandProcessor : public SimContext {
   void NoteParamChanges(const Dstring& except);
 
   SimParamTable mParams;
+  const SimParamTable mInitialParams;
   // Shared with the copies that dry-run a batch for VC and RC; a dry run leaves the modules
   // out, so that it cannot touch what they keep.
   std::vector<std::shared_ptr<SimCommandModule>> mModules;
@@ -141,6 +147,7 @@ class SimCommandProcessor : public SimContext {
   std::map<int, SimSession> mSessions;
   std::set<int> mQueriesPassLock;
   int mLockHolder = kNobody;
+  bool mPowerOnUnseen = true;
   int mPhantomArmer = kNobody;  // the connection that set up the phantom lock
 
   // The frame being run.

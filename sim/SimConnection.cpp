@@ -1,5 +1,7 @@
 #include "SimConnection.h"
 
+#include <netinet/in.h>
+#include <netinet/tcp.h>
 #include <sys/socket.h>
 #include <unistd.h>
 #include <cerrno>
@@ -9,6 +11,18 @@ namespace {
 constexpr std::size_t kChunk = 65536;
 // Read at most this much per turn, so one busy client cannot starve the others.
 constexpr std::size_t kMaxPerTurn = 1024 * 1024;
+
+// A client that writes and then asks, with Nagle on, holds its query back until the write is
+// acknowledged; a delayed acknowledgement would cost it some 40 ms a pair. Linux drops the
+// quick mode again on its own, so it is asked for after every read.
+void AcknowledgeAtOnce(int fd) {
+#ifdef TCP_QUICKACK
+  int on = 1;
+  setsockopt(fd, IPPROTO_TCP, TCP_QUICKACK, &on, sizeof on);
+#else
+  (void)fd;
+#endif
+}
 
 bool WouldBlock() {
   return errno == EAGAIN || errno == EWOULDBLOCK || errno == EINTR;
@@ -26,6 +40,7 @@ bool SimConnection::Receive() {
     ssize_t n = recv(mFd, buf, sizeof buf, 0);
     if (n == 0) return false;
     if (n < 0) return WouldBlock();
+    AcknowledgeAtOnce(mFd);
     if (mRpc) {
       mRpc->Feed(buf, static_cast<std::size_t>(n));
     } else if (mScpi) {
@@ -47,4 +62,22 @@ bool SimConnection::Flush() {
   mOut.clear();
   mSent = 0;
   return true;
+}
+
+void SimConnection::Hold(SimScpiReader::Result result, std::string message) {
+  mHeldBytes += message.size();
+  mHeld.emplace_back(result, std::move(message));
+}
+
+bool SimConnection::TakeHeld(Held& held) {
+  if (mHeld.empty()) return false;
+  held = std::move(mHeld.front());
+  mHeld.pop_front();
+  mHeldBytes -= held.second.size();
+  return true;
+}
+
+void SimConnection::DropHeld() {
+  mHeld.clear();
+  mHeldBytes = 0;
 }

@@ -1,8 +1,10 @@
 #pragma once
 
 #include <cstddef>
+#include <deque>
 #include <memory>
 #include <string>
+#include <utility>
 
 #include "SimScpiReader.h"
 #include "SimScpiSession.h"
@@ -28,10 +30,29 @@ class SimConnection {
   // A VXI-11 or port mapper connection hands its bytes to its RPC channel.
   void SetRpc(std::unique_ptr<SimVxi11Channel> channel) { mRpc = std::move(channel); }
   SimVxi11Channel* Rpc() { return mRpc.get(); }
+  // Messages cut while the session waits, in order, with what the reader said of each.
+  using Held = std::pair<SimScpiReader::Result, std::string>;
+  void Hold(SimScpiReader::Result result, std::string message);
+  bool TakeHeld(Held& held);
+  // A device clear: what was held is dropped.
+  void DropHeld();
+  std::size_t HeldBytes() const { return mHeldBytes; }
+  bool HasHeld() const { return !mHeld.empty(); }
+  // When bytes last came in, by the server's clock.
+  void NoteInput(long long ms) { mLastInputMs = ms; }
+  long long LastInputMs() const { return mLastInputMs; }
 
   // Reads what the socket has now into the decoder; false once the peer is gone.
   bool Receive();
   void Queue(const std::string& bytes) { mOut.append(bytes); }
+  // Takes the bytes over whole when nothing else waits to go out.
+  void Queue(std::string&& bytes) {
+    if (mOut.empty()) {
+      mOut = std::move(bytes);
+    } else {
+      mOut.append(bytes);
+    }
+  }
   std::size_t Pending() const { return mOut.size() - mSent; }
   // Writes what the socket takes now; false once the peer is gone.
   bool Flush();
@@ -51,6 +72,9 @@ class SimConnection {
   SimScpiReader mScpiReader;
   std::unique_ptr<SimScpiSession> mScpi;
   std::unique_ptr<SimVxi11Channel> mRpc;
+  std::deque<Held> mHeld;
+  std::size_t mHeldBytes = 0;
+  long long mLastInputMs = 0;
   std::string mOut;
   std::size_t mSent = 0;
 };

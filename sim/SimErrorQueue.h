@@ -15,6 +15,7 @@ class SimErrorQueue {
   // Removes and returns the oldest entry as code,"text"; 0,"No error" when empty.
   Dstring Pop();
   bool IsEmpty() const { return mEntries.empty(); }
+  std::size_t Count() const { return mEntries.size(); }
   void Clear() { mEntries.clear(); }
 
  private:

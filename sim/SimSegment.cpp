@@ -23,7 +23,6 @@ struct Partner {
 };
 constexpr Partner kPartners[] = {{'0', '1'}, {'l', 'h'}, {'L', 'H'}};
 
-constexpr long kMaxBlockBytes = 8L * 1024 * 1024;
 constexpr long kMaxExtension = 1L << 20;
 constexpr std::size_t kMaxHeaderDigits = 64;
 constexpr const char* kDigits = "0123456789abcdef";
@@ -320,6 +319,7 @@ int SimSegment::WriteBlock(long t0, long v0, long t1, long v1, std::string_view 
   if (int rc = CheckRange(t0, v0, t1, v1)) return rc;
   const int stateWidth = mRows.GetStateWidth();
   const std::size_t rowBytes = SimSegmentRows::RowBytes(v1 - v0 + 1, stateWidth);
+  if (static_cast<long>(rowBytes) * (t1 - t0 + 1) > kMaxBlockBytes) return -222;
   if (block.size() != rowBytes * static_cast<std::size_t>(t1 - t0 + 1)) return -104;
   const auto limit = static_cast<unsigned>(mCoding.size());
   if (!SimSegmentRows::BlockBelow(block, t1 - t0 + 1, v1 - v0 + 1, stateWidth, limit)) return -222;

@@ -17,6 +17,8 @@ class SimSegment {
   // Memory data may hold at most this many bits: a 16M x 64 two-state segment and then some.
   static constexpr long long kMaxBits = 1LL << 31;
   static constexpr long kMaxWidth = 4096;
+  // The most bytes one data block carries, read or written.
+  static constexpr long kMaxBlockBytes = 16L * 1024 * 1024;
 
   // The codings the instrument knows, with the states in state-number order.
   static bool IsKnownCoding(const Dstring& coding);

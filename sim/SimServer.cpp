@@ -22,6 +22,10 @@ namespace {
 constexpr std::size_t kMaxConnections = 256;
 // Stop reading from a client that does not read its replies.
 constexpr std::size_t kMaxPendingOut = 4 * 1024 * 1024;
+// How often a SCPI client waiting for the instrument's operations looks again.
+constexpr int kScpiTickMs = 10;
+// A block whose bytes stop coming for this long was shorter than its header said.
+constexpr long long kBlockStallMs = 1000;
 
 volatile std::sig_atomic_t gStop = 0;
 sigset_t gWaitMask;
@@ -152,7 +156,10 @@ int SimServer::Run() {
     for (const auto& listener : listeners) fds.push_back(pollfd{listener.first, POLLIN, 0});
     polled.clear();
     for (auto& [id, c] : mConnections) {
-      short events = c->Pending() < kMaxPendingOut && !c->IsInputEnded() ? POLLIN : 0;
+      // A SCPI client whose message waits for the instrument is read on only so far.
+      const bool waiting = c->Scpi() != nullptr && c->Scpi()->IsWaiting();
+      const bool full = c->Pending() >= kMaxPendingOut || (waiting && c->HeldBytes() >= kMaxPendingOut);
+      short events = !full && !c->IsInputEnded() ? POLLIN : 0;
       if (c->Pending() > 0) events |= POLLOUT;
       fds.push_back(pollfd{c->GetFd(), events, 0});
       polled.push_back(c.get());
@@ -170,6 +177,7 @@ int SimServer::Run() {
       if (fds[i].revents & POLLIN) Accept(listeners[i].first, listeners[i].second);
     }
     FireTimers();
+    TickScpi();
     Reap();
   }
   return 0;
@@ -203,6 +211,7 @@ void SimServer::Accept(int listenFd, Kind kind) {
 void SimServer::Serve(SimConnection& connection, short events) {
   if (events & (POLLIN | POLLHUP | POLLERR)) {
     bool open = connection.Receive();
+    connection.NoteInput(mClock.NowMs());
     if (connection.Rpc()) {
       HandleRpc(connection);
     } else if (connection.Scpi()) {
@@ -252,21 +261,67 @@ void SimServer::HandleFrames(SimConnection& connection) {
 
 void SimServer::HandleScpi(SimConnection& connection) {
   std::string message;
-  for (;;) {
-    SimScpiReader::Result result = connection.ScpiReader().Next(message);
-    if (result == SimScpiReader::Result::None) return;
-    if (result == SimScpiReader::Result::Overrun) {
-      connection.Scpi()->Overrun();
+  for (SimScpiReader::Result r; (r = connection.ScpiReader().Next(message)) != SimScpiReader::Result::None;) {
+    // A device clear is seen even while the session waits, and drops what came before it.
+    if (r == SimScpiReader::Result::Message && SimScpiSession::IsDeviceClear(message)) {
+      connection.DropHeld();
+      connection.Scpi()->DeviceClear();
       continue;
     }
+    connection.Hold(r, std::move(message));
+    message.clear();
+  }
+  RunHeld(connection);
+}
+
+void SimServer::RunHeld(SimConnection& connection) {
+  SimScpiSession& session = *connection.Scpi();
+  SimConnection::Held held;
+  while (!session.IsWaiting() && connection.TakeHeld(held)) {
     Dstring reply;
-    if (connection.Scpi()->Execute(message, reply)) connection.Queue(reply + "\n");
+    if (held.first == SimScpiReader::Result::Overrun) {
+      session.Overrun();
+    } else if (held.first == SimScpiReader::Result::ShortBlock) {
+      session.ShortBlock();
+    } else if (session.Execute(std::move(held.second), reply) == SimScpiSession::Outcome::Answered) {
+      connection.Queue(std::move(reply));
+      connection.Queue("\n");
+    }
+  }
+}
+
+// Sessions that wait for the instrument look again, and one that answers goes on with what it
+// holds; a block whose bytes stopped coming is cut short, so the client's next lines are read.
+void SimServer::TickScpi() {
+  const long long now = mClock.NowMs();
+  for (auto& [id, c] : mConnections) {
+    if (c->IsClosed()) continue;
+    if (c->Rpc() != nullptr && c->Rpc()->NeedsTicks()) {
+      std::string out;
+      c->Rpc()->Tick(now, out);
+      c->Queue(out);
+      if (c->Pending() > 0 && !c->Flush()) c->Close();
+    }
+    if (c->Scpi() == nullptr) continue;
+    // A stall counts only while qensim reads on: a client that does not read its replies is
+    // not read either. A client that has stopped sending will send no more of the block.
+    const bool stalled = c->Pending() < kMaxPendingOut && now - c->LastInputMs() >= kBlockStallMs;
+    if (c->ScpiReader().InBlock() && (stalled || c->IsInputEnded())) {
+      c->ScpiReader().CutBlock();
+      HandleScpi(*c);
+    }
+    Dstring reply;
+    if (c->Scpi()->NeedsTicks() && c->Scpi()->Tick(reply) == SimScpiSession::Outcome::Answered) {
+      c->Queue(reply + "\n");
+      RunHeld(*c);
+    }
+    if (c->Pending() > 0 && !c->Flush()) c->Close();
   }
 }
 
 void SimServer::HandleRpc(SimConnection& connection) {
   std::string out;
-  const bool inStep = connection.Rpc()->Serve(out);
+  const bool inStep = connection.Rpc()->Serve(mClock.NowMs(), out);
   connection.Queue(out);
   if (!inStep) {
     Log("RPC record too large or not a call, connection closed", connection.GetId());
@@ -292,7 +347,8 @@ void SimServer::FireTimers() {
 
 void SimServer::Reap() {
   for (auto& [id, c] : mConnections) {
-    if (c->IsInputEnded() && c->Pending() == 0 && !HasTimers(id)) c->Close();
+    const bool waiting = c->Scpi() != nullptr && (c->Scpi()->IsWaiting() || c->HasHeld());
+    if (c->IsInputEnded() && c->Pending() == 0 && !HasTimers(id) && !waiting) c->Close();
   }
   for (auto it = mConnections.begin(); it != mConnections.end();) {
     if (!it->second->IsClosed()) {
@@ -309,11 +365,16 @@ bool SimServer::HasTimers(int connection) const {
 }
 
 int SimServer::PollTimeoutMs() const {
-  if (mTimers.empty()) return -1;
+  const bool ticking = std::any_of(mConnections.begin(), mConnections.end(), [](const auto& c) {
+    if (c.second->Rpc()) return c.second->Rpc()->NeedsTicks();
+    return c.second->Scpi() && (c.second->Scpi()->NeedsTicks() || c.second->ScpiReader().InBlock());
+  });
+  if (mTimers.empty()) return ticking ? kScpiTickMs : -1;
   long long now = mClock.NowMs();
   long long next = mTimers.front().dueMs;
   for (const Timer& t : mTimers) next = std::min(next, t.dueMs);
-  return static_cast<int>(std::max(0LL, next - now));
+  const int due = static_cast<int>(std::max(0LL, next - now));
+  return ticking ? std::min(due, kScpiTickMs) : due;
 }
 
 void SimServer::Log(const char* what, int connection) const {

@@ -51,6 +51,8 @@ class SimServer {
   void HandleFrames(SimConnection& connection);
   void HandleScpi(SimConnection& connection);
   void HandleRpc(SimConnection& connection);
+  void RunHeld(SimConnection& connection);
+  void TickScpi();
   void FireTimers();
   // Closes the connections that are done (also those whose client finished sending and has
   // all its answers) and forgets the closed ones.

@@ -68,7 +68,8 @@ bool IsDeviceName(std::string_view name) {
 
 }  // namespace
 
-bool SimVxi11Channel::Serve(std::string& out) {
+bool SimVxi11Channel::Serve(long long nowMs, std::string& out) {
+  mNowMs = nowMs;
   std::string record;
   for (;;) {
     const SimRpcRecordReader::Result result = mRecords.Next(record);
@@ -76,7 +77,7 @@ bool SimVxi11Channel::Serve(std::string& out) {
     if (result == SimRpcRecordReader::Result::TooLarge) return false;
     std::string reply;
     if (!Answer(record, reply)) return false;
-    out += SimRpcRecordReader::Mark(reply);
+    if (!reply.empty()) out += SimRpcRecordReader::Mark(reply);
   }
 }
 
@@ -116,6 +117,12 @@ bool SimVxi11Channel::Answer(const std::string& record, std::string& reply) {
     out.Uint(kSuccess);
   }
   reply = out.Bytes();
+  if (mDeferred) {
+    mDeferred = false;
+    mPendingRead->head = std::move(reply);
+    reply.clear();
+    return true;
+  }
   if (!call.Failed()) reply += results.Bytes();
   return true;
 }
@@ -168,10 +175,15 @@ bool SimVxi11Channel::DeviceCore(std::uint32_t procedure, SimXdrReader& args, Si
     }
     case kDeviceRead: {
       const std::uint32_t requestSize = args.Uint();
-      args.Uint();
+      const std::uint32_t ioTimeout = args.Uint();
       args.Uint();
       const std::uint32_t flags = args.Uint();
       const std::uint32_t termChar = args.Uint();
+      if (!args.Failed() && link->second.responses.empty() && mSession->IsWaiting() && !mPendingRead) {
+        mPendingRead = PendingRead{{}, id, requestSize, flags, termChar, mNowMs + ioTimeout};
+        mDeferred = true;
+        return true;
+      }
       Read(link->second, requestSize, flags, termChar, results);
       return true;
     }
@@ -220,8 +232,12 @@ void SimVxi11Channel::Write(Link& link, std::uint32_t flags, std::string_view da
   // END ends the message as a line feed would; after one it adds an empty message, which runs
   // nothing.
   if (flags & kFlagEnd) link.reader.Feed("\n", 1);
+  RunMessages(link);
+}
+
+void SimVxi11Channel::RunMessages(Link& link) {
   std::string message;
-  for (;;) {
+  while (!mSession->IsWaiting()) {
     const SimScpiReader::Result result = link.reader.Next(message);
     if (result == SimScpiReader::Result::None) return;
     if (result == SimScpiReader::Result::Overrun) {
@@ -229,15 +245,61 @@ void SimVxi11Channel::Write(Link& link, std::uint32_t flags, std::string_view da
       continue;
     }
     Dstring reply;
-    if (!mSession->Execute(message, reply)) continue;
-    link.responses.push_back(reply + "\n");
-    link.waiting += reply.size() + 1;
-    while ((link.waiting > kMaxWaiting || link.responses.size() > kMaxResponses) && link.responses.size() > 1) {
-      link.waiting -= link.responses.front().size();
-      link.responses.pop_front();
-      mSession->Interrupted();
+    const SimScpiSession::Outcome outcome = mSession->Execute(message, reply);
+    if (outcome == SimScpiSession::Outcome::Waiting) {
+      mParkedLink = LinkId(link);
+      return;
     }
+    if (outcome == SimScpiSession::Outcome::Silent) continue;
+    Respond(link, reply);
   }
+}
+
+void SimVxi11Channel::Respond(Link& link, const Dstring& reply) {
+  link.responses.push_back(reply + "\n");
+  link.waiting += reply.size() + 1;
+  while ((link.waiting > kMaxWaiting || link.responses.size() > kMaxResponses) && link.responses.size() > 1) {
+    link.waiting -= link.responses.front().size();
+    link.responses.pop_front();
+    mSession->Interrupted();
+  }
+}
+
+std::int32_t SimVxi11Channel::LinkId(const Link& link) const {
+  for (const auto& [id, each] : mLinks) {
+    if (&each == &link) return id;
+  }
+  return 0;
+}
+
+void SimVxi11Channel::Tick(long long nowMs, std::string& out) {
+  mNowMs = nowMs;
+  Dstring reply;
+  if (mSession && mSession->NeedsTicks() && mSession->Tick(reply) == SimScpiSession::Outcome::Answered) {
+    auto parked = mLinks.find(mParkedLink);
+    if (parked != mLinks.end()) Respond(parked->second, reply);
+  }
+  // Once the session goes on, what every link holds runs, the parked link's first.
+  if (mSession && !mSession->IsWaiting()) {
+    if (auto parked = mLinks.find(mParkedLink); parked != mLinks.end()) RunMessages(parked->second);
+    for (auto& [id, link] : mLinks) RunMessages(link);
+  }
+  if (!mPendingRead) return;
+  auto link = mLinks.find(mPendingRead->link);
+  const bool ready = link != mLinks.end() && !link->second.responses.empty();
+  if (ready || link == mLinks.end() || nowMs >= mPendingRead->deadlineMs) AnswerPendingRead(out);
+}
+
+void SimVxi11Channel::AnswerPendingRead(std::string& out) {
+  SimXdrWriter results;
+  auto link = mLinks.find(mPendingRead->link);
+  if (link == mLinks.end()) {
+    results.Int(kInvalidLink).Uint(0).Opaque({});
+  } else {
+    Read(link->second, mPendingRead->requestSize, mPendingRead->flags, mPendingRead->termChar, results);
+  }
+  out += SimRpcRecordReader::Mark(mPendingRead->head + results.Bytes());
+  mPendingRead.reset();
 }
 
 void SimVxi11Channel::Read(Link& link, std::uint32_t requestSize, std::uint32_t flags, std::uint32_t termChar,

@@ -4,6 +4,7 @@
 #include <deque>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "SimCommandProcessor.h"
@@ -17,8 +18,9 @@
 // answers GETPORT with the VXI-11 port, or the VXI-11 core channel (program 0x0607AF,
 // version 1), whose links carry the same SCPI session as the raw SCPI socket. A message
 // written in pieces runs when the piece with END arrives; its response waits for device_read.
-// Nothing waits inside: a read with no response pending answers io_timeout at once. The links
-// of one connection share its session.
+// Nothing blocks: a read with no response pending answers io_timeout at once, unless the session
+// is parked at *WAI or *OPC?; then the read is answered from Tick when the response comes or its
+// io_timeout has passed. The links of one connection share its session.
 class SimVxi11Channel {
  public:
   enum class Program { PortMapper, DeviceCore };
@@ -42,8 +44,12 @@ class SimVxi11Channel {
 
   void Feed(const char* data, std::size_t size) { mRecords.Feed(data, size); }
   // Answers every complete call that arrived, appending the marked replies to `out`; false
-  // when the stream cannot be read any further and the connection should end.
-  bool Serve(std::string& out);
+  // when the stream cannot be read any further and the connection should end. `nowMs` is the
+  // server's clock, for the io_timeout of a read that waits.
+  bool Serve(long long nowMs, std::string& out);
+  // A parked session goes on, and a waiting read is answered when it can be.
+  void Tick(long long nowMs, std::string& out);
+  bool NeedsTicks() const { return mPendingRead.has_value() || (mSession && mSession->NeedsTicks()); }
 
  private:
   // A link reads its messages as the raw SCPI socket does (END ends one too); each response
@@ -54,8 +60,25 @@ class SimVxi11Channel {
     std::size_t waiting = 0;  // their bytes
   };
 
-  // The reply to one call record; false when the record is not a call at all.
+  // A read that waits for the parked session's response: its reply's head and its arguments.
+  struct PendingRead {
+    std::string head;
+    std::int32_t link = 0;
+    std::uint32_t requestSize = 0;
+    std::uint32_t flags = 0;
+    std::uint32_t termChar = 0;
+    long long deadlineMs = 0;
+  };
+
+  // The reply to one call record, empty when it is answered later; false when the record is not
+  // a call at all.
   bool Answer(const std::string& record, std::string& reply);
+  // Runs the messages a link holds, as long as the session does not wait.
+  void RunMessages(Link& link);
+  void Respond(Link& link, const Dstring& reply);
+  std::int32_t LinkId(const Link& link) const;
+  // Answers the waiting read from what its link holds now (io_timeout when nothing).
+  void AnswerPendingRead(std::string& out);
   // The results of a procedure, or false when its arguments could not be read.
   bool PortMapper(std::uint32_t procedure, SimXdrReader& args, SimXdrWriter& results);
   bool DeviceCore(std::uint32_t procedure, SimXdrReader& args, SimXdrWriter& results);
@@ -71,4 +94,8 @@ class SimVxi11Channel {
   std::unique_ptr<SimScpiSession> mSession;
   std::map<std::int32_t, Link> mLinks;
   std::int32_t mNextLink = 1;
+  long long mNowMs = 0;
+  bool mDeferred = false;
+  std::int32_t mParkedLink = 0;
+  std::optional<PendingRead> mPendingRead;
 };

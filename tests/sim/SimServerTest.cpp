@@ -7,6 +7,7 @@
 #include <unistd.h>
 #include <csignal>
 
+#include "ScpiSocket.h"
 #include "common/SimProcess.h"
 #include "instrument/Frame.h"
 #include "instrument/QenStatus.h"
@@ -172,19 +173,9 @@ TEST_F(SimServerTest, EveryReplyQueuedBeforeTheClientsHalfCloseIsSentBeforeTheCl
 }
 
 TEST(SimScpiHalfClose, TheReplyToTheLastQueryArrivesWhenTheClientClosesItsSendingSide) {
-  // A port free a moment ago: the SCPI socket's number is not printed where the fixture reads.
-  int probe = socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in addr{};
-  addr.sin_family = AF_INET;
-  addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  bind(probe, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
-  socklen_t len = sizeof addr;
-  getsockname(probe, reinterpret_cast<sockaddr*>(&addr), &len);
-  const unsigned short scpi = ntohs(addr.sin_port);
-  close(probe);
-  SimProcess sim({"--scpi-port", std::to_string(scpi)});
-  ASSERT_NE(sim.Port(), 0);
+  ScpiSim sim;
+  ASSERT_NE(sim.ScpiPort(), 0);
   for (int run = 0; run < 20; ++run) {
-    EXPECT_EQ(SendAndHalfClose(scpi, "*IDN?\n").substr(0, 8), "Corvane,") << "run " << run;
+    EXPECT_EQ(SendAndHalfClose(sim.ScpiPort(), "*IDN?\n").substr(0, 8), "Corvane,") << "run " << run;
   }
 }
