@@ -19,7 +19,7 @@
 #include "support/NumberText.h"
 #include "windows/MainWin.h"
 #include "windows/ber/BerTableModel.h"
-#include "windows/seqedit/SequenceWindows.h"
+#include "windows/SequenceWindows.h"
 #include "windows/error/ErrorJournalModel.h"
 #include "windows/seqedit/BlockReactionModel.h"
 #include "windows/smseqedit/SequenceBlockModel.h"

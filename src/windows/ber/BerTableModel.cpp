@@ -3,7 +3,7 @@
 #include <QColor>
 
 #include "support/NumberText.h"
-#include "windows/PlaceName.h"
+#include "windows/common/PlaceName.h"
 #include "windows/TableCell.h"
 
 void BerTableModel::SetResults(const std::vector<BerSvr::PortResult>& results) {

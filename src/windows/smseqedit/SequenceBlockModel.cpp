@@ -3,7 +3,7 @@
 #include <QBrush>
 
 #include "sequences/CSequence.h"
-#include "windows/PortHeader.h"
+#include "windows/common/PortHeader.h"
 #include "windows/TableCell.h"
 
 SequenceBlockModel::SequenceBlockModel(CSequence& sequence, std::function<bool(const Dstring&)> missing,
