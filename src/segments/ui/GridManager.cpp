@@ -143,6 +143,10 @@ void GridManager::ShowAcross(int left, int right) {
 
 void GridManager::Refresh() {
   LayoutDisps();
+  Repaint();
+}
+
+void GridManager::Repaint() {
   SyncScrollBar();
   for (GridDisp* disp : Disps()) disp->update();
 }

@@ -93,6 +93,8 @@ class GridManager : public QWidget {
   void ShowAcross(int left, int right);
   // Re-reads the line count and first line from the subclass and repaints every column.
   void Refresh();
+  // The same when the columns keep their places: after a move of the cursor or of the lines shown.
+  void Repaint();
   // The cursor key a Qt key stands for; false for any other key.
   static bool CursorKeyOf(int qtKey, GridKey& key);
 

@@ -36,7 +36,7 @@ void SegmentGridManager::CppRegister() {
 }
 
 int SegmentGridManager::Shown(int status) {
-  Refresh();
+  Repaint();
   emit StateChanged();
   return status;
 }
