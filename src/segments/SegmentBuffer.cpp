@@ -195,11 +195,14 @@ std::vector<long> SegmentBuffer::ChangedVectors() const {
   // Equal stretches are passed over a chunk at a time: an edit is a few bytes of the block.
   constexpr long kChunk = 256;
   const long row = RowSize();
+  // Only the bytes of the vectors between the first and the last edit can differ.
+  const long firstByte = std::max(0L, (mEditFirst - mBufferStart) * mStateWidth / 8);
+  const long endByte = std::min(row, ((mEditLast - mBufferStart + 1) * mStateWidth + 7) / 8);
   for (long t = 0; t < mWidth; ++t) {
     const std::uint8_t* mine = mRows.data() + t * row;
     const std::uint8_t* base = mBase.data() + t * row;
-    for (long from = 0; from < row; from += kChunk) {
-      const long to = std::min(row, from + kChunk);
+    for (long from = firstByte; from < endByte; from += kChunk) {
+      const long to = std::min(endByte, from + kChunk);
       if (std::memcmp(mine + from, base + from, static_cast<std::size_t>(to - from)) == 0) continue;
       for (long i = from; i < to; ++i) {
         if (mine[i] == base[i]) continue;
@@ -343,7 +346,11 @@ int SegmentBuffer::SetState(long vector, long trace, char state, ConditionList& 
   if (!mDirty) {
     mBase = mRows;
     mMerged = false;
+    mEditFirst = vector;
+    mEditLast = vector;
   }
+  mEditFirst = std::min(mEditFirst, vector);
+  mEditLast = std::max(mEditLast, vector);
   WriteBits(vector, trace, static_cast<unsigned>(number));
   mDirty = true;
   return SegmentStatus::kOk;

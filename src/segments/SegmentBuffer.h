@@ -92,5 +92,8 @@ class SegmentBuffer {
   long mWidth = 0;
   bool mDirty = false;
   bool mMerged = false;  // while dirty: the base is the other side's rows, merged under the edits
+  // While dirty: the first and last vector changed since the base, which bound the search.
+  long mEditFirst = 0;
+  long mEditLast = -1;
   bool mHasDimension = false;  // the segment's dimensions have been read
 };
