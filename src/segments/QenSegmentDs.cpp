@@ -297,9 +297,9 @@ int QenSegmentDs::MoveBuffer(SegmentBuffer* buffer, const std::function<int()>& 
   if (int status = FindBuffer(buffer, list)) return status;
   if (int status = CheckWrite(buffer, list)) return status;
   const bool wasDirty = buffer->mDirty && mNumber != 0;
-  if (wasDirty && mCopy) AfterWrite(buffer, true);
+  const bool copied = wasDirty && CopyEdits(buffer);
   if (int status = move()) return status;
-  if (wasDirty && !mCopy) KeepCopy();
+  AfterWrite(wasDirty, copied);
   return SegmentStatus::kOk;
 }
 
@@ -327,8 +327,9 @@ int QenSegmentDs::Write(SegmentBuffer* buffer, ConditionList& list) {
   if (int status = FindBuffer(buffer, list)) return status;
   if (int status = CheckWrite(buffer, list)) return status;
   const bool wasDirty = buffer->mDirty;
+  const bool copied = wasDirty && CopyEdits(buffer);
   if (int status = buffer->Write(list)) return status;
-  AfterWrite(buffer, wasDirty);
+  AfterWrite(wasDirty, copied);
   return SegmentStatus::kOk;
 }
 
@@ -349,8 +350,9 @@ int QenSegmentDs::Write(ConditionList& list) {
   for (const auto& buffer : mBuffers) {
     if (int status = CheckWrite(buffer.get(), list)) return status;
     const bool wasDirty = buffer->mDirty;
+    const bool copied = wasDirty && CopyEdits(buffer.get());
     if (int status = buffer->Write(list)) return status;
-    AfterWrite(buffer.get(), wasDirty);
+    AfterWrite(wasDirty, copied);
   }
   return SegmentStatus::kOk;
 }
@@ -537,7 +539,7 @@ int QenSegmentDs::IsHeldUnchanged(bool& unchanged, ConditionList& list) {
   for (const auto& buffer : mBuffers) {
     if (!buffer->mDirty) continue;
     if (int status = buffer->ReadRows(theirs, list)) return status;
-    if (theirs != buffer->mBase) return SegmentStatus::kOk;
+    if (theirs != buffer->Base()) return SegmentStatus::kOk;
   }
   unchanged = true;
   return SegmentStatus::kOk;
@@ -602,7 +604,7 @@ int QenSegmentDs::GetDifferences(DataFormat format, std::vector<Difference>& dif
                                    format);
     };
     for (long v = b.mBufferStart; v < b.mBufferStart + b.mBufferLength; ++v) {
-      Difference d{v, line(b.mBase, v), line(b.mRows, v), line(theirs, v)};
+      Difference d{v, line(b.Base(), v), line(b.mRows, v), line(theirs, v)};
       if (d.before != d.mine || d.before != d.theirs) differences.push_back(std::move(d));
     }
   }
@@ -647,15 +649,20 @@ void QenSegmentDs::KeepCopy() {
   mCopy = std::move(copy);
 }
 
-void QenSegmentDs::AfterWrite(const SegmentBuffer* buffer, bool wasDirty) {
-  if (!wasDirty || !QenSegmentPool::mKeepCopies) return;
-  if (!mCopy || mCopy->GetWidth() != buffer->mWidth || mCopy->GetLength() != buffer->mSegmentLength ||
-      mCopy->GetCoding() != buffer->mAlphabet) {
-    return KeepCopy();
+// Only the vectors the buffer changed go into the copy: a move of a full buffer with one state
+// typed costs a few lines, not the window's. The copy takes them before the write, which may
+// fail; the overlay of dirty buffers in GetHeldTexts holds the same lines then.
+bool QenSegmentDs::CopyEdits(const SegmentBuffer* buffer) {
+  if (!QenSegmentPool::mKeepCopies || !mCopy || mCopy->GetWidth() != buffer->mWidth ||
+      mCopy->GetLength() != buffer->mSegmentLength || mCopy->GetCoding() != buffer->mAlphabet) {
+    return false;
   }
-  for (long v = buffer->mBufferStart; v < buffer->mBufferStart + buffer->mBufferLength; ++v) {
-    mCopy->SetLine(v, LineOf(buffer, v));
-  }
+  for (const long v : buffer->ChangedVectors()) mCopy->SetLine(v, LineOf(buffer, v));
+  return true;
+}
+
+void QenSegmentDs::AfterWrite(bool wasDirty, bool copied) {
+  if (wasDirty && !copied && QenSegmentPool::mKeepCopies) KeepCopy();
 }
 
 void QenSegmentDs::GetHeldTexts(std::vector<HeldText>& texts) const {

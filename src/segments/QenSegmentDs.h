@@ -251,10 +251,13 @@ class QenSegmentDs : public QenDs {
   // Whether the server still has the held vectors and the dimensions the buffers last read.
   int IsHeldUnchanged(bool& unchanged, ConditionList& list);
   // While copies are kept and the segment is modified and open: the whole segment read into
-  // the copy (after a change the server made), or the vectors a buffer just wrote put into it.
-  // A copy that cannot be read, or would be too long, is dropped.
+  // the copy (after a change the server made). A copy that cannot be read, or would be too
+  // long, is dropped.
   void KeepCopy();
-  void AfterWrite(const SegmentBuffer* buffer, bool wasDirty);
+  // The edits of a dirty buffer into the copy; false when there is no copy of its shape.
+  bool CopyEdits(const SegmentBuffer* buffer);
+  // After a write of a dirty buffer whose edits the copy did not take: the copy is made afresh.
+  void AfterWrite(bool wasDirty, bool copied);
   Dstring LineOf(const SegmentBuffer* buffer, long vector) const;
 
   Dstring mName;

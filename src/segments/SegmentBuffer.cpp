@@ -1,6 +1,7 @@
 #include "segments/SegmentBuffer.h"
 
 #include <algorithm>
+#include <cstring>
 #include <utility>
 
 #include "instrument/QenGuiInst.h"
@@ -69,7 +70,6 @@ int SegmentBuffer::ReadDimension(ConditionList& list) {
   mBufferLength = std::min({mBufferLength, length, fitting});
   mBufferStart = std::clamp(mBufferStart, 0L, length - mBufferLength);
   mRows.assign(static_cast<std::size_t>(BlockBytes()), 0);
-  mBase = mRows;
   mDirty = false;
   mHasDimension = true;
   return SegmentStatus::kOk;
@@ -108,9 +108,14 @@ int SegmentBuffer::WriteCommand(Dstring& cmd, ConditionList& list) const {
   return SegmentStatus::kOk;
 }
 
-// The reply must be exactly one block of `bytes`; otherwise `rows` stays as it was.
+// The reply must be exactly one block of `bytes`; otherwise `rows` stays as it was. A reply that
+// is the bare block, as the server sends it, is taken without parsing it.
 int SegmentBuffer::CopyBlock(const Dstring& reply, long bytes, std::vector<std::uint8_t>& rows,
                              ConditionList& list) const {
+  if (const char* data = BareBlock(reply, bytes)) {
+    rows.assign(data, data + bytes);
+    return SegmentStatus::kOk;
+  }
   DataParcel items;
   ConditionList ignored;
   const bool isBlock = ParserExpression::Parse(reply, items, ignored) == 0 && items.size() == 1 &&
@@ -124,9 +129,20 @@ int SegmentBuffer::CopyBlock(const Dstring& reply, long bytes, std::vector<std::
   return SegmentStatus::kOk;
 }
 
+const char* SegmentBuffer::BareBlock(const Dstring& reply, long bytes) {
+  if (reply.size() < 3 || reply[0] != '#' || reply[1] < '1' || reply[1] > '9') return nullptr;
+  const std::size_t digits = static_cast<std::size_t>(reply[1] - '0');
+  if (reply.size() != 2 + digits + static_cast<std::size_t>(bytes)) return nullptr;
+  long count = 0;
+  for (std::size_t i = 2; i < 2 + digits; ++i) {
+    if (reply[i] < '0' || reply[i] > '9') return nullptr;
+    count = count * 10 + (reply[i] - '0');
+  }
+  return count == bytes ? reply.data() + 2 + digits : nullptr;
+}
+
 int SegmentBuffer::TakeBlock(const Dstring& reply, ConditionList& list) {
   if (int status = CopyBlock(reply, BlockBytes(), mRows, list)) return status;
-  mBase = mRows;
   mDirty = false;
   return SegmentStatus::kOk;
 }
@@ -158,7 +174,8 @@ char SegmentBuffer::StateIn(const std::vector<std::uint8_t>& rows, long vector, 
 void SegmentBuffer::MergeOnto(const std::vector<std::uint8_t>& theirs) {
   std::vector<std::uint8_t> mine = theirs;
   std::swap(mRows, mine);
-  for (long t = 0; t < mWidth; ++t) {
+  // A clean buffer changed nothing: its rows were its base.
+  for (long t = 0; mDirty && t < mWidth; ++t) {
     for (long v = mBufferStart; v < mBufferStart + mBufferLength; ++v) {
       const unsigned state = ReadBitsOf(mine, v, t);
       if (state != ReadBitsOf(mBase, v, t)) WriteBits(v, t, state);
@@ -166,6 +183,38 @@ void SegmentBuffer::MergeOnto(const std::vector<std::uint8_t>& theirs) {
   }
   mBase = theirs;
   mDirty = true;
+  mMerged = true;
+}
+
+std::vector<long> SegmentBuffer::ChangedVectors() const {
+  std::vector<long> changed;
+  if (mMerged || mBase.size() != mRows.size()) {
+    for (long v = 0; v < mBufferLength; ++v) changed.push_back(mBufferStart + v);
+    return changed;
+  }
+  // Equal stretches are passed over a chunk at a time: an edit is a few bytes of the block.
+  constexpr long kChunk = 256;
+  const long row = RowSize();
+  // Only the bytes of the vectors between the first and the last edit can differ.
+  const long firstByte = std::max(0L, (mEditFirst - mBufferStart) * mStateWidth / 8);
+  const long endByte = std::min(row, ((mEditLast - mBufferStart + 1) * mStateWidth + 7) / 8);
+  for (long t = 0; t < mWidth; ++t) {
+    const std::uint8_t* mine = mRows.data() + t * row;
+    const std::uint8_t* base = mBase.data() + t * row;
+    for (long from = firstByte; from < endByte; from += kChunk) {
+      const long to = std::min(endByte, from + kChunk);
+      if (std::memcmp(mine + from, base + from, static_cast<std::size_t>(to - from)) == 0) continue;
+      for (long i = from; i < to; ++i) {
+        if (mine[i] == base[i]) continue;
+        // The states with a bit in byte i.
+        const long last = std::min(mBufferLength - 1, (i * 8 + 7) / mStateWidth);
+        for (long v = i * 8 / mStateWidth; v <= last; ++v) changed.push_back(mBufferStart + v);
+      }
+    }
+  }
+  std::sort(changed.begin(), changed.end());
+  changed.erase(std::unique(changed.begin(), changed.end()), changed.end());
+  return changed;
 }
 
 int SegmentBuffer::Write(ConditionList& list) {
@@ -174,7 +223,6 @@ int SegmentBuffer::Write(ConditionList& list) {
   if (cmd.empty()) return SegmentStatus::kOk;
   if (int status = CheckOpen(list)) return status;
   if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
-  mBase = mRows;
   mDirty = false;
   return SegmentStatus::kOk;
 }
@@ -238,14 +286,14 @@ int SegmentBuffer::Move(long start, long length, ConditionList& list) {
   if (!cmd.empty()) {
     if (int status = QenGuiInst::Call(cmd, reply, list)) return status;
   }
-  std::vector<std::uint8_t> rows(static_cast<std::size_t>(RowBytes(length, mStateWidth) * mWidth), 0);
+  // An empty read is an empty window: no rows.
+  std::vector<std::uint8_t> rows;
   if (!read.empty()) {
-    if (int status = CopyBlock(reply, static_cast<long>(rows.size()), rows, list)) return status;
+    if (int status = CopyBlock(reply, RowBytes(length, mStateWidth) * mWidth, rows, list)) return status;
   }
   mBufferStart = start;
   mBufferLength = length;
   mRows = std::move(rows);
-  mBase = mRows;
   mDirty = false;
   return SegmentStatus::kOk;
 }
@@ -294,6 +342,15 @@ int SegmentBuffer::SetState(long vector, long trace, char state, ConditionList& 
     return SegmentReply::Refuse(list, "GUI_SEGMENTBUFFER_UNKNOWN_STATE_CODE", {Dstring(1, state), mAlphabet},
                                 SegmentStatus::kUnknownState);
   }
+  // The first change since the rows were last read or written keeps them as the base.
+  if (!mDirty) {
+    mBase = mRows;
+    mMerged = false;
+    mEditFirst = vector;
+    mEditLast = vector;
+  }
+  mEditFirst = std::min(mEditFirst, vector);
+  mEditLast = std::max(mEditLast, vector);
   WriteBits(vector, trace, static_cast<unsigned>(number));
   mDirty = true;
   return SegmentStatus::kOk;

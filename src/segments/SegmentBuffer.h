@@ -46,6 +46,10 @@ class SegmentBuffer {
   int ToggleState(long vector, long trace, ConditionList& list);
 
   long RowSize() const { return RowBytes(mBufferLength, mStateWidth); }
+  const std::vector<std::uint8_t>& Base() const { return mDirty ? mBase : mRows; }
+  // The vectors, in order, whose states differ from the base: every held one after a merge,
+  // whose base is the other side's.
+  std::vector<long> ChangedVectors() const;
   long BlockBytes() const { return RowSize() * mWidth; }
   // The range checks of Set/GetState; a condition and nonzero when out of range.
   int CheckPosition(long vector, long trace, ConditionList& list) const;
@@ -61,6 +65,8 @@ class SegmentBuffer {
   int WriteCommand(Dstring& cmd, ConditionList& list) const;
   int TakeBlock(const Dstring& reply, ConditionList& list);
   int CopyBlock(const Dstring& reply, long bytes, std::vector<std::uint8_t>& rows, ConditionList& list) const;
+  // The data of `reply` when it is exactly a definite-length block of `bytes`; null otherwise.
+  static const char* BareBlock(const Dstring& reply, long bytes);
   // The server's rows of the window as they are now, into `rows`; the buffer stays as it is.
   int ReadRows(std::vector<std::uint8_t>& rows, ConditionList& list) const;
   // The state of (vector, trace) in `rows`, rows of this window; the position must lie inside.
@@ -76,7 +82,8 @@ class SegmentBuffer {
   long mBufferStart = 0;
   std::vector<std::uint8_t> mRows;
   // The rows as last read from or written to the server: what the other side held then. A
-  // state that differs from it is one the user changed here.
+  // state that differs from it is one the user changed here. Kept only while the buffer is
+  // dirty (a clean buffer's rows are its base), so that a move copies no rows twice.
   std::vector<std::uint8_t> mBase;
   QenSegmentDs* mSegment;
   Dstring mAlphabet;
@@ -84,5 +91,9 @@ class SegmentBuffer {
   long mSegmentLength = 0;
   long mWidth = 0;
   bool mDirty = false;
+  bool mMerged = false;  // while dirty: the base is the other side's rows, merged under the edits
+  // While dirty: the first and last vector changed since the base, which bound the search.
+  long mEditFirst = 0;
+  long mEditLast = -1;
   bool mHasDimension = false;  // the segment's dimensions have been read
 };

@@ -20,72 +20,15 @@
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
 #include "segments/SegmentBuffer.h"
+#include "segments/SegmentSimFixture.h"
 #include "segments/SegmentTextFile.h"
 #include "segments/SegmentVcdWriter.h"
 #include "support/QenEnvironment.h"
 
 namespace {
 
-class SegmentSimTest : public testing::Test {
+class SegmentSimTest : public SegmentSimFixture {
  protected:
-  void SetUp() override {
-    std::filesystem::remove_all(mDir);
-    QenEnvironment::SetLogDirectory(Dstring(mDir));
-    QenGuiInst::Init();
-    QenSegmentPool::Init();
-    StartServer();
-  }
-
-  void TearDown() override {
-    QenSegmentPool::End();
-    QenGuiInst::End();
-    mSim.reset();
-    QenEnvironment::SetLogDirectory(std::nullopt);
-    std::filesystem::remove_all(mDir);
-  }
-
-  // A qensim on the test's data directory, the one call path connected to it as "_T", and a
-  // second client "_O" that plays another user.
-  void StartServer() {
-    mSim = std::make_unique<SimProcess>(std::vector<std::string>{"--test-control", "--data-dir", mDir});
-    ASSERT_NE(mSim->Port(), 0);
-    auto client = std::make_unique<QenTcpInstrument>();
-    ASSERT_EQ(client->Connect("127.0.0.1", mSim->Port()), 0);
-    Dstring handle;
-    ASSERT_EQ(client->Call(":QEN:INST:HAND:CRE? _T,\"PSX\",\"T\"", handle), 0);
-    QenGuiInst::SetInstrument(std::move(client));
-    QenGuiInst::SetAppHandle(handle);
-    ASSERT_EQ(mOther.Connect("127.0.0.1", mSim->Port()), 0);
-    ASSERT_EQ(mOther.Call(":QEN:INST:HAND:CRE? _O,\"PSX\",\"T\"", handle), 0);
-  }
-
-  // Another user's command on the open segment `number`.
-  int Other(const Dstring& tail, unsigned number) {
-    Dstring reply;
-    return mOther.Call(Dstring::Format(":_O:EDIT:SEGM%u%s", number, tail.c_str()), reply);
-  }
-
-  QenSegmentDs* Make(const Dstring& name, const Dstring& coding, long length, long width) {
-    SegmentProperties p;
-    p.name = name;
-    p.coding = coding;
-    p.length = length;
-    p.width = width;
-    unsigned created = 0;
-    EXPECT_EQ(QenSegmentPool::Create(p, created, mList), 0) << mList.ToText();
-    QenSegmentDs* ds = QenSegmentPool::AllocDs(name);
-    EXPECT_EQ(ds->Open(mList), 0) << mList.ToText();
-    return ds;
-  }
-
-  SegmentBuffer* Window(QenSegmentDs* ds, long start, long length) {
-    SegmentBuffer* buffer = nullptr;
-    ds->CreateBuffer(buffer, mList);
-    EXPECT_EQ(ds->Init(buffer, mList), 0) << mList.ToText();
-    EXPECT_EQ(ds->SetBufferStartAndLength(buffer, start, length, mList), 0) << mList.ToText();
-    return buffer;
-  }
-
   // Every state of the window, trace by trace.
   std::string States(QenSegmentDs* ds, SegmentBuffer* buffer) {
     long width = 0;
@@ -116,10 +59,6 @@ class SegmentSimTest : public testing::Test {
     return States(ds, buffer);
   }
 
-  std::string mDir = testing::TempDir() + "qen-segments-" + std::to_string(::getpid());
-  std::unique_ptr<SimProcess> mSim;
-  QenTcpInstrument mOther;
-  ConditionList mList;
 };
 
 TEST_F(SegmentSimTest, ASegmentLivesThroughEditsSavesAndARestart) {

@@ -114,10 +114,3 @@ TEST_F(ErrStateWinTest, AChannelReplyThatCannotBeReadKeepsTheLastCounts) {
     EXPECT_EQ(Results(), before) << form;
   }
 }
-
-TEST(ErrStateGridCountText, ShortensLargeCountsToThreeFigures) {
-  const std::pair<unsigned long long, const char*> kCases[] = {
-      {0, "0"},         {9999, "9\u2009999"}, {10000, "10.0k"},         {123456, "123k"},
-      {999499, "999k"}, {999500, "1.00M"},    {4560000000ull, "4.56G"}, {18446744073709551615ull, "18.4E"}};
-  for (const auto& [count, text] : kCases) EXPECT_EQ(ErrStateGridManager::CountText(count).toStdString(), text) << count;
-}

@@ -228,23 +228,6 @@ TEST_F(LoopGridTest, AnotherClientsChangeIsFollowed) {
   EXPECT_EQ(mGrid->CellText(1, mGrid->LengthField()), QStringLiteral("512"));
 }
 
-// Under another client's lock an edit reaches nothing, and the grid and its steps stay as they were.
-TEST_F(LoopGridTest, AnEditUnderALockLeavesEverything) {
-  LoadNested();
-  Control(":TEST:LOCK ON");
-  mGrid->SetCursor(1, mGrid->LengthField());
-  EXPECT_NE(mGrid->SetCellText(1, mGrid->LengthField(), QStringLiteral("1111")), 0);
-  EXPECT_NE(mGrid->SetCellText(2, mGrid->LaneField(1), QStringLiteral("9")), 0);
-  mGrid->SetCursor(3, mGrid->LabelField());
-  Key(Qt::Key_Insert);
-  EXPECT_EQ(mGrid->CellText(1, mGrid->LengthField()), QStringLiteral("512"));
-  EXPECT_EQ(mGrid->CellText(2, mGrid->LaneField(1)), QStringLiteral("4"));
-  EXPECT_EQ(mGrid->DispLineCount(), 4);
-  Control(":TEST:LOCK OFF");
-  EXPECT_EQ(Server(), mNested);
-  EXPECT_FALSE(mGrid->Steps()->CanUndo());
-}
-
 // A segment is put into a cell by typing, from the list, or by dropping its name.
 TEST_F(LoopGridTest, SegmentsAreTypedPickedAndDropped) {
   MakeSegment("Grid/A", 512, 1);

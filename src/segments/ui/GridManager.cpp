@@ -143,8 +143,27 @@ void GridManager::ShowAcross(int left, int right) {
 
 void GridManager::Refresh() {
   LayoutDisps();
+  Repaint();
+}
+
+void GridManager::Repaint() {
   SyncScrollBar();
   for (GridDisp* disp : Disps()) disp->update();
+}
+
+bool GridManager::CursorKeyOf(int qtKey, GridKey& key) {
+  static const std::pair<int, GridKey> kKeys[] = {
+      {Qt::Key_Up, GridKey::kUp},         {Qt::Key_Down, GridKey::kDown},         {Qt::Key_Left, GridKey::kLeft},
+      {Qt::Key_Right, GridKey::kRight},   {Qt::Key_PageUp, GridKey::kPageUp},     {Qt::Key_PageDown, GridKey::kPageDown},
+      {Qt::Key_Home, GridKey::kHome},     {Qt::Key_End, GridKey::kEnd},
+  };
+  for (const auto& [qt, grid] : kKeys) {
+    if (qt == qtKey) {
+      key = grid;
+      return true;
+    }
+  }
+  return false;
 }
 
 void GridManager::ShowLine(long line) {

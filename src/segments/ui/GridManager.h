@@ -10,6 +10,7 @@
 #include "segments/SegmentProperties.h"
 #include "support/ConditionList.h"
 #include "support/Dstring.h"
+#include "toolkit/GridKey.h"
 
 class QScrollBar;
 class GridDisp;
@@ -92,45 +93,52 @@ class GridManager : public QWidget {
   void ShowAcross(int left, int right);
   // Re-reads the line count and first line from the subclass and repaints every column.
   void Refresh();
+  // The same when the columns keep their places: after a move of the cursor or of the lines shown.
+  void Repaint();
+  // The cursor key a Qt key stands for; false for any other key.
+  static bool CursorKeyOf(int qtKey, GridKey& key);
 
-  virtual unsigned NfyGetMenuItemState(std::uint16_t item);
-  virtual int NfyItemHit(std::uint16_t item);
-  virtual bool AutoMoveCursor();
-  virtual int GetDYMultiplier(long row);
-  virtual void GetPortMux(long row, double& mux);
+  // Operations no grid implements: every grid answers with these defaults.
+  unsigned NfyGetMenuItemState(std::uint16_t item);
+  int NfyItemHit(std::uint16_t item);
+  bool AutoMoveCursor();
+  int GetDYMultiplier(long row);
+  void GetPortMux(long row, double& mux);
+  int GetDispMode();
+  int SetDispMode(DigitDispMode mode, ConditionList& list);
+  int NfyWidthChanged(long row, long column, ConditionList& list);
+  int NfyLengthChanged(long row, long column, ConditionList& list);
+  int NfySetSegmentName(long row, long column, const Dstring& name, ConditionList& list);
+  bool IsOk(long row, long column);
+  int SetLabelsEnabled(bool enabled);
+  bool AreLabelsEnabled();
+  void GetPrevVectorOffset(long row, long& value);
+  void GetPrevDigitOffset(long row, long& value);
+  int SetSegmentSelection(long row, long column, ConditionList& list);
+
+  // Operations a grid overrides; harmless and impossible by default.
   virtual void GetNumDigits(long row, long& count);
   virtual void GetNumVectors(long row, long& count);
   virtual long GetNumDispDigits(long row);
   virtual long GetNumDispVectors(long row);
   virtual int GetAddrFormat();
   virtual int GetDataFormat(long row);
-  virtual int GetDispMode();
   virtual int SetDataFormat(long row, DataFormat format, ConditionList& list);
   virtual int SetAddrFormat(AddrFormat format, ConditionList& list);
-  virtual int SetDispMode(DigitDispMode mode, ConditionList& list);
   virtual int GetSegmentProperties(long row, long column, SegmentProperties& properties, ConditionList& list);
   virtual int HookOn(long row, long column, const Dstring& segment, ConditionList& list);
-  virtual int NfyWidthChanged(long row, long column, ConditionList& list);
-  virtual int NfyLengthChanged(long row, long column, ConditionList& list);
-  virtual int NfySetSegmentName(long row, long column, const Dstring& name, ConditionList& list);
   virtual int GetSegmentName(long row, long column, Dstring& name, ConditionList& list);
   virtual int SaveSegment(long row, long column, ConditionList& list);
   virtual int SaveSegmentAs(long row, long column, const Dstring& name, ConditionList& list);
-  virtual bool IsOk(long row, long column);
-  virtual int SetLabelsEnabled(bool enabled);
-  virtual bool AreLabelsEnabled();
   virtual int SetVectorOffset(long row, long first, ConditionList& list);
   virtual int SetDigitOffset(long row, long first, ConditionList& list);
   virtual void GetVectorOffset(long row, long& value);
   virtual void GetDigitOffset(long row, long& value);
-  virtual void GetPrevVectorOffset(long row, long& value);
-  virtual void GetPrevDigitOffset(long row, long& value);
   virtual int ResetSelection(ConditionList& list);
   // Row, first vector, last vector, first digit, last digit, column: the segment grid's meaning.
   virtual int SetSelection(long a, long b, long c, long d, long e, long f, ConditionList& list);
   virtual int SetVectorSelection(long row, long first, long last, ConditionList& list);
   virtual int SetDigitSelection(long row, long first, long last, ConditionList& list);
-  virtual int SetSegmentSelection(long row, long column, ConditionList& list);
   virtual int FindPattern(FindDirection direction, VectorTrace what, ConditionList& list);
   virtual int ModifyFill(ConditionList& list);
   virtual int ModifyInvert(ConditionList& list);

@@ -1,24 +1,14 @@
 #pragma once
 
-#include <memory>
-
-#include "segments/StateRange.h"
+#include "segments/SegmentGridModel.h"
 #include "segments/ui/GridManager.h"
 
-class QenSegmentDs;
-class SegmentBuffer;
-
-// The segment grid: a line per vector of one segment, its address (AddrDisp) and its traces as
-// digits of the data format (DigitDisp), the most significant digit on the left, so a line reads
-// as a number. It holds one buffer of the segment, a few screens of vectors around the lines
-// shown, and moves it only when the lines shown leave it: scrolling reads one page at a time,
-// and a jump anywhere in a long segment costs one round trip whatever its length.
-//
-// Typing a digit of the format sets the digit under the cursor (the buffer becomes dirty and is
-// written back before any command, move or save); a character the format does not know is
-// refused with a message. Shift with the arrow keys or a drag selects a rectangle of vectors and
-// digits, which fill, invert, mirror, copy, delete and find work on.
-class SegmentGridManager : public GridManager {
+// The segment grid on screen: the Qt face of a SegmentGridModel, which holds the segment, the
+// cursor, the selection and the buffer window and carries out every command. Its columns are
+// the address (AddrDisp) and the digits of the data format (DigitDisp), the most significant on
+// the left, so a line reads as a number. Keys and clicks go to the model; a refusal is shown
+// with a message, and the system clipboard carries what Copy takes.
+class SegmentGridManager : public GridManager, private SegmentGridModel::Observer {
   Q_OBJECT
 
  public:
@@ -29,37 +19,30 @@ class SegmentGridManager : public GridManager {
   static void CppRegister();
   static const char* Class() { return "SegmentGridManager"; }
 
-  QenSegmentDs* GetSegmentDs() const { return mDs; }
+  SegmentGridModel& Model() { return mModel; }
+  const SegmentGridModel& Model() const { return mModel; }
+  QenSegmentDs* GetSegmentDs() const { return mModel.GetSegmentDs(); }
   // Lets go of the segment: closes it (pending edits are written first) and frees the source.
   int Release(ConditionList& list);
-  long CursorVector() const { return mCursorVector; }
-  long CursorDigit() const { return mCursorDigit; }
-  long CursorTrace() const { return mCursorDigit * TracesPerDigit(); }
-  // A segment with states is open.
-  bool IsEditable() const { return mDs != nullptr && mLength > 0 && mWidth > 0; }
-  bool HasSelection() const { return mSelecting; }
-  // How many vectors the grid holds of the segment: a few screens, whatever its length.
-  long HeldVectors() const;
-  // The selection (or the cursor's digit) as traces and vectors.
-  StateRange SelectedRange() const;
-  // What fill writes: a state number of the coding (0 the first state, 1 the second).
-  void SetFillState(long state) { mFillState = state; }
-  // The coding ModifyCoding converts the segment to ("01X").
-  void SetTargetCoding(const Dstring& coding) { mTargetCoding = coding; }
-  // Deletes the traces of the selected digits (or of the cursor's digit); the traces above close up.
+  long CursorVector() const { return mModel.CursorVector(); }
+  long CursorDigit() const { return mModel.CursorDigit(); }
+  long CursorTrace() const { return mModel.CursorTrace(); }
+  bool IsEditable() const { return mModel.IsEditable(); }
+  bool HasSelection() const { return mModel.HasSelection(); }
+  long HeldVectors() const { return mModel.HeldVectors(); }
+  StateRange SelectedRange() const { return mModel.SelectedRange(); }
+  void SetFillState(long state) { mModel.SetFillState(state); }
+  void SetTargetCoding(const Dstring& coding) { mModel.SetTargetCoding(coding); }
   int DeleteTraces(ConditionList& list);
-  // What find looks for: a number in the data format, 'x' digits matching anything.
-  void SetFindText(const Dstring& text) { mFindText = text; }
+  void SetFindText(const Dstring& text) { mModel.SetFindText(text); }
   // What the user reads when an edit meets another client's lock.
   static QString LockedText();
-  // Text of the buffer's digits under the cursor for the status line.
-  QString CursorText() const;
+  // Text of the cursor and selection for the status line.
+  QString CursorText() const { return QString::fromStdString(mModel.CursorText()); }
 
-  // The segment as text in the grid's data format, or as a Value Change Dump; what was typed
-  // goes to the server first. An import that does not fit is refused whole.
-  int ExportText(const Dstring& path, ConditionList& list);
+  int ExportText(const Dstring& path, ConditionList& list) { return mModel.ExportText(path, list); }
   int ImportText(const Dstring& path, ConditionList& list);
-  int ExportVcd(const Dstring& path, ConditionList& list);
+  int ExportVcd(const Dstring& path, ConditionList& list) { return mModel.ExportVcd(path, list); }
   // The system clipboard's text pasted at the cursor, in the text form of the export; Copy puts
   // the selection there too, so patterns travel to and from other programs.
   int PasteText(ConditionList& list);
@@ -78,7 +61,7 @@ class SegmentGridManager : public GridManager {
   void GetNumVectors(long row, long& count) override;
   long GetNumDispDigits(long row) override;
   long GetNumDispVectors(long row) override;
-  int GetAddrFormat() override { return static_cast<int>(mAddrFormat); }
+  int GetAddrFormat() override { return static_cast<int>(mModel.GetAddrFormat()); }
   int GetDataFormat(long row) override;
   int SetDataFormat(long row, DataFormat format, ConditionList& list) override;
   int SetAddrFormat(AddrFormat format, ConditionList& list) override;
@@ -89,8 +72,8 @@ class SegmentGridManager : public GridManager {
   int SaveSegmentAs(long row, long column, const Dstring& name, ConditionList& list) override;
   int SetVectorOffset(long row, long first, ConditionList& list) override;
   int SetDigitOffset(long row, long first, ConditionList& list) override;
-  void GetVectorOffset(long, long& value) override { value = mFirst; }
-  void GetDigitOffset(long, long& value) override { value = mDigitOffset; }
+  void GetVectorOffset(long, long& value) override { value = mModel.FirstLine(); }
+  void GetDigitOffset(long, long& value) override { value = mModel.DigitOffset(); }
   int ResetSelection(ConditionList& list) override;
   // Row (ignored: one segment), first and last vector, first and last digit, column (ignored).
   int SetSelection(long a, long b, long c, long d, long e, long f, ConditionList& list) override;
@@ -108,21 +91,21 @@ class SegmentGridManager : public GridManager {
   // Width and offset: the serial trace becomes `width` traces from its state `offset`.
   int ModifyDeserialize(long width, long offset, ConditionList& list) override;
   int ModifyCoding(ConditionList& list) override;
-  bool IsSerializePossible() override { return IsEditable() && mWidth > 1; }
-  bool IsDeserializePossible() override { return IsEditable() && mWidth == 1 && mLength > 1; }
-  bool IsCodingPossible() override { return IsEditable(); }
-  bool IsFillPossible() override { return IsEditable(); }
-  bool IsInvertPossible() override { return IsEditable(); }
-  bool IsMirrorPossible() override { return IsEditable() && mSelecting; }
-  bool IsCopyPossible() override { return IsEditable(); }
-  bool IsPastePossible() override;
-  bool IsInsertPossible() override { return mDs != nullptr; }
-  bool IsDeletePossible() override { return IsEditable() && mSelecting; }
-  bool IsFindPossible() override { return IsEditable() && !mFindText.empty(); }
-  bool IsDirty() override;
+  bool IsSerializePossible() override { return mModel.IsSerializePossible(); }
+  bool IsDeserializePossible() override { return mModel.IsDeserializePossible(); }
+  bool IsCodingPossible() override { return mModel.IsCodingPossible(); }
+  bool IsFillPossible() override { return mModel.IsFillPossible(); }
+  bool IsInvertPossible() override { return mModel.IsInvertPossible(); }
+  bool IsMirrorPossible() override { return mModel.IsMirrorPossible(); }
+  bool IsCopyPossible() override { return mModel.IsCopyPossible(); }
+  bool IsPastePossible() override { return mModel.IsPastePossible(); }
+  bool IsInsertPossible() override { return mModel.IsInsertPossible(); }
+  bool IsDeletePossible() override { return mModel.IsDeletePossible(); }
+  bool IsFindPossible() override { return mModel.IsFindPossible(); }
+  bool IsDirty() override { return mModel.IsDirty(); }
 
-  long DispLineCount() const override { return mLength; }
-  long DispFirstLine() const override { return mFirst; }
+  long DispLineCount() const override { return mModel.Length(); }
+  long DispFirstLine() const override { return mModel.FirstLine(); }
   void DispScrollTo(long firstLine) override;
   QString DispHeader(const GridDisp& disp, int cell) const override;
   GridCell DispCell(const GridDisp& disp, long line, int cell) const override;
@@ -132,7 +115,6 @@ class SegmentGridManager : public GridManager {
   void DispPaint(const GridDisp& disp, QPainter& painter, const QRect& area) const override;
   // The digits stand in groups of four, counted from trace 0, half a cell apart.
   int DispGap(const GridDisp& disp, int cell) const override;
-  static constexpr long kDigitsPerGroup = 4;
 
  signals:
   // A refusal the user should read where they type (a digit the format does not know).
@@ -146,38 +128,14 @@ class SegmentGridManager : public GridManager {
   void resizeEvent(QResizeEvent* event) override;
 
  private:
-  class View;
+  long LinesShown() const override { return VisibleLines(); }
+  long DigitCellsShown() const override;
+  void NfySegmentChanged(bool elsewhere) override;
+  void NfyMessage(const Dstring& text) override;
+  // Repaints and tells the window; passes the status through.
+  int Shown(int status);
+  // A status of a command the user gave by key or click, said where they type.
+  void Said(int status, const ConditionList& list);
 
-  int TracesPerDigit() const;
-  // The digit shown in display column `column` (0 the leftmost, the most significant).
-  long DigitAt(long column) const { return mDigits - 1 - column; }
-  long ColumnOf(long digit) const { return mDigits - 1 - digit; }
-  // Reads the dimensions again and keeps cursor, selection and offsets inside them.
-  int ReadDimensions(ConditionList& list);
-  // Moves the buffer, when needed, so that it holds the lines shown.
-  int CoverShown(ConditionList& list);
-  void MoveCursor(long vector, long digit, bool extend);
-  void TypeDigit(char digit);
-
-  QenSegmentDs* mDs = nullptr;
-  SegmentBuffer* mBuffer = nullptr;
-  std::unique_ptr<View> mView;
-  long mLength = 0;
-  long mWidth = 0;
-  long mDigits = 0;
-  long mFirst = 0;
-  long mDigitOffset = 0;
-  long mCursorVector = 0;
-  long mCursorDigit = 0;
-  long mAnchorVector = 0;
-  long mAnchorDigit = 0;
-  bool mSelecting = false;
-  DataFormat mFormat = DataFormat::kHex;
-  AddrFormat mAddrFormat = AddrFormat::kDecimal;
-  long mFillState = 1;
-  Dstring mFindText;
-  // Where the last find stopped; -1 before one.
-  long mFoundVector = -1;
-  long mFoundTrace = -1;
-  Dstring mTargetCoding;
+  SegmentGridModel mModel;
 };

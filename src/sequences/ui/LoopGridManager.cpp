@@ -48,116 +48,51 @@ LoopGridManager::LoopGridManager(QWidget* parent)
   AddActions();
 }
 
-LoopGridManager::~LoopGridManager() {
-  Detach();
-}
+LoopGridManager::~LoopGridManager() { mFollower->Follow(nullptr); }
 
 void LoopGridManager::CppRegister() {
   WidgetClassTable::AddFactory(Class(),
                                [](QWidget* parent) -> QWidget* { return new LoopGridManager(parent); });
 }
 
-void LoopGridManager::Detach() {
-  mUndo.reset();
-  mFollower->Follow(nullptr);
-  mSequence = nullptr;
-}
-
 void LoopGridManager::SetSequence(CSequence* sequence) {
-  Detach();
-  mSequence = sequence;
-  mField = static_cast<int>(sequence == nullptr ? 0 : CSequence::GetNumLoopLevels());
-  if (mSequence != nullptr) {
-    mFollower->Follow(mSequence);
-    mUndo = std::make_unique<SequenceUndo>(*mSequence);
-  }
+  mModel.SetSequence(nullptr);
+  mFollower->Follow(sequence);
+  mModel.SetSequence(sequence);
   Sync();
 }
 
-// --- Fields ------------------------------------------------------------------------------------
-
-int LoopGridManager::NumFields() const {
-  return static_cast<int>(mLevels + 2 + mPorts);
-}
-int LoopGridManager::LabelField() const {
-  return static_cast<int>(mLevels);
-}
-int LoopGridManager::LengthField() const {
-  return static_cast<int>(mLevels) + 1;
-}
-int LoopGridManager::LaneField(unsigned long level) const {
-  return static_cast<int>(mLevels - level);
-}
-int LoopGridManager::PortField(unsigned long port) const {
-  return static_cast<int>(mLevels + 1 + port);
-}
-
-unsigned long LoopGridManager::LevelOf(int field) const {
-  return field >= 0 && field < LabelField() ? mLevels - static_cast<unsigned long>(field) : 0;
-}
-
-unsigned long LoopGridManager::PortOf(int field) const {
-  return field > LengthField() && field < NumFields() ? static_cast<unsigned long>(field - LengthField()) : 0;
-}
-
-bool LoopGridManager::IsSelected(unsigned long block) const {
-  return mRow != mAnchor && block >= FirstSelected() && block <= LastSelected();
-}
-
-unsigned long LoopGridManager::FirstSelected() const {
-  return static_cast<unsigned long>(std::min(mRow, mAnchor)) + 1;
-}
-unsigned long LoopGridManager::LastSelected() const {
-  return static_cast<unsigned long>(std::max(mRow, mAnchor)) + 1;
-}
+// --- Cursor ------------------------------------------------------------------------------------
 
 void LoopGridManager::SetCursor(unsigned long block, int field, bool extend) {
-  const long lines = DispLineCount();
-  if (lines == 0) return;
-  mRow = std::clamp(static_cast<long>(block) - 1, 0L, lines - 1);
-  mField = std::clamp(field, 0, NumFields() - 1);
-  if (!extend) mAnchor = mRow;
-  ShowLine(mRow);
+  if (mModel.Lines() == 0) return;
+  mModel.SetCursor(block, field, extend);
+  Follow();
+}
+
+void LoopGridManager::Follow() {
+  ShowLine(mModel.CursorRow());
   Refresh();
-  const QRect cell = CellRect(mRow, mField);
+  const QRect cell = CellRect(mModel.CursorRow(), mModel.CursorField());
   if (cell.isValid()) ShowAcross(cell.left(), cell.right() + 1);
   emit StateChanged();
 }
 
 QString LoopGridManager::CellText(unsigned long block, int field) const {
-  if (mSequence == nullptr || block < 1 || block > mSequence->GetNumBlocks()) return {};
-  if (field == LabelField()) return QString::fromStdString(mSequence->GetLabel(block));
-  if (field == LengthField()) return QString::number(mSequence->GetBlockLength(block));
-  if (const unsigned long port = PortOf(field))
-    return QString::fromStdString(mSequence->GetSegment(block, port));
-  if (const unsigned long level = LevelOf(field)) {
-    if (mSequence->GetLoopStatus(block, level) == CSequence::LOOP_NONE) return {};
-    const unsigned long iterations = mSequence->GetNumIterations(block, level);
-    return iterations == 0 ? QStringLiteral("INF") : QString::number(iterations);
-  }
-  return {};
+  return QString::fromStdString(mModel.CellText(block, field));
 }
 
 QString LoopGridManager::MarksOf(const CSequence& sequence, unsigned long block) {
-  QStringList marks;
-  if (sequence.GetBlockMeasurementStart(block) != 0) marks << QStringLiteral("M");
-  if (sequence.GetBlockSync(block) != 0) marks << QStringLiteral("S");
-  if (sequence.GetBlockTrigger(block) != 0)
-    marks << QStringLiteral("T%1").arg(sequence.GetBlockTrigger(block));
-  if (const unsigned long n = sequence.GetBlockNumBranches(block)) marks << QStringLiteral("R%1").arg(n);
-  return marks.join(QLatin1Char(' '));
+  return QString::fromStdString(LoopGridModel::MarksOf(sequence, block));
 }
 
 // --- Following the model -----------------------------------------------------------------------
 
 void LoopGridManager::Sync() {
   mFollower->Refreshed();
+  mModel.Sync();
   SyncColumns();
-  const long lines = DispLineCount();
-  mRow = std::clamp(mRow, 0L, std::max(0L, lines - 1));
-  mAnchor = std::clamp(mAnchor, 0L, std::max(0L, lines - 1));
-  mField = std::clamp(mField, 0, std::max(0, NumFields() - 1));
-  mFirst = std::clamp(mFirst, 0L, std::max(0L, lines - VisibleLines()));
+  mFirst = std::clamp(mFirst, 0L, std::max(0L, mModel.Lines() - VisibleLines()));
   Refresh();
   emit StateChanged();
 }
@@ -165,13 +100,13 @@ void LoopGridManager::Sync() {
 // A column per data port, added or taken away when the number of ports changes; the loop lanes
 // as wide as the levels need.
 void LoopGridManager::SyncColumns() {
-  const unsigned long ports = mSequence == nullptr ? 0 : mSequence->GetNumPorts();
-  mLevels = mSequence == nullptr ? 0 : CSequence::GetNumLoopLevels();
+  const unsigned long ports = mModel.Ports();
+  const unsigned long levels = mModel.Levels();
   if (auto* loops = findChild<GridDisp*>(kLoops, Qt::FindDirectChildrenOnly)) {
-    if (loops->Cells() != static_cast<int>(mLevels) * kLaneCells)
-      loops->SetCells(static_cast<int>(mLevels) * kLaneCells);
+    if (loops->Cells() != static_cast<int>(levels) * kLaneCells)
+      loops->SetCells(static_cast<int>(levels) * kLaneCells);
   }
-  if (ports == mPorts) return;
+  if (ports == mPortColumns) return;
   for (GridDisp* disp : Disps()) {
     if (disp->objectName().startsWith(kPortPrefix)) delete disp;
   }
@@ -182,19 +117,17 @@ void LoopGridManager::SyncColumns() {
     disp->SetMinCells(kPortCells);
     disp->show();
   }
-  mPorts = ports;
+  mPortColumns = ports;
   LayoutDisps();
 }
 
-long LoopGridManager::DispLineCount() const {
-  return mSequence == nullptr ? 0 : static_cast<long>(mSequence->GetNumBlocks());
-}
+long LoopGridManager::DispLineCount() const { return mModel.Lines(); }
 
 // --- Drawing -----------------------------------------------------------------------------------
 
 int LoopGridManager::FieldAt(const GridDisp& disp, int cell) const {
   const QString name = disp.objectName();
-  if (name == kLoops) return mLevels == 0 ? -1 : std::min(cell / kLaneCells, static_cast<int>(mLevels) - 1);
+  if (name == kLoops) return mModel.Levels() == 0 ? -1 : std::min(cell / kLaneCells, static_cast<int>(mModel.Levels()) - 1);
   if (name == kLabels) return LabelField();
   if (name == kLengths) return LengthField();
   if (name.startsWith(kPortPrefix)) return PortField(name.mid(kPortPrefix.size()).toULong());
@@ -227,18 +160,18 @@ GridCell LoopGridManager::DispCell(const GridDisp& disp, long line, int cell) co
   if (disp.objectName() == kBlocks) {
     out.text = QString::number(block);
   } else if (disp.objectName() == kMarks) {
-    out.text = MarksOf(*mSequence, block);
+    out.text = MarksOf(*GetSequence(), block);
   } else if (field >= 0) {
     out.text = CellText(block, field);
     const unsigned long port = PortOf(field);
-    const bool named = port != 0 && mSequence->GetType(block, port) == CSequence::SEG_NAMED;
+    const bool named = port != 0 && GetSequence()->GetType(block, port) == CSequence::SEG_NAMED;
     out.dim = port != 0 && !named;
     out.marked = named && mSegmentsKnown && !mSegmentNames.contains(out.text) &&
                  !QenSegmentPool::IsOpenHere(out.text.toStdString());
-    out.cursor = line == mRow && field == mField && !IsEditing();
+    out.cursor = line == mModel.CursorRow() && field == mModel.CursorField() && !IsEditing();
   }
   // A run of blocks shows as selected; a single block by its number.
-  out.selected = IsSelected(block) || (line == mRow && disp.objectName() == kBlocks);
+  out.selected = IsSelected(block) || (line == mModel.CursorRow() && disp.objectName() == kBlocks);
   return out;
 }
 
@@ -255,14 +188,14 @@ void LoopGridManager::PaintLoops(const GridDisp& disp, QPainter& painter, const 
   painter.fillRect(area, pal.base());
   const int top = GetOffY();
   const int dy = GetDY();
-  if (mLevels == 0 || dy <= 0) return;
-  const int lane = disp.width() / static_cast<int>(mLevels);
+  if (mModel.Levels() == 0 || dy <= 0) return;
+  const int lane = disp.width() / static_cast<int>(mModel.Levels());
   painter.fillRect(QRect(0, 0, disp.width(), top), pal.window());
   painter.setPen(pal.windowText().color());
-  for (unsigned long level = mLevels; level >= 1; --level) {
+  for (unsigned long level = mModel.Levels(); level >= 1; --level) {
     const int x = LaneField(level) * lane;
     painter.drawText(QRect(x, 0, lane, top), Qt::AlignCenter,
-                     level == mLevels ? QStringLiteral("Loop %1\n(top)").arg(level)
+                     level == mModel.Levels() ? QStringLiteral("Loop %1\n(top)").arg(level)
                                       : QStringLiteral("Loop %1").arg(level));
   }
   const long count = DispLineCount();
@@ -273,16 +206,16 @@ void LoopGridManager::PaintLoops(const GridDisp& disp, QPainter& painter, const 
     const long line = mFirst + i;
     const auto block = static_cast<unsigned long>(line) + 1;
     const bool selected = IsSelected(block);
-    for (unsigned long level = 1; level <= mLevels; ++level) {
+    for (unsigned long level = 1; level <= mModel.Levels(); ++level) {
       const int field = LaneField(level);
       const QRect box(field * lane, y, lane, dy);
-      const bool cursor = line == mRow && field == mField;
+      const bool cursor = line == mModel.CursorRow() && field == mModel.CursorField();
       if (cursor) {
         painter.fillRect(box, pal.highlight());
       } else if (selected) {
         painter.fillRect(box, pal.highlight().color().lighter(170));
       }
-      const CSequence::LOOP_STATUS status = mSequence->GetLoopStatus(block, level);
+      const CSequence::LOOP_STATUS status = GetSequence()->GetLoopStatus(block, level);
       if (status == CSequence::LOOP_NONE) continue;
       const bool starts = status == CSequence::LOOP_START || status == CSequence::LOOP_SINGLE;
       const bool ends = status == CSequence::LOOP_END || status == CSequence::LOOP_SINGLE;
@@ -296,7 +229,7 @@ void LoopGridManager::PaintLoops(const GridDisp& disp, QPainter& painter, const 
       if (starts || i == 0) {
         painter.setPen(cursor ? pal.highlightedText().color() : starts ? pal.text().color() : dimText);
         const QString text = painter.fontMetrics().elidedText(
-            CountText(mSequence->GetNumIterations(block, level)), Qt::ElideRight, box.width() - 14);
+            CountText(GetSequence()->GetNumIterations(block, level)), Qt::ElideRight, box.width() - 14);
         painter.drawText(box.adjusted(10, 0, -2, 0), Qt::AlignLeft | Qt::AlignVCenter, text);
       }
     }
@@ -308,12 +241,12 @@ void LoopGridManager::PaintLoops(const GridDisp& disp, QPainter& painter, const 
 void LoopGridManager::DispPress(const GridDisp& disp, long line, int cell, Qt::KeyboardModifiers modifiers) {
   if (IsEditing()) CommitEdit();
   const int field = FieldAt(disp, cell);
-  SetCursor(static_cast<unsigned long>(line) + 1, field >= 0 ? field : mField, modifiers & Qt::ShiftModifier);
+  SetCursor(static_cast<unsigned long>(line) + 1, field >= 0 ? field : mModel.CursorField(), modifiers & Qt::ShiftModifier);
 }
 
 void LoopGridManager::DispMove(const GridDisp& disp, long line, int cell) {
   const int field = FieldAt(disp, cell);
-  SetCursor(static_cast<unsigned long>(line) + 1, field >= 0 ? field : mField, true);
+  SetCursor(static_cast<unsigned long>(line) + 1, field >= 0 ? field : mModel.CursorField(), true);
 }
 
 bool LoopGridManager::CellAt(const QPoint& point, long& line, int& field) const {
@@ -332,7 +265,7 @@ QRect LoopGridManager::CellRect(long line, int field) const {
   for (GridDisp* disp : Disps()) {
     const QString name = disp->objectName();
     if (name == kLoops && LevelOf(field) != 0) {
-      const int lane = disp->width() / static_cast<int>(mLevels);
+      const int lane = disp->width() / static_cast<int>(mModel.Levels());
       return QRect(disp->x() + field * lane, y, lane, GetDY());
     }
     if (name != kLoops && FieldAt(*disp, 0) == field) return QRect(disp->x(), y, disp->width(), GetDY());
@@ -356,7 +289,7 @@ QString LoopGridManager::DroppedName(const QMimeData* mime) {
 }
 
 void LoopGridManager::dragEnterEvent(QDragEnterEvent* event) {
-  if (mSequence != nullptr && !DroppedName(event->mimeData()).isEmpty()) event->acceptProposedAction();
+  if (GetSequence() != nullptr && !DroppedName(event->mimeData()).isEmpty()) event->acceptProposedAction();
 }
 
 void LoopGridManager::dragMoveEvent(QDragMoveEvent* event) {
@@ -404,7 +337,7 @@ void LoopGridManager::AddActions() {
       {"Delete",
        "&Delete Block (Loop on a Lane)",
        {QKeySequence(QKeySequence::Delete)},
-       [this] { LevelOf(mField) != 0 ? RemoveLoop() : DeleteBlock(); }},
+       [this] { LevelOf(mModel.CursorField()) != 0 ? RemoveLoop() : DeleteBlock(); }},
       {"MoveUp", "Move Block &Up", {QKeySequence(Qt::CTRL | Qt::Key_Up)}, [this] { MoveBlock(-1); }},
       {"MoveDown", "Move Block Do&wn", {QKeySequence(Qt::CTRL | Qt::Key_Down)}, [this] { MoveBlock(1); }},
       {"Cut", "Cu&t Block", QKeySequence::keyBindings(QKeySequence::Cut), [this] { CutBlock(); }},
@@ -422,9 +355,9 @@ void LoopGridManager::AddActions() {
        "&Open Segment",
        {QKeySequence(Qt::CTRL | Qt::Key_E)},
        [this] {
-         if (PortOf(mField) != 0 &&
-             mSequence->GetType(CursorBlock(), PortOf(mField)) == CSequence::SEG_NAMED) {
-           emit OpenSegmentRequested(CursorBlock(), PortOf(mField));
+         if (PortOf(mModel.CursorField()) != 0 &&
+             GetSequence()->GetType(CursorBlock(), PortOf(mModel.CursorField())) == CSequence::SEG_NAMED) {
+           emit OpenSegmentRequested(CursorBlock(), PortOf(mModel.CursorField()));
          }
        }},
       {"OpenEvents",
@@ -439,56 +372,32 @@ void LoopGridManager::AddActions() {
     action->setShortcutContext(Qt::WidgetShortcut);
     addAction(action);
     connect(action, &QAction::triggered, this, [this, run = e.run] {
-      if (mSequence != nullptr && DispLineCount() > 0) run();
+      if (GetSequence() != nullptr && DispLineCount() > 0) run();
     });
   }
   setContextMenuPolicy(Qt::ActionsContextMenu);
 }
 
 void LoopGridManager::keyPressEvent(QKeyEvent* event) {
-  if (mSequence == nullptr) return GridManager::keyPressEvent(event);
-  const bool extend = event->modifiers() & Qt::ShiftModifier;
-  const long page = std::max(1L, VisibleLines() - 1);
-  const unsigned long block = CursorBlock();
-  const bool ctrl = event->modifiers() & Qt::ControlModifier;
-  switch (event->key()) {
-    case Qt::Key_Up:
-      SetCursor(block > 1 ? block - 1 : 1, mField, extend);
-      break;
-    case Qt::Key_Down:
-      SetCursor(block + 1, mField, extend);
-      break;
-    case Qt::Key_Left:
-      SetCursor(block, std::max(0, mField - 1), extend);
-      break;
-    case Qt::Key_Right:
-      SetCursor(block, mField + 1, extend);
-      break;
-    case Qt::Key_PageUp:
-      SetCursor(block > static_cast<unsigned long>(page) ? block - page : 1, mField, extend);
-      break;
-    case Qt::Key_PageDown:
-      SetCursor(block + page, mField, extend);
-      break;
-    case Qt::Key_Home:
-      ctrl ? SetCursor(1, mField, extend) : SetCursor(block, LabelField(), extend);
-      break;
-    case Qt::Key_End:
-      ctrl ? SetCursor(DispLineCount(), mField, extend) : SetCursor(block, NumFields() - 1, extend);
-      break;
-    case Qt::Key_Return:
-    case Qt::Key_Enter:
-      BeginEdit();
-      break;
-    default:
-      // Typing starts the cell's editor with what was typed, as a table does.
-      if (!event->text().isEmpty() && event->text().at(0).isPrint() &&
-          !(event->modifiers() & (Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier))) {
-        BeginEdit(event->text());
-        break;
-      }
-      GridManager::keyPressEvent(event);
-      return;
+  if (GetSequence() == nullptr) return GridManager::keyPressEvent(event);
+  const Qt::KeyboardModifiers modifiers = event->modifiers();
+  if (GridKey key; CursorKeyOf(event->key(), key)) {
+    if (mModel.Lines() > 0) {
+      mModel.PressKey(key, modifiers & Qt::ShiftModifier, modifiers & Qt::ControlModifier, VisibleLines());
+      Follow();
+    }
+    event->accept();
+    return;
+  }
+  if (event->key() == Qt::Key_Return || event->key() == Qt::Key_Enter) {
+    BeginEdit();
+  } else if (!event->text().isEmpty() && event->text().at(0).isPrint() &&
+             !(modifiers & (Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier))) {
+    // Typing starts the cell's editor with what was typed, as a table does.
+    BeginEdit(event->text());
+  } else {
+    GridManager::keyPressEvent(event);
+    return;
   }
   event->accept();
 }
@@ -496,16 +405,16 @@ void LoopGridManager::keyPressEvent(QKeyEvent* event) {
 // --- The cell editor ---------------------------------------------------------------------------
 
 void LoopGridManager::BeginEdit(const QString& text) {
-  if (mSequence == nullptr || DispLineCount() == 0) return;
-  const unsigned long level = LevelOf(mField);
-  if (level != 0 && mSequence->GetLoopStatus(CursorBlock(), level) == CSequence::LOOP_NONE) return;
-  ShowLine(mRow);
-  const QRect box = CellRect(mRow, mField);
+  if (GetSequence() == nullptr || DispLineCount() == 0) return;
+  const unsigned long level = LevelOf(mModel.CursorField());
+  if (level != 0 && GetSequence()->GetLoopStatus(CursorBlock(), level) == CSequence::LOOP_NONE) return;
+  ShowLine(mModel.CursorRow());
+  const QRect box = CellRect(mModel.CursorRow(), mModel.CursorField());
   if (box.isEmpty()) return;
-  mEditField = mField;
-  mEditRow = mRow;
+  mEditField = mModel.CursorField();
+  mEditRow = mModel.CursorRow();
   mEditor->setCompleter(nullptr);
-  if (PortOf(mField) != 0) {
+  if (PortOf(mModel.CursorField()) != 0) {
     QStringList words = mSegmentNames;
     for (int type = CSequence::SEG_PAUSE; type <= CSequence::SEG_DONTCARE; ++type) {
       words << QLatin1String(CSequence::CSequenceBlock::KeywordOf(static_cast<CSequence::SeqSegType>(type)));
@@ -516,7 +425,7 @@ void LoopGridManager::BeginEdit(const QString& text) {
     mEditor->setCompleter(completer);
   }
   mEditor->setGeometry(box.adjusted(0, -2, 0, 2));
-  mEditor->setText(text.isNull() ? CellText(CursorBlock(), mField) : text);
+  mEditor->setText(text.isNull() ? CellText(CursorBlock(), mModel.CursorField()) : text);
   mEditor->show();
   mEditor->setFocus();
   Refresh();

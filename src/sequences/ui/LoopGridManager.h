@@ -7,6 +7,7 @@
 #include <memory>
 
 #include "segments/ui/GridManager.h"
+#include "sequences/LoopGridModel.h"
 
 class CSequence;
 class QLineEdit;
@@ -14,7 +15,7 @@ class QMimeData;
 class SequenceFollower;
 class SequenceUndo;
 
-// The loop grid: a line per block of the sequence with its number ("blocks", AddrDisp), the
+// The loop grid on screen, over a LoopGridModel: a line per block with its number ("blocks", AddrDisp), the
 // loops that repeat it ("loops", a lane per loop level, the top level on the left, each loop a
 // bracket beside its blocks with its count), its label and length ("labels", "lengths"), its
 // marks ("marks": M measurement start, S sync block, T trigger, R reactions) and the segment
@@ -43,36 +44,35 @@ class LoopGridManager : public GridManager {
 
   // Shows this sequence (not owned; it must outlive the grid or be set to null first).
   void SetSequence(CSequence* sequence);
-  CSequence* GetSequence() const { return mSequence; }
+  CSequence* GetSequence() const { return mModel.GetSequence(); }
+  LoopGridModel& Model() { return mModel; }
   // How a port's column is headed (the windows know the rack's place names).
   // The heading of a port's column, given the width its text has.
   void SetPortHeader(std::function<QString(unsigned long port, int width)> header) { mPortHeader = std::move(header); }
   // The largest count a loop may have on the instrument; 0 when not known.
-  void SetLargestCount(unsigned long largest) { mLargestCount = largest; }
+  void SetLargestCount(unsigned long largest) { mModel.SetLargestCount(largest); }
   // The names the cell editor of a port offers, besides the built-in kinds.
   // The instrument's segments: the port editor completes them, and once they are known a port
   // naming a segment that is not among them is drawn in the alert colour.
   void SetSegmentNames(const QStringList& names);
 
   // Fields of a line, left to right: the loop lanes (the top level first), label, length, ports.
-  int NumFields() const;
-  int LabelField() const;
-  int LengthField() const;
-  int LaneField(unsigned long level) const;
-  int PortField(unsigned long port) const;
+  int NumFields() const { return mModel.NumFields(); }
+  int LabelField() const { return mModel.LabelField(); }
+  int LengthField() const { return mModel.LengthField(); }
+  int LaneField(unsigned long level) const { return mModel.LaneField(level); }
+  int PortField(unsigned long port) const { return mModel.PortField(port); }
   // The level of a lane field, the port of a port field; 0 for other fields.
-  unsigned long LevelOf(int field) const;
-  unsigned long PortOf(int field) const;
+  unsigned long LevelOf(int field) const { return mModel.LevelOf(field); }
+  unsigned long PortOf(int field) const { return mModel.PortOf(field); }
 
-  unsigned long CursorBlock() const {
-    return mSequence == nullptr ? 0 : static_cast<unsigned long>(mRow) + 1;
-  }
-  int CursorField() const { return mField; }
+  unsigned long CursorBlock() const { return mModel.CursorBlock(); }
+  int CursorField() const { return mModel.CursorField(); }
   // The selected run of blocks (the cursor's block alone when nothing more is selected).
-  unsigned long FirstSelected() const;
-  unsigned long LastSelected() const;
+  unsigned long FirstSelected() const { return mModel.FirstSelected(); }
+  unsigned long LastSelected() const { return mModel.LastSelected(); }
   // Whether the block is in a selected run of more than one block.
-  bool IsSelected(unsigned long block) const;
+  bool IsSelected(unsigned long block) const { return mModel.IsSelected(block); }
   // Moves the cursor to a block (from 1) and field; `extend` keeps the selection's other end.
   void SetCursor(unsigned long block, int field, bool extend = false);
   // The text of a cell as shown.
@@ -100,7 +100,7 @@ class LoopGridManager : public GridManager {
   // The keys that redo in the sequence editors, whatever the platform binds: Ctrl+Y and
   // Ctrl+Shift+Z.
   static QList<QKeySequence> RedoKeys();
-  SequenceUndo* Steps() const { return mUndo.get(); }
+  SequenceUndo* Steps() const { return mModel.Steps(); }
 
   // The cell editor over the cursor's cell, holding `text` (the cell's text when null).
   void BeginEdit(const QString& text = QString());
@@ -110,10 +110,10 @@ class LoopGridManager : public GridManager {
   // Takes the model again: columns, lines, cursor; the lines shown are repainted.
   void Sync();
 
-  bool IsCopyPossible() override { return mSequence != nullptr; }
-  bool IsPastePossible() override;
-  bool IsInsertPossible() override { return mSequence != nullptr; }
-  bool IsDeletePossible() override { return mSequence != nullptr; }
+  bool IsCopyPossible() override { return GetSequence() != nullptr; }
+  bool IsPastePossible() override { return mModel.IsPastePossible(); }
+  bool IsInsertPossible() override { return GetSequence() != nullptr; }
+  bool IsDeletePossible() override { return GetSequence() != nullptr; }
   // Copy, paste, insert (`count` blocks before or after the cursor's) and delete work on whole
   // blocks; an insert of several blocks is one step back.
   int ModifyCopy(ConditionList& list) override;
@@ -144,13 +144,12 @@ class LoopGridManager : public GridManager {
   bool eventFilter(QObject* watched, QEvent* event) override;
 
  private:
-  void Detach();
-  // An edit through the steps; Run reports its conditions, Apply leaves them in the list.
+  // A command of the model; the grid then shows what the instrument holds. Run reports its
+  // conditions, Apply leaves them in the list.
   int Apply(const std::function<int(ConditionList&)>& edit, ConditionList& list);
   int Run(const std::function<int(ConditionList&)>& edit);
-  // A command of the grid base with its conditions reported.
-  int Reported(int (LoopGridManager::*modify)(ConditionList&));
-  int Step(bool back);
+  // Shows the model's cursor: its line, and its cell across.
+  void Follow();
   void SyncColumns();
   void AddActions();
   void CommitEdit();
@@ -163,20 +162,15 @@ class LoopGridManager : public GridManager {
   void PaintLoops(const GridDisp& disp, QPainter& painter, const QRect& area) const;
   static QString DroppedName(const QMimeData* mime);
 
-  CSequence* mSequence = nullptr;
+  LoopGridModel mModel;
   std::unique_ptr<SequenceFollower> mFollower;
-  std::unique_ptr<SequenceUndo> mUndo;
   std::function<QString(unsigned long, int)> mPortHeader;
   QStringList mSegmentNames;
   bool mSegmentsKnown = false;
-  unsigned long mLargestCount = 0;
   QLineEdit* mEditor = nullptr;
   long mFirst = 0;
-  long mRow = 0;
-  long mAnchor = 0;
-  int mField = 0;
   int mEditField = -1;
   long mEditRow = 0;
-  unsigned long mPorts = 0;
-  unsigned long mLevels = 0;
+  // The port columns made.
+  unsigned long mPortColumns = 0;
 };

@@ -2,13 +2,13 @@
 
 #include <vector>
 
-#include "data/BerSvr.h"
+#include "data/ErrStateGridModel.h"
 #include "segments/ui/GridManager.h"
 
-// The error state grid: a line per analyser port with its name and error count ("names" and
-// "totals", both NameDisp columns) and a DigitDisp cell per channel with that channel's errors,
-// in the alert colour once it has any. The cursor is a port and a channel; the arrow keys, Home,
-// End and the page keys move it, and the channels shown follow it when a port has more than fit.
+// The error state grid on screen, over an ErrStateGridModel: a line per analyser port with its
+// name and error count ("names" and "totals", both NameDisp columns) and a DigitDisp cell per
+// channel with that channel's errors, in the alert colour once it has any. The arrow keys, Home,
+// End and the page keys move the model's cursor.
 class ErrStateGridManager : public GridManager {
   Q_OBJECT
 
@@ -21,9 +21,9 @@ class ErrStateGridManager : public GridManager {
 
   // Shows these counts; the cursor keeps its port and channel where they still exist.
   void SetResults(const std::vector<BerSvr::PortResult>& results);
-  const std::vector<BerSvr::PortResult>& GetResults() const { return mResults; }
-  long CursorLine() const { return mLine; }
-  long CursorChannel() const { return mChannel; }
+  const std::vector<BerSvr::PortResult>& GetResults() const { return mModel.GetResults(); }
+  long CursorLine() const { return mModel.CursorLine(); }
+  long CursorChannel() const { return mModel.CursorChannel(); }
   void SetCursor(long line, long channel);
   // What the cursor is on, in words: "Group 1 › Module 3 › Port 1, channel 5: 1 234 errors".
   QString CursorText() const;
@@ -46,15 +46,12 @@ class ErrStateGridManager : public GridManager {
   void keyPressEvent(QKeyEvent* event) override;
 
  private:
-  long ChannelsOf(long line) const;
-  long MostChannels() const;
   // The channel cells the grid's DigitDisp shows.
   long ChannelsShown() const;
   bool IsTotals(const GridDisp& disp) const;
+  // Shows the model's cursor and tells the window.
+  void Follow();
 
-  std::vector<BerSvr::PortResult> mResults;
+  ErrStateGridModel mModel;
   long mFirst = 0;
-  long mLine = 0;
-  long mChannel = 0;
-  long mChannelOffset = 0;
 };
