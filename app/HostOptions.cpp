@@ -2,9 +2,9 @@
 
 #include <cctype>
 
+#include "core/uiapp.h"
 #include "support/ConditionListLoader.h"
 #include "support/Dstring.h"
-#include "windows/WindowFactory.h"
 
 namespace {
 
@@ -133,8 +133,8 @@ int HostOptions::Parse(const std::vector<std::string>& args, HostOptions& out, C
 
 std::string HostOptions::Usage() {
   std::string windows;
-  for (const WindowFactory::Entry& entry : WindowFactory::Entries()) {
-    windows += "                         " + entry.resource + " (" + entry.title + ")\n";
+  for (const WindowResource& entry : uiapp::WindowResources()) {
+    if (entry.onMenu) windows += "                         " + entry.resource + " (" + entry.title + ")\n";
   }
   return "usage: qengui [HOST[:PORT] | --simulate] [--console | --headless | --screenshot FILE] [options]\n"
          "  HOST[:PORT]          the instrument server, port 7130 when none is given (the window asks\n"

@@ -2,7 +2,7 @@
 
 #include <cmath>
 
-#include "SimConnections.h"
+#include "SimCabling.h"
 #include "SimPlace.h"
 
 namespace {

@@ -9,15 +9,15 @@
 // as "compared,errors,ratio"). Counting starts afresh with every start of the instrument and
 // stops with it; each port compares one bit per clock of its group and sees errors at a ratio
 // of its own, so that the figures differ between ports and grow believably while it runs; a
-// port that no generator drives (SimConnections) compares nothing.
+// port that no generator drives (SimCabling) compares nothing.
 // "<port>:BER:RES" starts a port's counts afresh; with test control, "<port>:BER:INJ RATIO"
 // sets the ratio its errors come at (0 goes back to the port's own).
-class SimConnections;
+class SimCabling;
 
 class SimBerMeter : public SimCommandModule {
  public:
   // An analyser port that no generator drives compares nothing.
-  explicit SimBerMeter(std::shared_ptr<const SimConnections> connections) : mConnections(std::move(connections)) {}
+  explicit SimBerMeter(std::shared_ptr<const SimCabling> connections) : mConnections(std::move(connections)) {}
 
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
   void Advance(SimContext& context) override;
@@ -44,7 +44,7 @@ class SimBerMeter : public SimCommandModule {
   static double RatioOf(const Dstring& header);
   static double ClockOf(const Dstring& header, SimContext& context);
 
-  std::shared_ptr<const SimConnections> mConnections;
+  std::shared_ptr<const SimCabling> mConnections;
   std::map<Dstring, Count> mCounts;
   long long mLastMs = -1;
   bool mWasRunning = false;

@@ -4,7 +4,7 @@
 
 #include "SimBerMeter.h"
 #include "SimCapturePlan.h"
-#include "SimConnections.h"
+#include "SimCabling.h"
 #include "SimReply.h"
 #include "SimSegment.h"
 #include "SimSegmentRows.h"

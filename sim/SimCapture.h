@@ -9,14 +9,14 @@
 #include "SimTimedTask.h"
 
 class SimBerMeter;
-class SimConnections;
+class SimCabling;
 class SimSegment;
 class SimSegmentStore;
 class SimSequence;
 
 // The capture of every analyser data port (":CAPT", see SimTimedTask; 250 ms per port): while
 // the instrument runs, each analyser port records ":MEAS:CAPT:DEPT" vectors of what the
-// generator port that drives it (SimConnections) sends under the sequence, with bit errors at
+// generator port that drives it (SimCabling) sends under the sequence, with bit errors at
 // the port's error ratio; one that nothing drives receives a low line.
 // The last finished capture stays until the next one finishes; a cancelled one changes nothing.
 //   "<port>:CAPT:SIZE?"              <vectors>,<traces> of the last capture ("0,0" before one)
@@ -30,7 +30,7 @@ class SimCapture : public SimTimedTask {
   static constexpr std::size_t kMaxReplyBytes = 8u << 20;
 
   SimCapture(std::shared_ptr<const SimSequence> sequence, std::shared_ptr<const SimSegmentStore> segments,
-             std::shared_ptr<const SimBerMeter> ber, std::shared_ptr<const SimConnections> connections)
+             std::shared_ptr<const SimBerMeter> ber, std::shared_ptr<const SimCabling> connections)
       : SimTimedTask(":CAPT", 0.25),
         mSequence(std::move(sequence)),
         mSegments(std::move(segments)),
@@ -75,7 +75,7 @@ class SimCapture : public SimTimedTask {
   std::shared_ptr<const SimSequence> mSequence;
   std::shared_ptr<const SimSegmentStore> mSegments;
   std::shared_ptr<const SimBerMeter> mBer;
-  std::shared_ptr<const SimConnections> mConnections;
+  std::shared_ptr<const SimCabling> mConnections;
   std::map<Dstring, Record> mRecords;  // by port path, upper case
   std::map<Dstring, Record> mPending;
   std::mt19937_64 mRandom{71300};

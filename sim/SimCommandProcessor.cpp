@@ -2,7 +2,7 @@
 
 #include "SimBerMeter.h"
 #include "SimCapture.h"
-#include "SimConnections.h"
+#include "SimCabling.h"
 #include "SimChannelErrors.h"
 #include "SimDeskew.h"
 #include "SimSelfTest.h"
@@ -132,7 +132,7 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
                                          Dstring dataDir)
     : mParams(std::move(params)), mInitialParams(mParams), mClock(clock), mTestControl(testControl) {
   // The modules, one line each; the data directory is theirs to keep files in.
-  auto connections = std::make_shared<SimConnections>(mParams.GetRack());
+  auto connections = std::make_shared<SimCabling>(mParams.GetRack());
   auto sequence = std::make_shared<SimSequence>(mParams);
   mModules.push_back(std::make_shared<SimSettingStore>(mParams, dataDir, sequence, connections));
   mModules.push_back(connections);

@@ -5,7 +5,7 @@
 #include <map>
 #include <set>
 
-#include "SimConnections.h"
+#include "SimCabling.h"
 #include "SimReply.h"
 #include "SimSequence.h"
 
@@ -199,7 +199,7 @@ int SimSettingStore::Apply(const SettingText& text, bool cableDelays, SimContext
                              names.Join(", ").c_str());
     return kConflict;
   }
-  SimConnections::Drivers drivers;
+  SimCabling::Drivers drivers;
   if (!text.IsLegacy()) {
     if (int rc = mSequence->Check(text, detail)) return rc;
     if (int rc = mConnections->Check(text, drivers, detail)) return rc;

@@ -8,7 +8,7 @@
 #include "SimSettingFile.h"
 #include "support/DataParcel.h"
 
-class SimConnections;
+class SimCabling;
 class SimSequence;
 
 // The instrument's setting and its two profiles (docs/simulator.md, "Settings and profiles"):
@@ -29,7 +29,7 @@ class SimSettingStore : public SimCommandModule {
   // files live below `dataDir` (none when it is empty). The sequencer and the connections keep
   // their parts of the setting.
   SimSettingStore(SimParamTable defaults, Dstring dataDir, std::shared_ptr<SimSequence> sequence,
-                  std::shared_ptr<SimConnections> connections)
+                  std::shared_ptr<SimCabling> connections)
       : mDefaults(std::move(defaults)),
         mDataDir(std::move(dataDir)),
         mSequence(std::move(sequence)),
@@ -70,7 +70,7 @@ class SimSettingStore : public SimCommandModule {
   SimParamTable mDefaults;
   Dstring mDataDir;
   std::shared_ptr<SimSequence> mSequence;
-  std::shared_ptr<SimConnections> mConnections;
+  std::shared_ptr<SimCabling> mConnections;
   Dstring mSettingProfile;
   // Name and value text, in the order the names were first written.
   std::vector<std::pair<Dstring, Dstring>> mSystemValues;

@@ -13,10 +13,10 @@ constexpr const char* kDefaultTable =
     "(\":CGR1:MOD1:CONN1\",\":CGR1:MOD3:CONN1\"),(\":CGR1:MOD1:CONN2\",\":CGR1:MOD3:CONN2\"),"
     "(\":CGR2:MOD1:CONN1\",\":CGR2:MOD2:CONN1\"),(\":CGR2:MOD1:CONN2\",\":CGR2:MOD2:CONN2\")";
 
-class SimConnectionsTest : public SimFixture {
+class SimCablingTest : public SimFixture {
  protected:
   static constexpr int kOther = 2;
-  SimConnectionsTest() { EXPECT_EQ(Handle("_B", kOther), "_B"); }
+  SimCablingTest() { EXPECT_EQ(Handle("_B", kOther), "_B"); }
 
   std::string Table() { return Text(":_H:CONF:CONN?"); }
   // The frame status and the error it queued.
@@ -32,7 +32,7 @@ class SimConnectionsTest : public SimFixture {
   }
 };
 
-TEST_F(SimConnectionsTest, FrontendOfTheBuiltInRack) {
+TEST_F(SimCablingTest, FrontendOfTheBuiltInRack) {
   EXPECT_EQ(
       Text(":_H:CONF:FRON?"),
       "(1,(\":CGR1:MOD1\",\"K2268A\",GEN,1,(\":CGR1:MOD1:CONN1\",\"PDAT\",8),(\":CGR1:MOD1:CONN2\",\"PDAT\","
@@ -49,7 +49,7 @@ TEST_F(SimConnectionsTest, FrontendOfTheBuiltInRack) {
   EXPECT_EQ(Refusal(":_H:CONF:FRON 1"), std::make_pair(1, std::string("-200,\"Execution error\"")));
 }
 
-TEST_F(SimConnectionsTest, StartsWithTheDefaultWiringAndFollowsChanges) {
+TEST_F(SimCablingTest, StartsWithTheDefaultWiringAndFollowsChanges) {
   EXPECT_EQ(Table(), kDefaultTable);
   Text(Del(":CGR1:MOD1:CONN1", ":cgr1:mod3:conn1"));
   EXPECT_EQ(Text(":_B:DFL?", kOther), "\":_B:CONF:CONN\"");
@@ -61,7 +61,7 @@ TEST_F(SimConnectionsTest, StartsWithTheDefaultWiringAndFollowsChanges) {
   EXPECT_EQ(Text(":_B:DFL?", kOther), "\":_B:CONF:CONN\"");
 }
 
-TEST_F(SimConnectionsTest, RefusesWhatARackForbidsAndKeepsTheTable) {
+TEST_F(SimCablingTest, RefusesWhatARackForbidsAndKeepsTheTable) {
   Text(Del(":CGR1:MOD1:CONN2", ":CGR1:MOD3:CONN2"));
   const std::string before = Table();
   Text(":_B:DFL?", kOther);
@@ -102,7 +102,7 @@ TEST_F(SimConnectionsTest, RefusesWhatARackForbidsAndKeepsTheTable) {
   EXPECT_EQ(Text(":_B:DFL?", kOther), "");
 }
 
-TEST_F(SimConnectionsTest, PortsOfDifferentWidthsAreNotConnected) {
+TEST_F(SimCablingTest, PortsOfDifferentWidthsAreNotConnected) {
   SimCommandProcessor sim(
       Load("model G generator terminals=16\nmodel N generator terminals=4\nmodel A analyser terminals=16\n"
            "template port\nparam {port}:OUTP bool OFF\nend\n"
@@ -120,7 +120,7 @@ TEST_F(SimConnectionsTest, PortsOfDifferentWidthsAreNotConnected) {
   EXPECT_EQ(sim.Execute(kConn, ":_H:CONF:CONN?").text, "");
 }
 
-TEST_F(SimConnectionsTest, AnAnalyserNothingDrivesComparesNothing) {
+TEST_F(SimCablingTest, AnAnalyserNothingDrivesComparesNothing) {
   Text(Del(":CGR1:MOD1:CONN1", ":CGR1:MOD3:CONN1"));
   Text(":_H:SGEN:GLOB:INIT:CONT ON");
   Text(":_H:DFL?");  // the counts start with the first frame that finds it running

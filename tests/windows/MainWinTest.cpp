@@ -9,6 +9,9 @@
 #include <QPushButton>
 #include <QTableView>
 #include <QTest>
+#include <QTextBrowser>
+#include <QTimer>
+#include <QDialog>
 #include <QToolBar>
 #include <QTreeWidget>
 #include <functional>
@@ -24,6 +27,7 @@
 #include "params/ui/QenDsSTEd.h"
 #include "params/ui/QenParEd.h"
 #include "params/ui/UnitLabel.h"
+#include "toolkit/qt/HelpWindow.h"
 #include "windows/MainWin.h"
 #include "segments/QenSegmentDs.h"
 #include "segments/QenSegmentPool.h"
@@ -264,7 +268,8 @@ TEST_F(MainWinTest, ALockTurnsOffWhatWouldChangeTheInstrumentAndKeepsWhatOnlyRea
       {"System Scheme", true},  {"Command Window", true},     {"Error List", true},
       {"Bit Error Rate", true}, {"Error State", true},        {"Waveform", true},
       {"Measurement Mode", false}, {"Deskew", true},          {"Self Test", true},
-      {"Cascade", true},        {"Tile", true},               {"About qengui", true},
+      {"Cascade", true},        {"Tile", true},               {"User Guide", true},
+      {"Keyboard Shortcuts", true}, {"About qengui", true},
   };
   auto find = [&](const char* text) -> QAction* {
     for (QAction* a : mWin->Commands()) {
@@ -383,6 +388,40 @@ TEST_F(MainWinTest, TheStateShowsWhatTheInstrumentHoldsOnePollAfterAnyRunOrStop)
     }
   }
   EXPECT_TRUE(mAlerts.empty()) << (mAlerts.empty() ? "" : mAlerts[0]);
+}
+
+// The one help window, wherever it was opened from.
+HelpWindow* ShownHelp() {
+  for (QWidget* w : QApplication::topLevelWidgets()) {
+    if (auto* help = qobject_cast<HelpWindow*>(w)) return help;
+  }
+  return nullptr;
+}
+
+// F1 opens the guide's page of the window that has the focus; in a modal dialog, the dialog's
+// page, in a help window the dialog does not block.
+TEST_F(MainWinTest, F1OpensTheGuidePageOfWhatHasTheFocus) {
+  auto* cmd = Open<DtecmdCmdWin>("dtecmd.CmdWin");
+  QTest::keyClick(cmd->Input(), Qt::Key_F1);
+  HelpWindow* help = ShownHelp();
+  ASSERT_NE(help, nullptr);
+  ASSERT_TRUE(help->isVisible());
+  EXPECT_EQ(help->Browser()->source().fileName().toStdString(), "dtecmd.CmdWin.md");
+  QTimer::singleShot(0, [] {
+    QWidget* dialog = QApplication::activeModalWidget();
+    ASSERT_NE(dialog, nullptr);
+    QTest::keyClick(dialog, Qt::Key_F1);
+    HelpWindow* shown = ShownHelp();
+    ASSERT_NE(shown, nullptr);
+    EXPECT_EQ(shown->Browser()->source().fileName().toStdString(), "unitsdlg.UnitsDialog.md");
+    EXPECT_EQ(shown->parentWidget(), dialog);
+    static_cast<QDialog*>(dialog)->reject();
+  });
+  auto* editor = Open<ParameditParamEdWin>("paramedit.ParamEd");
+  QTest::mouseClick(Field(editor, "FieldAmpl")->GetUnitLabel(), Qt::LeftButton);
+  help = HelpWindow::Show("index", nullptr);
+  EXPECT_EQ(help->Browser()->source().fileName().toStdString(), "index.md");
+  help->close();
 }
 
 TEST_F(MainWinTest, CommandWindowShowsRepliesAndTheErrorListTheErrors) {

@@ -19,7 +19,6 @@
 #include "support/NumberText.h"
 #include "windows/MainWin.h"
 #include "windows/ber/BerTableModel.h"
-#include "windows/SequenceWindows.h"
 #include "windows/error/ErrorJournalModel.h"
 #include "windows/seqedit/BlockReactionModel.h"
 #include "windows/smseqedit/SequenceBlockModel.h"
@@ -228,7 +227,7 @@ TEST_F(SequenceModelTest, TheWindowsButtonsFollowTheLock) {
   std::map<std::string, QWidget*> windows;
   for (const char* resource : {"smseqedit.Win", "error.ErrorWin", "ber.BerWin"})
     windows[resource] = main->OpenWindow(QString::fromLatin1(resource));
-  windows["seqedit.EventWin"] = SequenceWindows::OpenEvents(windows["smseqedit.Win"], 1);
+  windows["seqedit.EventWin"] = main->OpenEvents(1);
   const auto enabled = [&](const Button& b) {
     QWidget* w = windows[b.window];
     if (*b.name != 0) w = w->findChild<QPushButton*>(QString::fromLatin1(b.name));

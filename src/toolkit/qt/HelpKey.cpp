@@ -1,6 +1,7 @@
 #include "toolkit/qt/HelpKey.h"
 
 #include <QApplication>
+#include <QEvent>
 #include <QKeyEvent>
 #include <QWidget>
 
@@ -36,10 +37,9 @@ QString HelpKey::PageFor(const QWidget* widget) {
 
 bool HelpKey::eventFilter(QObject* watched, QEvent* event) {
   if (event->type() != QEvent::KeyPress || static_cast<QKeyEvent*>(event)->key() != Qt::Key_F1) return false;
-  // Every widget up the chain sees the same key; answer it once, for the one with the focus.
-  QWidget* focus = QApplication::focusWidget();
-  if (focus == nullptr) focus = qobject_cast<QWidget*>(watched);
-  if (focus == nullptr || watched != focus) return false;
-  HelpWindow::Show(PageFor(focus).toStdString(), focus->window());
+  // The key reaches the widget with the focus first; taken there, it goes no further.
+  auto* target = qobject_cast<QWidget*>(watched);
+  if (target == nullptr) return false;
+  HelpWindow::Show(PageFor(target).toStdString(), target->window());
   return true;
 }

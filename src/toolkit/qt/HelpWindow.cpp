@@ -139,7 +139,9 @@ HelpWindow* HelpWindow::Show(const Dstring& pageOrResource, QWidget* parent) {
   if (window == nullptr) window = new HelpWindow(parent);
   // A modal dialog takes the input from every window but its own: the guide moves under it.
   QWidget* modal = QApplication::activeModalWidget();
-  if (modal != nullptr && modal != window && !modal->isAncestorOf(window)) window->setParent(modal, Qt::Window);
+  bool under = false;
+  for (QWidget* w = window->parentWidget(); w != nullptr && !under; w = w->parentWidget()) under = w == modal;
+  if (modal != nullptr && modal != window && !under) window->setParent(modal, Qt::Window);
   const QUrl page = PageUrl(QString::fromStdString(pageOrResource));
   window->ShowPage(page.isEmpty() ? IndexUrl() : page);
   window->show();

@@ -4,7 +4,7 @@
 
 #include "support/NumberText.h"
 #include "windows/common/PlaceName.h"
-#include "windows/TableCell.h"
+#include "windows/common/TableCell.h"
 
 void BerTableModel::SetResults(const std::vector<BerSvr::PortResult>& results) {
   const bool samePorts = results.size() == mResults.size() &&

@@ -3,7 +3,7 @@
 #include <algorithm>
 
 #include "core/ErrorJournal.h"
-#include "windows/TableCell.h"
+#include "windows/common/TableCell.h"
 
 ErrorJournalModel::ErrorJournalModel(QObject* parent) : QAbstractTableModel(parent) {
   mRows = static_cast<int>(ErrorJournal::Entries().size());

@@ -1,7 +1,7 @@
 #include "windows/seqedit/BlockReactionModel.h"
 
 #include "sequences/CSequence.h"
-#include "windows/TableCell.h"
+#include "windows/common/TableCell.h"
 
 BlockReactionModel::BlockReactionModel(CSequence& sequence, unsigned long block, QObject* parent)
     : QAbstractTableModel(parent), mTable(sequence, block) {

@@ -4,7 +4,7 @@
 
 #include "sequences/BlockReactionTable.h"
 #include "sequences/CSequenceObserver.h"
-#include "windows/TableEdit.h"
+#include "windows/common/TableEdit.h"
 
 // The reactions of one block as a table model over the sequence (BlockReactionTable says what
 // a cell shows and writes). It follows the model's reports: when the block's reactions change

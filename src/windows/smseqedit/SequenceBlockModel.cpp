@@ -4,7 +4,7 @@
 
 #include "sequences/CSequence.h"
 #include "windows/common/PortHeader.h"
-#include "windows/TableCell.h"
+#include "windows/common/TableCell.h"
 
 SequenceBlockModel::SequenceBlockModel(CSequence& sequence, std::function<bool(const Dstring&)> missing,
                                        QObject* parent)

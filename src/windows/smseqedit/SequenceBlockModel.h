@@ -7,7 +7,7 @@
 
 #include "sequences/CSequenceObserver.h"
 #include "sequences/SequenceBlockTable.h"
-#include "windows/TableEdit.h"
+#include "windows/common/TableEdit.h"
 
 // The simple sequence editor's blocks as a table model over the sequence (SequenceBlockTable
 // says what a cell shows and writes). It follows the model's reports as they come: a block

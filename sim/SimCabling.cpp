@@ -1,4 +1,4 @@
-#include "SimConnections.h"
+#include "SimCabling.h"
 
 #include "support/DataParcel.h"
 #include "support/ParserExpression.h"
@@ -13,9 +13,9 @@ bool IsData(const SimRack::Place& place) {
 
 }  // namespace
 
-SimConnections::SimConnections(const SimRack& rack) : mRack(rack), mDrivers(DefaultWiring()) {}
+SimCabling::SimCabling(const SimRack& rack) : mRack(rack), mDrivers(DefaultWiring()) {}
 
-SimConnections::Drivers SimConnections::DefaultWiring() const {
+SimCabling::Drivers SimCabling::DefaultWiring() const {
   Drivers drivers;
   for (const SimRack::Group& g : mRack.GetGroups()) {
     std::vector<SimRack::Place> generators, analysers;
@@ -32,7 +32,7 @@ SimConnections::Drivers SimConnections::DefaultWiring() const {
   return drivers;
 }
 
-void SimConnections::Capture(SettingText& text) const {
+void SimCabling::Capture(SettingText& text) const {
   for (const SimRack::Group& g : mRack.GetGroups()) {
     for (const SimRack::Module& m : g.modules) {
       for (const SimRack::Port& p : m.ports) {
@@ -43,7 +43,7 @@ void SimConnections::Capture(SettingText& text) const {
   }
 }
 
-int SimConnections::Check(const SettingText& text, Drivers& out, Dstring& detail) const {
+int SimCabling::Check(const SettingText& text, Drivers& out, Dstring& detail) const {
   Drivers drivers;
   for (const SettingText::Connection& c : text.GetConnections()) {
     SimRack::Place from, to;
@@ -63,12 +63,12 @@ int SimConnections::Check(const SettingText& text, Drivers& out, Dstring& detail
   return 0;
 }
 
-Dstring SimConnections::DriverOf(const Dstring& analyser) const {
+Dstring SimCabling::DriverOf(const Dstring& analyser) const {
   auto found = mDrivers.find(analyser);
   return found == mDrivers.end() ? Dstring() : found->second;
 }
 
-Dstring SimConnections::Refusal(const SimRack::Place& from, const SimRack::Place& to, const Drivers& drivers) const {
+Dstring SimCabling::Refusal(const SimRack::Place& from, const SimRack::Place& to, const Drivers& drivers) const {
   const Dstring& gen = from.port->path;
   const Dstring& ana = to.port->path;
   if (!IsData(from)) return gen + " is a clock port; only data ports are connected";
@@ -88,7 +88,7 @@ Dstring SimConnections::Refusal(const SimRack::Place& from, const SimRack::Place
   return {};
 }
 
-bool SimConnections::ReadPorts(const SimCommand& cmd, SimContext& context, SimRack::Place& from,
+bool SimCabling::ReadPorts(const SimCommand& cmd, SimContext& context, SimRack::Place& from,
                                SimRack::Place& to) const {
   DataParcel items;
   ConditionList ignored;
@@ -111,7 +111,7 @@ bool SimConnections::ReadPorts(const SimCommand& cmd, SimContext& context, SimRa
   return true;
 }
 
-void SimConnections::Add(const SimCommand& cmd, SimContext& context) {
+void SimCabling::Add(const SimCommand& cmd, SimContext& context) {
   SimRack::Place from, to;
   if (!ReadPorts(cmd, context, from, to)) return;
   const Dstring why = Refusal(from, to, mDrivers);
@@ -120,7 +120,7 @@ void SimConnections::Add(const SimCommand& cmd, SimContext& context) {
   context.MarkChanged(Dstring(kStem));
 }
 
-void SimConnections::Delete(const SimCommand& cmd, SimContext& context) {
+void SimCabling::Delete(const SimCommand& cmd, SimContext& context) {
   SimRack::Place from, to;
   if (!ReadPorts(cmd, context, from, to)) return;
   if (DriverOf(to.port->path) != from.port->path) {
@@ -130,7 +130,7 @@ void SimConnections::Delete(const SimCommand& cmd, SimContext& context) {
   context.MarkChanged(Dstring(kStem));
 }
 
-void SimConnections::List(SimContext& context) const {
+void SimCabling::List(SimContext& context) const {
   Dstring out;
   for (const SimRack::Group& g : mRack.GetGroups()) {
     for (const SimRack::Module& m : g.modules) {
@@ -144,7 +144,7 @@ void SimConnections::List(SimContext& context) const {
   context.Reply(out);
 }
 
-bool SimConnections::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) {
+bool SimCabling::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) {
   if (rest == ":CONF:FRON") {
     if (cmd.IsQuery()) {
       context.Reply(mRack.Format());

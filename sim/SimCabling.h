@@ -19,9 +19,9 @@
 // the driver, ports of different clock groups (the analyser samples with its group's clock),
 // an analyser that is driven already, a generator that drives one already, and ports of
 // different widths. The other handles hear ":CONF:CONN" after every change.
-class SimConnections : public SimCommandModule {
+class SimCabling : public SimCommandModule {
  public:
-  explicit SimConnections(const SimRack& rack);
+  explicit SimCabling(const SimRack& rack);
 
   bool RunHandleCommand(const Dstring& rest, const SimCommand& cmd, SimContext& context) override;
   // The generator port that drives an analyser port (upper case), empty when none.
