@@ -6,6 +6,9 @@
 #include <QApplication>
 #include <QColor>
 #include <QFile>
+#include <QImage>
+#include <QTextBlock>
+#include <QTextCursor>
 #include <QHBoxLayout>
 #include <QLabel>
 #include <QLineEdit>
@@ -226,7 +229,30 @@ void HelpWindow::NfySourceChanged(const QUrl& url) {
       mContents->setCurrentRow(row);
     }
   }
+  FitPictures();
   MarkWords();
+}
+
+// A picture wider than the page is shown at the page's width, so a page never scrolls sideways.
+void HelpWindow::FitPictures() {
+  QTextDocument* document = mBrowser->document();
+  const qreal room = mBrowser->viewport()->width() - 2 * document->documentMargin() - 8;
+  QTextCursor cursor(document);
+  for (QTextBlock block = document->begin(); block.isValid(); block = block.next()) {
+    for (auto it = block.begin(); !it.atEnd(); ++it) {
+      const QTextFragment fragment = it.fragment();
+      if (!fragment.charFormat().isImageFormat()) continue;
+      QTextImageFormat picture = fragment.charFormat().toImageFormat();
+      const QUrl url = mBrowser->source().resolved(QUrl(picture.name()));
+      const QSize size = QImage::fromData(mBrowser->loadResource(QTextDocument::ImageResource, url).toByteArray()).size();
+      if (size.isEmpty() || size.width() <= room) continue;
+      picture.setWidth(room);
+      picture.setHeight(room * size.height() / size.width());
+      cursor.setPosition(fragment.position());
+      cursor.setPosition(fragment.position() + fragment.length(), QTextCursor::KeepAnchor);
+      cursor.setCharFormat(picture);
+    }
+  }
 }
 
 // Every place of a searched word gets a background; the first is selected and brought into view.

@@ -46,6 +46,7 @@ class HelpWindow : public QWidget {
   void HitContents(QListWidgetItem* item);
   void HitHit(QListWidgetItem* item);
   void NfySourceChanged(const QUrl& url);
+  void FitPictures();
   void MarkWords();
 
   QTextBrowser* mBrowser = nullptr;
