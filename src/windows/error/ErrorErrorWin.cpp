@@ -27,6 +27,7 @@ int ErrorErrorWin::Load(ConditionList&) {
   mModel = new ErrorJournalModel(this);
   mTable->setModel(mModel);
   mTable->verticalHeader()->setVisible(false);
+  mTable->horizontalHeader()->setDefaultAlignment(Qt::AlignLeft | Qt::AlignVCenter);
   mTable->horizontalHeader()->setStretchLastSection(true);
   mTable->horizontalHeader()->setSectionResizeMode(ErrorJournalModel::kText, QHeaderView::Stretch);
   mTable->setColumnWidth(ErrorJournalModel::kTime, 70);
