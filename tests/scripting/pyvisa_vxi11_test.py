@@ -200,8 +200,8 @@ def rpc_edges(vxi11_port, mapper_port):
     def write(data, flags=8, lid=link):
         return core.call(CORE_PROG, 1, 11, struct.pack(">iIIi", lid, 1000, 0, flags) + opaque(data))
 
-    def read(size, flags=0, term=0, lid=link):
-        status, body = core.call(CORE_PROG, 1, 12, struct.pack(">iIIIii", lid, size, 1000, 0, flags, term))
+    def read(size, flags=0, term=0, lid=link, timeout=1000):
+        status, body = core.call(CORE_PROG, 1, 12, struct.pack(">iIIIii", lid, size, timeout, 0, flags, term))
         error, reason, length = struct.unpack(">iiI", body[:12])
         return status, error, reason, body[12:12 + length]
 
@@ -235,6 +235,11 @@ def rpc_edges(vxi11_port, mapper_port):
     check("clear keeps the status", stb(), (0, 0x04))
     write(b"SYST:ERR?")
     check("the error through VXI-11", read(100), (0, 0, 4, b'-222,"Data out of range"\n'))
+    # A read waits for a parked *OPC? until its io_timeout; a run synchronises for 500 ms.
+    write(b"SGEN:GLOB:INIT:CONT ON;*OPC?")
+    check("a read waits out a short io_timeout", read(100, timeout=100), (0, 15, 0, b""))
+    check("the answer once synchronised", read(100), (0, 0, 4, b"1\n"))
+    write(b"SGEN:GLOB:INIT:CONT OFF")
     # A link keeps 1024 responses; the oldest beyond them go, each with -410 queued.
     for _ in range(7):
         write(b"*OPC?\n" * 146, flags=0)
