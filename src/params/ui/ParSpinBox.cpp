@@ -1,9 +1,11 @@
 #include "params/ui/ParSpinBox.h"
 
+#include <QContextMenuEvent>
 #include <QKeyEvent>
 #include <QLineEdit>
 
 #include "params/ui/QenParField.h"
+#include "params/ui/UnitLabel.h"
 
 ParSpinBox::ParSpinBox(QenParField& field) : QAbstractSpinBox(&field), mField(field) {
   setFocusPolicy(Qt::StrongFocus);
@@ -38,7 +40,20 @@ bool ParSpinBox::event(QEvent* event) {
   return QAbstractSpinBox::event(event);
 }
 
+void ParSpinBox::contextMenuEvent(QContextMenuEvent* event) {
+  if (event->reason() != QContextMenuEvent::Keyboard || mField.GetUnitLabel() == nullptr) {
+    QAbstractSpinBox::contextMenuEvent(event);
+    return;
+  }
+  mField.GetUnitLabel()->ShowPopupMenu(mapToGlobal(QPoint(0, height())));
+}
+
 void ParSpinBox::keyPressEvent(QKeyEvent* event) {
+  if (event->key() == Qt::Key_F10 && event->modifiers() == Qt::ShiftModifier) {
+    QContextMenuEvent menu(QContextMenuEvent::Keyboard, QPoint(0, height()), mapToGlobal(QPoint(0, height())));
+    contextMenuEvent(&menu);
+    return;
+  }
   switch (event->key()) {
     case Qt::Key_Return:
     case Qt::Key_Enter:

@@ -20,6 +20,8 @@ class ParSpinBox : public QAbstractSpinBox {
   StepEnabled stepEnabled() const override;
   bool event(QEvent* event) override;
   void keyPressEvent(QKeyEvent* event) override;
+  // From the keyboard (the menu key) the unit's prefix and step menu, from the mouse the text's.
+  void contextMenuEvent(QContextMenuEvent* event) override;
   void focusOutEvent(QFocusEvent* event) override;
   void wheelEvent(QWheelEvent* event) override;
 

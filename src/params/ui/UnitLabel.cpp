@@ -121,9 +121,11 @@ void UnitLabel::mouseReleaseEvent(QMouseEvent* event) {
   if (rect().contains(event->position().toPoint())) NfyItemHit(mItemNumber);
 }
 
-void UnitLabel::contextMenuEvent(QContextMenuEvent* event) {
+void UnitLabel::contextMenuEvent(QContextMenuEvent* event) { ShowPopupMenu(event->globalPos()); }
+
+void UnitLabel::ShowPopupMenu(const QPoint& global) {
   if (mField == nullptr || mField->GetDsName().empty()) return;
   QMenu* menu = BuildPopupMenu(this);
   menu->setAttribute(Qt::WA_DeleteOnClose);
-  menu->popup(event->globalPos());
+  menu->popup(global);
 }

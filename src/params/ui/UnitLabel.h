@@ -33,6 +33,8 @@ class UnitLabel : public QLabel {
   void NfyPopupMenuItemSelect(int id);
   // The menu as it shows now: prefix items visible and checked by the field's record.
   QMenu* BuildPopupMenu(QWidget* parent);
+  // Opens that menu at `global`; nothing for a field without a data source.
+  void ShowPopupMenu(const QPoint& global);
   bool IsHighlighted() const { return mHighlighted; }
 
  protected:

@@ -3,6 +3,7 @@
 #include <QAbstractSpinBox>
 #include <QApplication>
 #include <QComboBox>
+#include <QContextMenuEvent>
 #include <QDir>
 #include <QMenu>
 #include <QPluginLoader>
@@ -198,6 +199,26 @@ TEST_F(BoundControlsTest, PrefixFromTheMenuGoesToTheServerAndComesBack) {
   Poll();
   EXPECT_EQ(delay->GetUnitLabel()->text(), "ps");
   EXPECT_EQ(delay->Editor()->Text(), "250");
+}
+
+// From the keyboard, Shift+F10 or the menu key on a field open its unit's prefix and step menu;
+// the mouse keeps the text's own menu.
+TEST_F(BoundControlsTest, TheKeyboardOpensTheUnitMenuOfAField) {
+  auto* ampl = Find<QenParEd>("fieldAmpl");
+  auto unitMenu = [] {
+    auto* menu = qobject_cast<QMenu*>(QApplication::activePopupWidget());
+    const bool prefix = menu != nullptr && !menu->actions().empty() && menu->actions().front()->text() == "&Prefix";
+    if (menu != nullptr) menu->close();
+    return prefix;
+  };
+  QTest::keyClick(ampl->Editor(), Qt::Key_F10, Qt::ShiftModifier);
+  EXPECT_TRUE(unitMenu());
+  QContextMenuEvent key(QContextMenuEvent::Keyboard, QPoint(1, 1), ampl->Editor()->mapToGlobal(QPoint(1, 1)));
+  QApplication::sendEvent(ampl->Editor(), &key);
+  EXPECT_TRUE(unitMenu());
+  QTimer::singleShot(0, [&] { EXPECT_FALSE(unitMenu()); });
+  QContextMenuEvent mouse(QContextMenuEvent::Mouse, QPoint(1, 1), ampl->Editor()->mapToGlobal(QPoint(1, 1)));
+  QApplication::sendEvent(ampl->Editor(), &mouse);
 }
 
 TEST_F(BoundControlsTest, UnitsDialogSetsPrefixAndStep) {
