@@ -231,8 +231,28 @@ void MainWin::BuildWindowsMenu() {
     ++index;
   }
   menu->addSeparator();
+  QAction* next = menu->addAction(QStringLiteral("&Next Window"), mArea, &QMdiArea::activateNextSubWindow);
+  next->setShortcut(QKeySequence(Qt::CTRL | Qt::Key_Tab));
+  QAction* previous = menu->addAction(QStringLiteral("&Previous Window"), mArea, &QMdiArea::activatePreviousSubWindow);
+  previous->setShortcut(QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_Backtab));
   menu->addAction(QStringLiteral("&Cascade"), mArea, &QMdiArea::cascadeSubWindows);
   menu->addAction(QStringLiteral("&Tile"), mArea, &QMdiArea::tileSubWindows);
+  mOpenWindows = menu->addSeparator();
+  connect(menu, &QMenu::aboutToShow, this, [this, menu] { ListOpenWindows(menu); });
+}
+
+// The open windows under the commands, by their titles (a segment editor's names its segment),
+// the active one checked.
+void MainWin::ListOpenWindows(QMenu* menu) {
+  const QList<QAction*> actions = menu->actions();
+  for (qsizetype i = actions.indexOf(mOpenWindows) + 1; i < actions.size(); ++i) delete actions[i];
+  int number = 1;
+  for (QMdiSubWindow* sub : mArea->subWindowList()) {
+    const QString title = QStringLiteral("&%1 %2").arg(number++).arg(sub->windowTitle());
+    QAction* action = menu->addAction(title, this, [this, sub] { mArea->setActiveSubWindow(sub); });
+    action->setCheckable(true);
+    action->setChecked(sub == mArea->activeSubWindow());
+  }
 }
 
 QList<QAction*> MainWin::Commands() const {

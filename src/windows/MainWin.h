@@ -69,6 +69,7 @@ class MainWin : public QMainWindow, public WindowOpener {
   void BuildFileMenu();
   void BuildInstrumentMenu();
   void BuildWindowsMenu();
+  void ListOpenWindows(QMenu* menu);
   void FillRecentMenu();
   // Runs an action of the instrument with the wait cursor and shows what went wrong.
   void RunAction(int (*action)(ConditionList&));
@@ -110,6 +111,7 @@ class MainWin : public QMainWindow, public WindowOpener {
   QList<QAction*> mInstrumentCommands;
   // The Windows menu's entries of windows that read the instrument to open, by resource.
   QList<QPair<QAction*, QString>> mReadingWindows;
+  QAction* mOpenWindows = nullptr;
   QAction* mSelfTest = nullptr;
   std::unique_ptr<StateView> mStateView;
   std::unique_ptr<SelfTestTool> mSelfTestTool;

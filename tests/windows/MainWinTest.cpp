@@ -84,6 +84,42 @@ TEST_F(MainWinTest, AWindowOpensOnceAndIsRaisedWhenAskedAgain) {
   EXPECT_NE(mAlerts[0].find("nosuch.Win"), Dstring::npos);
 }
 
+// The Windows menu ends with the open windows by title, the active one checked; Ctrl+Tab and
+// Ctrl+Shift+Tab go round them from inside any of them.
+TEST_F(MainWinTest, TheOpenWindowsAreListedAndCtrlTabGoesRoundThem) {
+  QWidget* errors = mWin->OpenWindow("error.ErrorWin");
+  auto* cmd = Open<DtecmdCmdWin>("dtecmd.CmdWin");
+  QMenu* menu = nullptr;
+  for (QAction* top : mWin->menuBar()->actions()) {
+    if (top->text() == QStringLiteral("&Windows")) menu = top->menu();
+  }
+  ASSERT_NE(menu, nullptr);
+  auto listed = [&] {
+    emit menu->aboutToShow();
+    QStringList titles;
+    for (QAction* action : menu->actions()) {
+      if (action->isCheckable()) titles << action->text() + (action->isChecked() ? QStringLiteral(" *") : QString());
+    }
+    return titles.join(QStringLiteral(", ")).toStdString();
+  };
+  const size_t windows = mWin->Area()->subWindowList().size();
+  ASSERT_GE(windows, 2u);
+  const std::string list = listed();
+  EXPECT_NE(list.find("Command Window *"), std::string::npos) << list;
+  EXPECT_NE(list.find("Error List"), std::string::npos) << list;
+  EXPECT_EQ(std::count(list.begin(), list.end(), ','), static_cast<long>(windows) - 1) << "listed once each: " << list;
+  EXPECT_EQ(listed(), list) << "the list is made anew each time";
+  std::vector<QWidget*> seen;
+  for (size_t i = 0; i < windows; ++i) {
+    QTest::keyClick(cmd->Input(), Qt::Key_Tab, Qt::ControlModifier);
+    seen.push_back(mWin->Area()->activeSubWindow()->widget());
+  }
+  EXPECT_EQ(seen.back(), cmd) << "round all windows and back";
+  EXPECT_NE(std::find(seen.begin(), seen.end(), errors), seen.end());
+  QTest::keyClick(cmd->Input(), Qt::Key_Backtab, Qt::ControlModifier | Qt::ShiftModifier);
+  EXPECT_NE(mWin->Area()->activeSubWindow()->widget(), cmd);
+}
+
 // The Windows menu is the window table's: its entries in the table's order, Ctrl+1 … Ctrl+9 on
 // the first nine and none after, and each opens the table's window under the table's title.
 TEST_F(MainWinTest, TheWindowsMenuOpensEachWindowOfTheTableUnderItsTitle) {
@@ -268,6 +304,7 @@ TEST_F(MainWinTest, ALockTurnsOffWhatWouldChangeTheInstrumentAndKeepsWhatOnlyRea
       {"System Scheme", true},  {"Command Window", true},     {"Error List", true},
       {"Bit Error Rate", true}, {"Error State", true},        {"Waveform", true},
       {"Measurement Mode", false}, {"Deskew", true},          {"Self Test", true},
+      {"Next Window", true},    {"Previous Window", true},
       {"Cascade", true},        {"Tile", true},               {"User Guide", true},
       {"Keyboard Shortcuts", true}, {"About qengui", true},
   };
