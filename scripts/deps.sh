@@ -41,5 +41,6 @@ qen_quiet() {
 }
 
 # The scripting test drives qensim through PyVISA over its raw SCPI socket; the VCD tests read
-# the exported files with sigrok-cli, as a logic analyser program reads them.
-QEN_TEST_PACKAGES=(python3 python3-pyvisa-py sigrok-cli)
+# the exported files with sigrok-cli, as a logic analyser program reads them; the package test
+# packs the build with cpack, whose dependency lookup needs dpkg-shlibdeps and file.
+QEN_TEST_PACKAGES=(python3 python3-pyvisa-py sigrok-cli dpkg-dev file)
