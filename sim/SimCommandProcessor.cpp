@@ -164,7 +164,7 @@ SimReply SimCommandProcessor::Execute(int connection, std::string_view text, Sim
     RunCoupledQuery(path[0] == "VC", colon == text.npos ? std::string_view() : text.substr(colon));
   } else {
     RunBatch(text);
-    RecordBatch(Dstring(text));
+    RecordBatch(text);
   }
   mListener = nullptr;
   return FinishFrame(delayMs);
@@ -248,13 +248,13 @@ void SimCommandProcessor::RunBatch(std::string_view text) {
     return;
   }
   for (std::string_view part : parts) {
-    if (Dstring(part).Trimmed().empty()) continue;
+    if (part.find_first_not_of(" \t\r\n") == std::string_view::npos) continue;
     RunCommand(SimCommand(part));
     if (mAction != SimReplyAction::Send) return;
   }
 }
 
-void SimCommandProcessor::RecordBatch(const Dstring& text) {
+void SimCommandProcessor::RecordBatch(std::string_view text) {
   for (const Dstring& name : mBatchHandles) {
     auto it = mHandles.find(name);
     if (it == mHandles.end()) continue;
@@ -347,7 +347,7 @@ void SimCommandProcessor::RunParam(std::size_t index, const SimCommand& cmd) {
 
 void SimCommandProcessor::QueryLimit(std::size_t index, const SimCommand& cmd) {
   const SimParam& param = mParams.At(index);
-  Dstring word = cmd.GetArgs().ToUpper();
+  const Dstring word = Dstring(cmd.GetArgs()).ToUpper();
   if (word == "CLAS") return Reply(mParams.IsClashing(index) ? "1" : "0");
   for (const LimitWord& limit : kLimitWords) {
     if (word == limit.word && param.IsNumeric()) return Reply(param.FormatNumber((param.*limit.get)()));
@@ -489,7 +489,7 @@ Dstring SimCommandProcessor::FreeHandleName(const Dstring& proposal) const {
 
 void SimCommandProcessor::DestroyHandle(const SimCommand& cmd) {
   if (!cmd.HasArgs()) return Error(-109);
-  if (mHandles.erase(cmd.GetArgs().ToUpper()) == 0) Error(-224);
+  if (mHandles.erase(Dstring(cmd.GetArgs()).ToUpper()) == 0) Error(-224);
 }
 
 void SimCommandProcessor::TestLock(const SimCommand& cmd) {
@@ -558,7 +558,7 @@ void SimCommandProcessor::TestBig(const SimCommand& cmd) {
   Reply(Pattern(static_cast<std::size_t>(bytes)));
 }
 
-void SimCommandProcessor::TestEcho(const SimCommand& cmd) { Reply(cmd.GetArgs()); }
+void SimCommandProcessor::TestEcho(const SimCommand& cmd) { Reply(Dstring(cmd.GetArgs())); }
 
 void SimCommandProcessor::TestSet(const SimCommand& cmd) {
   std::size_t comma = cmd.GetArgs().find(',');
@@ -585,7 +585,7 @@ bool SimCommandProcessor::ReadSwitch(const SimCommand& cmd, bool& on) {
     Error(-109);
     return false;
   }
-  Dstring word = cmd.GetArgs().ToUpper();
+  const Dstring word = Dstring(cmd.GetArgs()).ToUpper();
   for (const SwitchWord& s : kSwitchWords) {
     if (word == s.word) {
       on = s.on;

@@ -42,7 +42,7 @@ class SimCommandProcessor : public SimContext {
   bool TakePowerOn() { return std::exchange(mPowerOnUnseen, false); }
 
   // SimContext, for the command modules.
-  void Reply(const Dstring& text) override { mReplies.push_back(text); }
+  void Reply(Dstring text) override { mReplies.push_back(std::move(text)); }
   void Error(int code) override;
   void Error(int code, const Dstring& detail) override;
   const Dstring& GetHandle() const override { return mHandle; }
@@ -75,7 +75,7 @@ class SimCommandProcessor : public SimContext {
   SimReply FinishFrame(int delayMs);
   bool IsRefused(std::string_view text) const;
   void RunBatch(std::string_view text);
-  void RecordBatch(const Dstring& text);
+  void RecordBatch(std::string_view text);
   void RunCommand(const SimCommand& cmd);
   bool RunHandleCommand(const SimCommand& cmd);
   bool RunGlobalCommand(const SimCommand& cmd);

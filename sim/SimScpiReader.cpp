@@ -39,8 +39,18 @@ SimScpiReader::Result SimScpiReader::Next(std::string& message) {
   const Result result = overrun ? Result::Overrun : mShort ? Result::ShortBlock : Result::Message;
   std::size_t end = mScan;
   if (end > 0 && mBuffer[end - 1] == '\r') --end;
-  if (result == Result::Message) message.assign(mBuffer, 0, end);
-  mBuffer.erase(0, mScan + 1);
+  if (result == Result::Message && mBuffer.size() - mScan - 1 < end) {
+    // What follows is the smaller part: the buffer becomes the message, and keeps its room.
+    const std::size_t room = mBuffer.capacity();
+    std::string rest = mBuffer.substr(mScan + 1);
+    message = std::move(mBuffer);
+    message.resize(end);
+    mBuffer = std::move(rest);
+    mBuffer.reserve(room);
+  } else {
+    if (result == Result::Message) message.assign(mBuffer, 0, end);
+    mBuffer.erase(0, mScan + 1);
+  }
   mScan = 0;
   mTokenStart = true;
   mOverrun = false;

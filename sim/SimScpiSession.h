@@ -116,6 +116,7 @@ class SimScpiSession {
 
   // The message being run: its units, the next to run, and what it has answered so far.
   std::string mMessage;
+  Dstring mText;  // the instrument command being run
   std::vector<std::string_view> mUnits;
   std::size_t mNext = 0;
   DstringList mReplies;

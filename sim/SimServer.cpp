@@ -250,7 +250,7 @@ void SimServer::HandleFrames(SimConnection& connection) {
     if (reply.delayMs > 0) {
       mTimers.push_back(Timer{mClock.NowMs() + reply.delayMs, connection.GetId(), std::move(bytes)});
     } else {
-      connection.Queue(bytes);
+      connection.Queue(std::move(bytes));
     }
   }
   if (connection.Decoder().GetError() != FrameError::None) {
@@ -338,7 +338,7 @@ void SimServer::FireTimers() {
     }
     auto c = mConnections.find(it->connection);
     if (c != mConnections.end() && !c->second->IsClosed()) {
-      c->second->Queue(it->bytes);
+      c->second->Queue(std::move(it->bytes));
       if (!c->second->Flush()) c->second->Close();
     }
     it = mTimers.erase(it);
