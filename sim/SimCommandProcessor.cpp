@@ -149,6 +149,15 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text, SimWorkListener* listener) {
+  return Run(connection, text, listener, nullptr);
+}
+
+SimReply SimCommandProcessor::ExecuteTaking(int connection, std::string& text, SimWorkListener* listener) {
+  return Run(connection, text, listener, &text);
+}
+
+SimReply SimCommandProcessor::Run(int connection, std::string_view text, SimWorkListener* listener,
+                                  std::string* taken) {
   ResetFrame(connection);
   mListener = listener;
   NoteStates(mGlobal.Advance(mClock.NowMs()));
@@ -164,7 +173,7 @@ SimReply SimCommandProcessor::Execute(int connection, std::string_view text, Sim
     RunCoupledQuery(path[0] == "VC", colon == text.npos ? std::string_view() : text.substr(colon));
   } else {
     RunBatch(text);
-    RecordBatch(text);
+    RecordBatch(text, taken);
   }
   mListener = nullptr;
   return FinishFrame(delayMs);
@@ -254,12 +263,20 @@ void SimCommandProcessor::RunBatch(std::string_view text) {
   }
 }
 
-void SimCommandProcessor::RecordBatch(std::string_view text) {
+// The first handle takes the text over when it may; the others copy what it keeps.
+void SimCommandProcessor::RecordBatch(std::string_view text, std::string* taken) {
   for (const Dstring& name : mBatchHandles) {
     auto it = mHandles.find(name);
     if (it == mHandles.end()) continue;
-    it->second.SetLastBatch(text, {mBatchValues.begin(), mBatchValues.end()},
-                            {mBatchLimits.begin(), mBatchLimits.end()});
+    std::vector<std::size_t> values(mBatchValues.begin(), mBatchValues.end());
+    std::vector<std::size_t> limits(mBatchLimits.begin(), mBatchLimits.end());
+    if (taken == nullptr) {
+      it->second.SetLastBatch(text, std::move(values), std::move(limits));
+      continue;
+    }
+    it->second.TakeLastBatch(*taken, std::move(values), std::move(limits));
+    text = it->second.GetLastBatch();
+    taken = nullptr;
   }
 }
 

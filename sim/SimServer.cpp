@@ -239,7 +239,7 @@ void SimServer::HandleFrames(SimConnection& connection) {
     }
     SimFrameFollower follower(connection, header.id);
     const bool followed = (header.flags & FrameHeader::kFlagProgress) != 0;
-    SimReply reply = mProcessor.Execute(connection.GetId(), payload, followed ? &follower : nullptr);
+    SimReply reply = mProcessor.ExecuteTaking(connection.GetId(), payload, followed ? &follower : nullptr);
     if (reply.action == SimReplyAction::Die) mDie = true;
     if (reply.action != SimReplyAction::Send) {
       connection.Close();
