@@ -40,13 +40,11 @@ SimScpiReader::Result SimScpiReader::Next(std::string& message) {
   std::size_t end = mScan;
   if (end > 0 && mBuffer[end - 1] == '\r') --end;
   if (result == Result::Message && mBuffer.size() - mScan - 1 < end) {
-    // What follows is the smaller part: the buffer becomes the message, and keeps its room.
-    const std::size_t room = mBuffer.capacity();
+    // What follows is the smaller part: the buffer becomes the message.
     std::string rest = mBuffer.substr(mScan + 1);
     message = std::move(mBuffer);
     message.resize(end);
     mBuffer = std::move(rest);
-    mBuffer.reserve(room);
   } else {
     if (result == Result::Message) message.assign(mBuffer, 0, end);
     mBuffer.erase(0, mScan + 1);
@@ -56,6 +54,12 @@ SimScpiReader::Result SimScpiReader::Next(std::string& message) {
   mOverrun = false;
   mShort = false;
   return result;
+}
+
+void SimScpiReader::Recycle(std::string room) {
+  if (room.capacity() <= mBuffer.capacity()) return;
+  room.assign(mBuffer);
+  mBuffer.swap(room);
 }
 
 void SimScpiReader::CutBlock() {

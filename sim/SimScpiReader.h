@@ -28,6 +28,9 @@ class SimScpiReader {
   bool InBlock() const { return mBlockLeft > 0; }
   // The bytes of the block will not come: it ends as a short one.
   void CutBlock();
+  // Storage a message was done with, taken as the buffer when it has more room, so that the
+  // next large message arrives without new memory.
+  void Recycle(std::string room);
   // Where an indefinite-length block ("#0", running to the message's end) starts in a
   // message, outside strings and definite blocks; npos when there is none.
   static std::size_t FindIndefiniteBlock(std::string_view message);

@@ -287,6 +287,7 @@ void SimServer::RunHeld(SimConnection& connection) {
       connection.Queue(std::move(reply));
       connection.Queue("\n");
     }
+    connection.ScpiReader().Recycle(session.ReleaseMessage());
   }
 }
 
