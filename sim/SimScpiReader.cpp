@@ -12,6 +12,9 @@ bool StartsToken(char c) {
   return c == ' ' || c == '\t' || c == ',' || c == ';' || c == '(' || c == ':';
 }
 
+// A message from this size on takes the buffer over rather than a copy of its bytes.
+constexpr std::size_t kHandOver = 65536;
+
 // What may stand right after a block's bytes.
 bool EndsArgument(char c) {
   return c == '\n' || c == '\r' || c == ';' || c == ',' || c == ' ' || c == '\t' || c == ')';
@@ -39,8 +42,8 @@ SimScpiReader::Result SimScpiReader::Next(std::string& message) {
   const Result result = overrun ? Result::Overrun : mShort ? Result::ShortBlock : Result::Message;
   std::size_t end = mScan;
   if (end > 0 && mBuffer[end - 1] == '\r') --end;
-  if (result == Result::Message && mBuffer.size() - mScan - 1 < end) {
-    // What follows is the smaller part: the buffer becomes the message.
+  if (result == Result::Message && end >= kHandOver && mBuffer.size() - mScan - 1 < end) {
+    // A large message with less after it: the buffer becomes the message.
     std::string rest = mBuffer.substr(mScan + 1);
     message = std::move(mBuffer);
     message.resize(end);
