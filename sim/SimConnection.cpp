@@ -43,15 +43,16 @@ SimConnection::~SimConnection() {
 bool SimConnection::Receive() {
   char buf[kChunk];
   for (std::size_t total = 0; total < kMaxPerTurn;) {
-    ssize_t n = recv(mFd, buf, sizeof buf, 0);
+    // Program messages are received where the reader keeps them: a block is not copied there.
+    char* into = mScpi && !mRpc ? mScpiReader.Room(kChunk) : buf;
+    ssize_t n = recv(mFd, into, kChunk, 0);
+    if (into != buf) mScpiReader.Keep(kChunk, n > 0 ? static_cast<std::size_t>(n) : 0);
     if (n == 0) return false;
     if (n < 0) return WouldBlock();
     AcknowledgeAtOnce(mFd);
     if (mRpc) {
       mRpc->Feed(buf, static_cast<std::size_t>(n));
-    } else if (mScpi) {
-      mScpiReader.Feed(buf, static_cast<std::size_t>(n));
-    } else {
+    } else if (!mScpi) {
       mDecoder.Feed(buf, static_cast<std::size_t>(n));
     }
     total += static_cast<std::size_t>(n);

@@ -26,6 +26,15 @@ void SimScpiReader::Feed(const char* data, std::size_t size) {
   mBuffer.append(data, size);
 }
 
+char* SimScpiReader::Room(std::size_t size) {
+  mBuffer.resize(mBuffer.size() + size);
+  return mBuffer.data() + mBuffer.size() - size;
+}
+
+void SimScpiReader::Keep(std::size_t room, std::size_t came) {
+  mBuffer.resize(mBuffer.size() - room + came);
+}
+
 SimScpiReader::Result SimScpiReader::Next(std::string& message) {
   const bool ended = Scan();
   if (!ended) {

@@ -22,6 +22,10 @@ class SimScpiReader {
   enum class Result { None, Message, Overrun, ShortBlock };
 
   void Feed(const char* data, std::size_t size);
+  // `size` bytes of room after what the buffer holds, to receive into straight; Keep then
+  // says how many of them came.
+  char* Room(std::size_t size);
+  void Keep(std::size_t room, std::size_t came);
   // The next complete message (without its terminator), or None when more bytes are needed.
   Result Next(std::string& message);
   // A definite-length block has begun and not all its bytes have come.
