@@ -86,8 +86,9 @@ bool SimBerMeter::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, S
   }
   if (context.TestControl() && PortOf(rest, kInject, context, header)) {
     char* end = nullptr;
-    const double ratio = std::strtod(cmd.GetArgs().c_str(), &end);
-    if (cmd.IsQuery() || end == cmd.GetArgs().c_str() || *end != '\0' || !(ratio >= 0 && ratio <= 0.5)) {
+    const Dstring args(cmd.GetArgs());
+    const double ratio = std::strtod(args.c_str(), &end);
+    if (cmd.IsQuery() || end == args.c_str() || *end != '\0' || !(ratio >= 0 && ratio <= 0.5)) {
       context.Error(cmd.IsQuery() ? -113 : -222);
     } else {
       mCounts[header].injected = ratio;

@@ -45,11 +45,33 @@ SimCommand::SimCommand(std::string_view text) {
   std::string_view trimmed = Trim(text);
   std::size_t blank = trimmed.find_first_of(" \t");
   Dstring header(trimmed.substr(0, blank));
-  if (blank != std::string_view::npos) mArgs = Dstring(Trim(trimmed.substr(blank + 1)));
+  if (blank != std::string_view::npos) mArgs = Trim(trimmed.substr(blank + 1));
   mQuery = header.EndsWith("?");
   if (mQuery) header.pop_back();
   if (header.StartsWith(":")) header.erase(0, 1);
   if (!header.empty()) mPath = DstringList::Split(header.ToUpper(), ':');
+}
+
+bool SimCommand::SplitTrailingBlock(std::string_view& head, std::string_view& bytes) const {
+  const std::size_t hash = mArgs.find('#');
+  if (hash == std::string_view::npos) return false;
+  const std::string_view before = mArgs.substr(0, hash);
+  const std::size_t comma = before.find_last_not_of(" \t");
+  if (before.find_first_of("\"'()") != std::string_view::npos) return false;
+  if (comma == std::string_view::npos || mArgs[comma] != ',' || hash + 2 > mArgs.size()) return false;
+  const char n = mArgs[hash + 1];
+  if (n < '1' || n > '9') return false;
+  const std::size_t data = hash + 2 + static_cast<std::size_t>(n - '0');
+  if (data > mArgs.size()) return false;
+  std::size_t length = 0;
+  for (std::size_t i = hash + 2; i < data; ++i) {
+    if (!std::isdigit(static_cast<unsigned char>(mArgs[i]))) return false;
+    length = length * 10 + static_cast<std::size_t>(mArgs[i] - '0');
+  }
+  if (length != mArgs.size() - data) return false;
+  head = mArgs.substr(0, comma);
+  bytes = mArgs.substr(data);
+  return true;
 }
 
 Dstring SimCommand::PathFrom(std::size_t from) const {

@@ -149,6 +149,15 @@ SimCommandProcessor::SimCommandProcessor(SimParamTable params, const SimClock& c
 }
 
 SimReply SimCommandProcessor::Execute(int connection, std::string_view text, SimWorkListener* listener) {
+  return Run(connection, text, listener, nullptr);
+}
+
+SimReply SimCommandProcessor::ExecuteTaking(int connection, std::string& text, SimWorkListener* listener) {
+  return Run(connection, text, listener, &text);
+}
+
+SimReply SimCommandProcessor::Run(int connection, std::string_view text, SimWorkListener* listener,
+                                  std::string* taken) {
   ResetFrame(connection);
   mListener = listener;
   NoteStates(mGlobal.Advance(mClock.NowMs()));
@@ -164,7 +173,7 @@ SimReply SimCommandProcessor::Execute(int connection, std::string_view text, Sim
     RunCoupledQuery(path[0] == "VC", colon == text.npos ? std::string_view() : text.substr(colon));
   } else {
     RunBatch(text);
-    RecordBatch(Dstring(text));
+    RecordBatch(text, taken);
   }
   mListener = nullptr;
   return FinishFrame(delayMs);
@@ -248,18 +257,26 @@ void SimCommandProcessor::RunBatch(std::string_view text) {
     return;
   }
   for (std::string_view part : parts) {
-    if (Dstring(part).Trimmed().empty()) continue;
+    if (part.find_first_not_of(" \t\r\n") == std::string_view::npos) continue;
     RunCommand(SimCommand(part));
     if (mAction != SimReplyAction::Send) return;
   }
 }
 
-void SimCommandProcessor::RecordBatch(const Dstring& text) {
+// The first handle takes the text over when it may; the others copy what it keeps.
+void SimCommandProcessor::RecordBatch(std::string_view text, std::string* taken) {
   for (const Dstring& name : mBatchHandles) {
     auto it = mHandles.find(name);
     if (it == mHandles.end()) continue;
-    it->second.SetLastBatch(text, {mBatchValues.begin(), mBatchValues.end()},
-                            {mBatchLimits.begin(), mBatchLimits.end()});
+    std::vector<std::size_t> values(mBatchValues.begin(), mBatchValues.end());
+    std::vector<std::size_t> limits(mBatchLimits.begin(), mBatchLimits.end());
+    if (taken == nullptr) {
+      it->second.SetLastBatch(text, std::move(values), std::move(limits));
+      continue;
+    }
+    it->second.TakeLastBatch(*taken, std::move(values), std::move(limits));
+    text = it->second.GetLastBatch();
+    taken = nullptr;
   }
 }
 
@@ -347,7 +364,7 @@ void SimCommandProcessor::RunParam(std::size_t index, const SimCommand& cmd) {
 
 void SimCommandProcessor::QueryLimit(std::size_t index, const SimCommand& cmd) {
   const SimParam& param = mParams.At(index);
-  Dstring word = cmd.GetArgs().ToUpper();
+  const Dstring word = Dstring(cmd.GetArgs()).ToUpper();
   if (word == "CLAS") return Reply(mParams.IsClashing(index) ? "1" : "0");
   for (const LimitWord& limit : kLimitWords) {
     if (word == limit.word && param.IsNumeric()) return Reply(param.FormatNumber((param.*limit.get)()));
@@ -489,7 +506,7 @@ Dstring SimCommandProcessor::FreeHandleName(const Dstring& proposal) const {
 
 void SimCommandProcessor::DestroyHandle(const SimCommand& cmd) {
   if (!cmd.HasArgs()) return Error(-109);
-  if (mHandles.erase(cmd.GetArgs().ToUpper()) == 0) Error(-224);
+  if (mHandles.erase(Dstring(cmd.GetArgs()).ToUpper()) == 0) Error(-224);
 }
 
 void SimCommandProcessor::TestLock(const SimCommand& cmd) {
@@ -558,7 +575,7 @@ void SimCommandProcessor::TestBig(const SimCommand& cmd) {
   Reply(Pattern(static_cast<std::size_t>(bytes)));
 }
 
-void SimCommandProcessor::TestEcho(const SimCommand& cmd) { Reply(cmd.GetArgs()); }
+void SimCommandProcessor::TestEcho(const SimCommand& cmd) { Reply(Dstring(cmd.GetArgs())); }
 
 void SimCommandProcessor::TestSet(const SimCommand& cmd) {
   std::size_t comma = cmd.GetArgs().find(',');
@@ -585,7 +602,7 @@ bool SimCommandProcessor::ReadSwitch(const SimCommand& cmd, bool& on) {
     Error(-109);
     return false;
   }
-  Dstring word = cmd.GetArgs().ToUpper();
+  const Dstring word = Dstring(cmd.GetArgs()).ToUpper();
   for (const SwitchWord& s : kSwitchWords) {
     if (word == s.word) {
       on = s.on;

@@ -31,6 +31,9 @@ class SimCommandProcessor : public SimContext {
 
   // `listener`: the client follows long work (progress, cancel); null when it does not.
   SimReply Execute(int connection, std::string_view text, SimWorkListener* listener = nullptr);
+  // The same, and the handles keep the text itself as the batch they ran last, not a copy of
+  // it: `text` is left with the room of an earlier batch, for the caller to fill again.
+  SimReply ExecuteTaking(int connection, std::string& text, SimWorkListener* listener = nullptr);
   // The connection has gone: its handles die and its lock is released.
   void Disconnect(int connection);
   // Frames of only queries from this connection run while another one holds the lock (a
@@ -42,7 +45,7 @@ class SimCommandProcessor : public SimContext {
   bool TakePowerOn() { return std::exchange(mPowerOnUnseen, false); }
 
   // SimContext, for the command modules.
-  void Reply(const Dstring& text) override { mReplies.push_back(text); }
+  void Reply(Dstring text) override { mReplies.push_back(std::move(text)); }
   void Error(int code) override;
   void Error(int code, const Dstring& detail) override;
   const Dstring& GetHandle() const override { return mHandle; }
@@ -75,7 +78,8 @@ class SimCommandProcessor : public SimContext {
   SimReply FinishFrame(int delayMs);
   bool IsRefused(std::string_view text) const;
   void RunBatch(std::string_view text);
-  void RecordBatch(const Dstring& text);
+  SimReply Run(int connection, std::string_view text, SimWorkListener* listener, std::string* taken);
+  void RecordBatch(std::string_view text, std::string* taken);
   void RunCommand(const SimCommand& cmd);
   bool RunHandleCommand(const SimCommand& cmd);
   bool RunGlobalCommand(const SimCommand& cmd);

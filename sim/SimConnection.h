@@ -44,17 +44,10 @@ class SimConnection {
 
   // Reads what the socket has now into the decoder; false once the peer is gone.
   bool Receive();
-  void Queue(const std::string& bytes) { mOut.append(bytes); }
-  // Takes the bytes over whole when nothing else waits to go out.
-  void Queue(std::string&& bytes) {
-    if (mOut.empty()) {
-      mOut = std::move(bytes);
-    } else {
-      mOut.append(bytes);
-    }
-  }
-  std::size_t Pending() const { return mOut.size() - mSent; }
-  // Writes what the socket takes now; false once the peer is gone.
+  // A large piece is taken over as it is, never copied; small ones are gathered.
+  void Queue(std::string bytes);
+  std::size_t Pending() const { return mPending; }
+  // Writes what the socket takes now, the pieces together; false once the peer is gone.
   bool Flush();
 
   bool IsClosed() const { return mClosed; }
@@ -75,6 +68,7 @@ class SimConnection {
   std::deque<Held> mHeld;
   std::size_t mHeldBytes = 0;
   long long mLastInputMs = 0;
-  std::string mOut;
-  std::size_t mSent = 0;
+  std::deque<std::string> mOut;
+  std::size_t mSent = 0;  // of the first piece
+  std::size_t mPending = 0;
 };

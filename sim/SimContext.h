@@ -9,7 +9,8 @@ class SimContext {
  public:
   virtual ~SimContext() = default;
 
-  virtual void Reply(const Dstring& text) = 0;
+  // Taken over: a data block is not copied again.
+  virtual void Reply(Dstring text) = 0;
   // Queues the SCPI error on the queue the client reads for this command.
   virtual void Error(int code) = 0;
   // The same with what went wrong after the standard text ("Settings conflict; ...").

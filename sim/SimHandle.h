@@ -1,6 +1,8 @@
 #pragma once
 
 #include <cstddef>
+#include <string>
+#include <string_view>
 #include <vector>
 
 #include "SimDirtySet.h"
@@ -17,8 +19,15 @@ class SimHandle {
   SimErrorQueue& Errors() { return mErrors; }
   SimDirtySet& Dirty() { return mDirty; }
 
-  void SetLastBatch(const Dstring& text, std::vector<std::size_t> values, std::vector<std::size_t> limits) {
-    mLastBatch = text;
+  // The text goes into the room the last one had: a batch of data blocks takes no new memory.
+  void SetLastBatch(std::string_view text, std::vector<std::size_t> values, std::vector<std::size_t> limits) {
+    mLastBatch.assign(text);
+    mLastValues = std::move(values);
+    mLastLimits = std::move(limits);
+  }
+  // The same with the text itself; `text` gets the room of the batch kept before.
+  void TakeLastBatch(std::string& text, std::vector<std::size_t> values, std::vector<std::size_t> limits) {
+    text.swap(mLastBatch);
     mLastValues = std::move(values);
     mLastLimits = std::move(limits);
   }

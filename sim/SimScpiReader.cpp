@@ -12,6 +12,9 @@ bool StartsToken(char c) {
   return c == ' ' || c == '\t' || c == ',' || c == ';' || c == '(' || c == ':';
 }
 
+// A message from this size on takes the buffer over rather than a copy of its bytes.
+constexpr std::size_t kHandOver = 65536;
+
 // What may stand right after a block's bytes.
 bool EndsArgument(char c) {
   return c == '\n' || c == '\r' || c == ';' || c == ',' || c == ' ' || c == '\t' || c == ')';
@@ -21,6 +24,15 @@ bool EndsArgument(char c) {
 
 void SimScpiReader::Feed(const char* data, std::size_t size) {
   mBuffer.append(data, size);
+}
+
+char* SimScpiReader::Room(std::size_t size) {
+  mBuffer.resize(mBuffer.size() + size);
+  return mBuffer.data() + mBuffer.size() - size;
+}
+
+void SimScpiReader::Keep(std::size_t room, std::size_t came) {
+  mBuffer.resize(mBuffer.size() - room + came);
 }
 
 SimScpiReader::Result SimScpiReader::Next(std::string& message) {
@@ -39,13 +51,27 @@ SimScpiReader::Result SimScpiReader::Next(std::string& message) {
   const Result result = overrun ? Result::Overrun : mShort ? Result::ShortBlock : Result::Message;
   std::size_t end = mScan;
   if (end > 0 && mBuffer[end - 1] == '\r') --end;
-  if (result == Result::Message) message.assign(mBuffer, 0, end);
-  mBuffer.erase(0, mScan + 1);
+  if (result == Result::Message && end >= kHandOver && mBuffer.size() - mScan - 1 < end) {
+    // A large message with less after it: the buffer becomes the message.
+    std::string rest = mBuffer.substr(mScan + 1);
+    message = std::move(mBuffer);
+    message.resize(end);
+    mBuffer = std::move(rest);
+  } else {
+    if (result == Result::Message) message.assign(mBuffer, 0, end);
+    mBuffer.erase(0, mScan + 1);
+  }
   mScan = 0;
   mTokenStart = true;
   mOverrun = false;
   mShort = false;
   return result;
+}
+
+void SimScpiReader::Recycle(std::string room) {
+  if (room.capacity() <= mBuffer.capacity()) return;
+  room.assign(mBuffer);
+  mBuffer.swap(room);
 }
 
 void SimScpiReader::CutBlock() {

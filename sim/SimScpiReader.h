@@ -22,12 +22,19 @@ class SimScpiReader {
   enum class Result { None, Message, Overrun, ShortBlock };
 
   void Feed(const char* data, std::size_t size);
+  // `size` bytes of room after what the buffer holds, to receive into straight; Keep then
+  // says how many of them came.
+  char* Room(std::size_t size);
+  void Keep(std::size_t room, std::size_t came);
   // The next complete message (without its terminator), or None when more bytes are needed.
   Result Next(std::string& message);
   // A definite-length block has begun and not all its bytes have come.
   bool InBlock() const { return mBlockLeft > 0; }
   // The bytes of the block will not come: it ends as a short one.
   void CutBlock();
+  // Storage a message was done with, taken as the buffer when it has more room, so that the
+  // next large message arrives without new memory.
+  void Recycle(std::string room);
   // Where an indefinite-length block ("#0", running to the message's end) starts in a
   // message, outside strings and definite blocks; npos when there is none.
   static std::size_t FindIndefiniteBlock(std::string_view message);

@@ -247,9 +247,11 @@ void SimScpiSession::RunInstrument(const Dstring& header, std::string_view args,
       if (int rc = SimScpiValue::Resolve(args, param, configured, value)) return Queue(rc, TextOf(rc));
     }
   }
-  // Data blocks are large: the arguments are copied once, straight into the command.
-  text.append(value.empty() ? args : std::string_view(value));
-  SimReply reply = mProcessor.Execute(mConnection, text);
+  // Data blocks are large: the arguments are copied once, straight into the command, which
+  // the handle keeps as its last batch, handing back the room of the one before.
+  mText.assign(text);
+  mText.append(value.empty() ? args : std::string_view(value));
+  SimReply reply = mProcessor.ExecuteTaking(mConnection, mText);
   if (reply.status == -19) return Queue(-203, "Command protected");
   // Handle-free commands leave their errors on the connection's queue, which the error query
   // of any name that is no handle reads; test control plants errors without failing.

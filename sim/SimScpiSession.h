@@ -44,6 +44,8 @@ class SimScpiSession {
   // Looks at the instrument again: a pending *OPC sets its bit, a parked message goes on.
   Outcome Tick(Dstring& reply);
   bool IsWaiting() const { return mNext < mUnits.size(); }
+  // The storage of the message it has run, to receive the next one into; empty while waiting.
+  std::string ReleaseMessage() { return IsWaiting() ? std::string() : std::move(mMessage); }
   // Tick has something to look for.
   bool NeedsTicks() const { return IsWaiting() || mOpcArmed; }
   // A message that did not fit the input buffer: -363 "Input buffer overrun".
@@ -116,6 +118,7 @@ class SimScpiSession {
 
   // The message being run: its units, the next to run, and what it has answered so far.
   std::string mMessage;
+  Dstring mText;  // the instrument command being run
   std::vector<std::string_view> mUnits;
   std::size_t mNext = 0;
   DstringList mReplies;

@@ -6,6 +6,7 @@
 #include <utility>
 #include <vector>
 
+#include "SimReply.h"
 #include "support/ConditionList.h"
 #include "support/DstringList.h"
 #include "support/LispList.h"
@@ -289,13 +290,14 @@ int SimSegment::Convert(const Dstring& from, const Dstring& to) {
   return 0;
 }
 
-int SimSegment::ReadBlock(long t0, long v0, long t1, long v1, std::string& block) const {
+int SimSegment::ReadBlock(long t0, long v0, long t1, long v1, std::string& out, bool header) const {
   if (int rc = CheckRange(t0, v0, t1, v1)) return rc;
   const int stateWidth = IsGenerated() ? 1 : mRows.GetStateWidth();
   const std::size_t rowBytes = SimSegmentRows::RowBytes(v1 - v0 + 1, stateWidth);
   if (static_cast<long>(rowBytes) * (t1 - t0 + 1) > kMaxBlockBytes) return -222;
+  if (header) out += SimBlockHeader(rowBytes * static_cast<std::size_t>(t1 - t0 + 1));
   if (!IsGenerated()) {
-    block = mRows.ReadBlock(t0, v0, t1, v1);
+    mRows.ReadBlock(t0, v0, t1, v1, out);
     return 0;
   }
   // Generated: one run of the stream serves every trace, except that a word stream gives each
@@ -310,7 +312,7 @@ int SimSegment::ReadBlock(long t0, long v0, long t1, long v1, std::string& block
     for (long v = 0; v < vectors; ++v)
       rows.Set(t - t0, v, bits[static_cast<std::size_t>(v * stride + (words ? t : 0))]);
   }
-  block = rows.ReadBlock(0, 0, t1 - t0, vectors - 1);
+  rows.ReadBlock(0, 0, t1 - t0, vectors - 1, out);
   return 0;
 }
 
@@ -330,7 +332,8 @@ int SimSegment::WriteBlock(long t0, long v0, long t1, long v1, std::string_view 
 int SimSegment::Keep(long t0, long v0, long t1, long v1, std::string& states) const {
   if (int rc = CheckMemory()) return rc;
   if (int rc = CheckRange(t0, v0, t1, v1)) return rc;
-  states = mRows.ReadBlock(t0, v0, t1, v1);
+  states.clear();
+  mRows.ReadBlock(t0, v0, t1, v1, states);
   return 0;
 }
 

@@ -40,7 +40,9 @@ class SimSegment {
   int SetCoding(const Dstring& coding);
   int Convert(const Dstring& from, const Dstring& to);
 
-  int ReadBlock(long t0, long v0, long t1, long v1, std::string& block) const;
+  // The block of the range appended to `out`; a reply has the block's header before it, so
+  // that the whole reply is made in one piece.
+  int ReadBlock(long t0, long v0, long t1, long v1, std::string& out, bool header = false) const;
   int WriteBlock(long t0, long v0, long t1, long v1, std::string_view block);
   // The states of a memory data range, whatever its size, to be put back after work that
   // was cancelled; PutBack takes only what Keep gave for the same range.

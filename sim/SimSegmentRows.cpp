@@ -80,16 +80,23 @@ void SimSegmentRows::Fill(long trace, long vector, long count, unsigned value) {
   for (long v = vector; v < vector + count; ++v) Set(trace, v, value);
 }
 
-std::string SimSegmentRows::ReadBlock(long t0, long v0, long t1, long v1) const {
+void SimSegmentRows::ReadBlock(long t0, long v0, long t1, long v1, std::string& out) const {
   const long vectors = v1 - v0 + 1;
   const std::size_t rowBytes = RowBytes(vectors, mStateWidth);
-  std::string block(rowBytes * static_cast<std::size_t>(t1 - t0 + 1), '\0');
-  auto* out = reinterpret_cast<std::uint8_t*>(block.data());
-  for (long t = t0; t <= t1; ++t, out += rowBytes) {
-    CopyBits(out, 0, Row(t).data(), static_cast<std::size_t>(v0 * mStateWidth),
-             static_cast<std::size_t>(vectors * mStateWidth));
+  const std::size_t first = static_cast<std::size_t>(v0 * mStateWidth);
+  const std::size_t bits = static_cast<std::size_t>(vectors * mStateWidth);
+  if (first % 8 == 0 && bits % 8 == 0) {
+    // Whole bytes: the rows are appended as they are, with nothing to clear first.
+    out.reserve(out.size() + rowBytes * static_cast<std::size_t>(t1 - t0 + 1));
+    for (long t = t0; t <= t1; ++t) out.append(reinterpret_cast<const char*>(Row(t).data()) + first / 8, rowBytes);
+    return;
   }
-  return block;
+  const std::size_t at = out.size();
+  out.resize(at + rowBytes * static_cast<std::size_t>(t1 - t0 + 1), '\0');
+  auto* to = reinterpret_cast<std::uint8_t*>(out.data() + at);
+  for (long t = t0; t <= t1; ++t, to += rowBytes) {
+    CopyBits(to, 0, Row(t).data(), first, bits);
+  }
 }
 
 void SimSegmentRows::WriteBlock(long t0, long v0, long t1, long v1, std::string_view block) {

@@ -29,8 +29,9 @@ class SimSegmentRows {
   // One-bit states `count` from `vector` of one trace turned to the other state.
   void FlipBits(long trace, long vector, long count);
 
-  // The block of traces t0..t1 and vectors v0..v1: one padded row per trace, in trace order.
-  std::string ReadBlock(long t0, long v0, long t1, long v1) const;
+  // The block of traces t0..t1 and vectors v0..v1, appended to `out`: one padded row per
+  // trace, in trace order.
+  void ReadBlock(long t0, long v0, long t1, long v1, std::string& out) const;
   void WriteBlock(long t0, long v0, long t1, long v1, std::string_view block);
   // Whether every state of the block is below `limit`.
   static bool BlockBelow(std::string_view block, long traces, long vectors, int stateWidth, unsigned limit);

@@ -266,7 +266,7 @@ int SimSegmentStore::Catalog(const SimCommand&, SimContext& context) {
 int SimSegmentStore::Pace(const SimCommand& cmd, SimContext& context) {
   if (!context.TestControl()) return -113;
   long ms = 0;
-  if (!cmd.GetArgs().ToLong(ms) || ms < 0 || ms > 60000) return -222;
+  if (!Dstring(cmd.GetArgs()).ToLong(ms) || ms < 0 || ms > 60000) return -222;
   mPaceMs = static_cast<int>(ms);
   return 0;
 }
@@ -404,15 +404,23 @@ int SimSegmentStore::QueryData(unsigned, SimSegment& segment, const SimCommand& 
   if (int rc = Args(cmd, items, 5, 5)) return rc;
   if (int rc = Longs(items, 0, 4, range)) return rc;
   if (WordAt(items, 4) != "BIN") return -224;
-  std::string block;
-  if (int rc = segment.ReadBlock(range[0], range[1], range[2], range[3], block)) return rc;
-  context.Reply(SimBlockHeader(block.size()) + block);
+  Dstring reply;
+  if (int rc = segment.ReadBlock(range[0], range[1], range[2], range[3], reply, true)) return rc;
+  context.Reply(std::move(reply));
   return 0;
 }
 
 int SimSegmentStore::WriteData(unsigned, SimSegment& segment, const SimCommand& cmd, SimContext&) {
   DataParcel items;
   long range[4];
+  // The usual shape has only the range parsed: the block is written from where it stands.
+  std::string_view head;
+  std::string_view bytes;
+  ConditionList ignored;
+  if (cmd.SplitTrailingBlock(head, bytes) && ParserExpression::Parse(head, items, ignored) == 0 && items.size() == 4) {
+    if (int rc = Longs(items, 0, 4, range)) return rc;
+    return segment.WriteBlock(range[0], range[1], range[2], range[3], bytes);
+  }
   if (int rc = Args(cmd, items, 5, 5)) return rc;
   if (int rc = Longs(items, 0, 4, range)) return rc;
   if (items[4].GetType() != DataItemType::Block) return -104;

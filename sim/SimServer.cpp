@@ -239,7 +239,7 @@ void SimServer::HandleFrames(SimConnection& connection) {
     }
     SimFrameFollower follower(connection, header.id);
     const bool followed = (header.flags & FrameHeader::kFlagProgress) != 0;
-    SimReply reply = mProcessor.Execute(connection.GetId(), payload, followed ? &follower : nullptr);
+    SimReply reply = mProcessor.ExecuteTaking(connection.GetId(), payload, followed ? &follower : nullptr);
     if (reply.action == SimReplyAction::Die) mDie = true;
     if (reply.action != SimReplyAction::Send) {
       connection.Close();
@@ -250,7 +250,7 @@ void SimServer::HandleFrames(SimConnection& connection) {
     if (reply.delayMs > 0) {
       mTimers.push_back(Timer{mClock.NowMs() + reply.delayMs, connection.GetId(), std::move(bytes)});
     } else {
-      connection.Queue(bytes);
+      connection.Queue(std::move(bytes));
     }
   }
   if (connection.Decoder().GetError() != FrameError::None) {
@@ -287,6 +287,7 @@ void SimServer::RunHeld(SimConnection& connection) {
       connection.Queue(std::move(reply));
       connection.Queue("\n");
     }
+    connection.ScpiReader().Recycle(session.ReleaseMessage());
   }
 }
 
@@ -338,7 +339,7 @@ void SimServer::FireTimers() {
     }
     auto c = mConnections.find(it->connection);
     if (c != mConnections.end() && !c->second->IsClosed()) {
-      c->second->Queue(it->bytes);
+      c->second->Queue(std::move(it->bytes));
       if (!c->second->Flush()) c->second->Close();
     }
     it = mTimers.erase(it);

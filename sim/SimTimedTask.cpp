@@ -49,7 +49,7 @@ bool SimTimedTask::RunHandleCommand(const Dstring& rest, const SimCommand& cmd, 
     }
   } else if (what == "PACE" && !cmd.IsQuery() && context.TestControl()) {
     long ms = 0;
-    if (!cmd.GetArgs().ToLong(ms) || ms < 0 || ms > 60000) {
+    if (!Dstring(cmd.GetArgs()).ToLong(ms) || ms < 0 || ms > 60000) {
       context.Error(-222);
     } else {
       mSecondsPerItem = static_cast<double>(ms) / 1000.0;
