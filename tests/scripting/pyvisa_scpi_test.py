@@ -13,6 +13,7 @@ import subprocess
 import sys
 
 import pyvisa
+from scpi_checks import block_round_trip, check
 
 
 def start_qensim(program, data_dir):
@@ -34,9 +35,6 @@ def start_qensim(program, data_dir):
     return sim, int(lines[1].rsplit(":", 1)[1])
 
 
-def check(what, got, expected):
-    if got != expected:
-        raise AssertionError("%s: got %r, expected %r" % (what, got, expected))
 
 
 def script(port):
@@ -53,15 +51,7 @@ def script(port):
         check("empty queue", inst.query("SYST:ERR?"), '0,"No error"')
         check("event status", int(inst.query("*ESR?")), 128 | 16)
 
-        seg = int(inst.query('EDIT:SEGM:OPEN? "pyvisa/demo"'))
-        inst.write("EDIT:SEGM%d:PATT:MOD:INS 0,TRAC,BEF,8" % seg)
-        inst.write("EDIT:SEGM%d:PATT:MOD:INS 0,VECT,BEF,64" % seg)
-        rows = bytes((7 * i + 10) % 256 for i in range(64))  # holds line feeds and ';'
-        inst.write_binary_values("EDIT:SEGM%d:PATT:DATA 0,0,7,63," % seg, rows, datatype="B", header_fmt="ieee")
-        back = inst.query_binary_values("EDIT:SEGM%d:PATT:DATA? 0,0,7,63,BIN" % seg, datatype="B",
-                                        container=bytes, header_fmt="ieee")
-        check("segment data", back, rows)
-        check("no error after the block", inst.query("SYST:ERR?"), '0,"No error"')
+        block_round_trip(inst, "pyvisa/demo", 64)
     finally:
         inst.close()
         rm.close()

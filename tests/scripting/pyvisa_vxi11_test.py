@@ -19,6 +19,7 @@ import sys
 import threading
 
 from pyvisa_py.protocols import rpc
+from scpi_checks import block_round_trip, check
 
 CORE_PROG, CORE_VERS = 0x0607AF, 1
 
@@ -122,9 +123,6 @@ def registration(program, data_dir, doc):
     return True
 
 
-def check(what, got, expected):
-    if got != expected:
-        raise AssertionError("%s: got %r, expected %r" % (what, got, expected))
 
 
 def doc_example(path):
@@ -272,15 +270,7 @@ def long_block():
     rm = pyvisa.ResourceManager("@py")
     inst = rm.open_resource("TCPIP::127.0.0.1::INSTR", read_termination="\n", timeout=5000)
     try:
-        seg = int(inst.query('EDIT:SEGM:OPEN? "vxi11/block"'))
-        inst.write("EDIT:SEGM%d:PATT:MOD:INS 0,TRAC,BEF,8" % seg)
-        inst.write("EDIT:SEGM%d:PATT:MOD:INS 0,VECT,BEF,3000" % seg)
-        rows = bytes((7 * i + 10) % 256 for i in range(3000))  # holds line feeds and ';'
-        inst.write_binary_values("EDIT:SEGM%d:PATT:DATA 0,0,7,2999," % seg, rows, datatype="B", header_fmt="ieee")
-        back = inst.query_binary_values("EDIT:SEGM%d:PATT:DATA? 0,0,7,2999,BIN" % seg, datatype="B",
-                                        container=bytes, header_fmt="ieee")
-        check("3000 bytes written and read back", back, rows)
-        check("no error after the block", inst.query("SYST:ERR?"), '0,"No error"')
+        block_round_trip(inst, "vxi11/block", 3000)
     finally:
         inst.close()
         rm.close()
