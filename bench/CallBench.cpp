@@ -22,6 +22,7 @@
 #include "instrument/Frame.h"
 #include "instrument/QenSimProcess.h"
 #include "instrument/QenGuiInst.h"
+#include "common/Loopback.h"
 #include "instrument/QenTcpInstrument.h"
 #include "windows/InstrumentWaitView.h"
 
@@ -35,16 +36,7 @@ QenSimProcess& Sim() {
 
 class RawClient {
  public:
-  explicit RawClient(unsigned short port) {
-    mFd = socket(AF_INET, SOCK_STREAM, 0);
-    sockaddr_in addr{};
-    addr.sin_family = AF_INET;
-    addr.sin_port = htons(port);
-    addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    connect(mFd, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
-    int on = 1;
-    setsockopt(mFd, IPPROTO_TCP, TCP_NODELAY, &on, sizeof on);
-  }
+  explicit RawClient(unsigned short port) : mFd(ConnectLoopback(port)) {}
   ~RawClient() { close(mFd); }
 
   // Sends the frame and reads exactly `replySize` bytes back.

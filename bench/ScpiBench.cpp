@@ -17,6 +17,7 @@
 #include <thread>
 
 #include "SimSegment.h"
+#include "common/Loopback.h"
 #include "instrument/QenSimProcess.h"
 
 namespace {
@@ -25,34 +26,6 @@ using Clock = std::chrono::steady_clock;
 
 double Seconds(Clock::time_point from) {
   return std::chrono::duration<double>(Clock::now() - from).count();
-}
-
-int Connect(unsigned short port, bool noDelay) {
-  int fd = socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in addr{};
-  addr.sin_family = AF_INET;
-  addr.sin_port = htons(port);
-  addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  if (connect(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr) != 0) {
-    close(fd);
-    return -1;
-  }
-  int on = noDelay ? 1 : 0;
-  setsockopt(fd, IPPROTO_TCP, TCP_NODELAY, &on, sizeof on);
-  return fd;
-}
-
-// A loopback port that was free a moment ago, for the SCPI socket.
-unsigned short FreePort() {
-  int fd = socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in addr{};
-  addr.sin_family = AF_INET;
-  addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  bind(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
-  socklen_t len = sizeof addr;
-  getsockname(fd, reinterpret_cast<sockaddr*>(&addr), &len);
-  close(fd);
-  return ntohs(addr.sin_port);
 }
 
 struct ScpiSim {
@@ -64,7 +37,7 @@ ScpiSim& Sim() {
   static ScpiSim sim;
   if (sim.process.Port() == 0) {
     const std::filesystem::path dir = std::filesystem::temp_directory_path() / "qen_bench_scpi";
-    sim.scpiPort = FreePort();
+    sim.scpiPort = FreeLoopbackPort();
     sim.process.Start(QenSimProcess::FindBesideExecutable(),
                       {"--quiet", "--scpi-port", std::to_string(sim.scpiPort), "--data-dir", dir.string()});
   }
@@ -74,7 +47,7 @@ ScpiSim& Sim() {
 // One SCPI connection: sends whole texts, reads lines and blocks, each wait bounded.
 class ScpiClient {
  public:
-  ScpiClient(unsigned short port, bool noDelay) : mFd(Connect(port, noDelay)) {}
+  ScpiClient(unsigned short port, bool noDelay) : mFd(ConnectLoopback(port, noDelay)) {}
   ~ScpiClient() {
     if (mFd >= 0) close(mFd);
   }
@@ -186,7 +159,7 @@ double RawCopySeconds(std::size_t bytes, std::size_t block) {
   getsockname(listener, reinterpret_cast<sockaddr*>(&addr), &len);
   const auto t0 = Clock::now();
   std::thread sender([&] {
-    int fd = Connect(ntohs(addr.sin_port), true);
+    int fd = ConnectLoopback(ntohs(addr.sin_port), true);
     const std::string chunk(block, '\x5a');
     for (std::size_t sent = 0; sent < bytes; sent += block) ScpiClient::SendAll(fd, chunk.data(), block);
     close(fd);

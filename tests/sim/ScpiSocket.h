@@ -10,21 +10,8 @@
 #include <string>
 #include <vector>
 
+#include "common/Loopback.h"
 #include "common/SimProcess.h"
-
-// A loopback port that was free a moment ago: the SCPI socket's number is not printed where
-// the process starter reads.
-inline unsigned short FreeLoopbackPort() {
-  int probe = socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in addr{};
-  addr.sin_family = AF_INET;
-  addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  bind(probe, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
-  socklen_t len = sizeof addr;
-  getsockname(probe, reinterpret_cast<sockaddr*>(&addr), &len);
-  close(probe);
-  return ntohs(addr.sin_port);
-}
 
 // A qensim of this build with its SCPI socket on a free port.
 class ScpiSim {
@@ -49,17 +36,7 @@ class ScpiSim {
 // reads as "<time-out>".
 class ScpiSocket {
  public:
-  explicit ScpiSocket(unsigned short port) {
-    mFd = socket(AF_INET, SOCK_STREAM, 0);
-    sockaddr_in addr{};
-    addr.sin_family = AF_INET;
-    addr.sin_port = htons(port);
-    addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    if (connect(mFd, reinterpret_cast<sockaddr*>(&addr), sizeof addr) != 0) {
-      close(mFd);
-      mFd = -1;
-    }
-  }
+  explicit ScpiSocket(unsigned short port) : mFd(ConnectLoopback(port, false)) {}
   ~ScpiSocket() {
     if (mFd >= 0) close(mFd);
   }
