@@ -17,6 +17,7 @@
 #include "HostConnection.h"
 #include "HostOptions.h"
 #include "common/HostProcess.h"
+#include "common/Loopback.h"
 #include "common/SimProcess.h"
 #include "instrument/QenGuiInst.h"
 #include "instrument/QenSimProcess.h"
@@ -28,23 +29,14 @@ namespace {
 // as a port of another protocol does.
 class SilentListener {
  public:
-  SilentListener() {
-    mFd = socket(AF_INET, SOCK_STREAM, 0);
-    sockaddr_in addr{};
-    addr.sin_family = AF_INET;
-    addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    bind(mFd, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
-    socklen_t len = sizeof addr;
-    getsockname(mFd, reinterpret_cast<sockaddr*>(&addr), &len);
-    mPort = ntohs(addr.sin_port);
-  }
+  SilentListener() : mFd(BindLoopback(mPort)) {}
   ~SilentListener() { close(mFd); }
   void Listen() { listen(mFd, 4); }
   unsigned short Port() const { return mPort; }
 
  private:
+  unsigned short mPort = 0;  // before mFd: binding sets it
   int mFd = -1;
-  unsigned short mPort = 0;
 };
 
 struct ConnectCase {

@@ -8,6 +8,7 @@
 #include <thread>
 #include <unistd.h>
 
+#include "common/Loopback.h"
 #include "common/SimProcess.h"
 #include <algorithm>
 
@@ -25,14 +26,7 @@ class ScriptedServer {
   using Script = std::function<void(int fd)>;
 
   explicit ScriptedServer(Script script) {
-    mListen = socket(AF_INET, SOCK_STREAM, 0);
-    sockaddr_in addr{};
-    addr.sin_family = AF_INET;
-    addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    bind(mListen, reinterpret_cast<sockaddr*>(&addr), sizeof addr);
-    socklen_t len = sizeof addr;
-    getsockname(mListen, reinterpret_cast<sockaddr*>(&addr), &len);
-    mPort = ntohs(addr.sin_port);
+    mListen = BindLoopback(mPort);
     listen(mListen, 1);
     mThread = std::thread([this, script] {
       pollfd p{mListen, POLLIN, 0};
